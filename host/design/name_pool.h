@@ -1,0 +1,59 @@
+// Interned names of a design: each distinct text is stored once in an arena and found again
+// through an open-addressing hash set.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string_view>
+#include <vector>
+
+class Ndm_NamePool {
+public:
+    Ndm_NamePool();
+    // Stored copy of text (terminated), the same pointer for equal texts.
+    const char* Intern(std::string_view text);
+    // Stored copy when the text was interned before, else null.
+    const char* Find(std::string_view text) const;
+    size_t bytes() const { return bytes_; }
+
+    static uint64_t Hash(std::string_view text);
+
+private:
+    struct Slot {
+        const char* text = nullptr;
+        uint32_t hash = 0;
+        uint32_t size = 0;
+    };
+    const char* Store(std::string_view text);
+    void Grow();
+
+    std::vector<Slot> slots_;
+    size_t used_ = 0;
+    std::vector<std::unique_ptr<char[]>> chunks_;
+    char* cursor_ = nullptr;
+    size_t left_ = 0;
+    size_t bytes_ = 0;
+};
+
+// Map from an interned name to the first object (in stored order) carrying it; keys are
+// compared by pointer. Open addressing, 16 bytes a slot.
+class Ndm_PtrMap {
+public:
+    // Inserts unless the key is there; returns the value now stored.
+    void* InsertIfAbsent(const void* key, void* value);
+    void* Find(const void* key) const;
+    void Clear() {
+        slots_.clear();
+        used_ = 0;
+    }
+
+private:
+    struct Slot {
+        const void* key = nullptr;
+        void* value = nullptr;
+    };
+    static size_t HashPtr(const void* key);
+    void Grow();
+    std::vector<Slot> slots_;
+    size_t used_ = 0;
+};

@@ -1,0 +1,349 @@
+#include "host/design/ndm.h"
+
+#include <algorithm>
+#include <cstring>
+
+#include "host/design/name_pool.h"
+
+namespace {
+
+// Blocks with at most this many members of a kind are searched directly; a scan of a few
+// pointers is cheaper than hashing the query.
+constexpr size_t kSmall = 8;
+
+enum Category { kBlocks = 0, kSignals = 1, kPins = 2 };
+
+std::string FoldName(const char* name) {
+    std::string folded(name ? name : "");
+    for (char& c : folded)
+        if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+    return folded;
+}
+
+template <class T>
+T* ScanExact(const std::vector<T*>& members, const char* name) {
+    for (T* m : members)
+        if (std::strcmp(m->GetName(), name) == 0) return m;
+    return nullptr;
+}
+
+template <class T>
+T* ScanFolded(const std::vector<T*>& members, const std::string& folded) {
+    for (T* m : members) {
+        const char* a = m->GetName();
+        size_t i = 0;
+        for (; a[i] && i < folded.size(); ++i) {
+            char c = a[i];
+            if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+            if (c != folded[i]) break;
+        }
+        if (a[i] == '\0' && i == folded.size()) return m;
+    }
+    return nullptr;
+}
+
+int Depth(const Ndm_Block* block) {
+    int d = 0;
+    for (const Ndm_Block* b = block; b && b->GetParent(); b = b->GetParent()) ++d;
+    return d;
+}
+
+}  // namespace
+
+// Per-block hash indexes of members by exact and by case-folded interned name.
+class Ndm_MemberIndex {
+public:
+    Ndm_PtrMap exact[3];
+    Ndm_PtrMap folded[3];
+    bool built[3] = {false, false, false};
+
+    void Add(Ndm_Design* design, int category, const char* name, void* member) {
+        exact[category].InsertIfAbsent(name, member);
+        folded[category].InsertIfAbsent(design->Intern(FoldName(name)), member);
+    }
+    template <class T>
+    void Build(Ndm_Design* design, int category, const std::vector<T*>& members) {
+        exact[category].Clear();
+        folded[category].Clear();
+        for (T* m : members) Add(design, category, m->GetName(), m);
+        built[category] = true;
+    }
+    void Drop(int category) {
+        exact[category].Clear();
+        folded[category].Clear();
+        built[category] = false;
+    }
+};
+
+const char* Ndm_DirName(Ndm_Dir dir) {
+    switch (dir) {
+        case Ndm_Dir::Input: return "input";
+        case Ndm_Dir::Output: return "output";
+        case Ndm_Dir::Inout: return "inout";
+        default: return "";
+    }
+}
+
+// ---- names ----
+
+void Ndm_Block::AppendFullName(std::string& out) const {
+    if (!parent_) return;  // the top block has no full name
+    const Ndm_Block* chain[256];
+    size_t n = 0;
+    std::vector<const Ndm_Block*> deep;
+    for (const Ndm_Block* b = this; b->parent_; b = b->parent_) {
+        if (n < 256)
+            chain[n++] = b;
+        else
+            deep.push_back(b);
+    }
+    for (size_t i = deep.size(); i-- > 0;) {
+        out += deep[i]->name_;
+        out += '/';
+    }
+    for (size_t i = n; i-- > 0;) {
+        out += chain[i]->name_;
+        if (i) out += '/';
+    }
+}
+
+std::string Ndm_Block::GetFullName() const {
+    std::string out;
+    AppendFullName(out);
+    return out;
+}
+
+std::string Ndm_Signal::GetFullName() const {
+    std::string out;
+    block_->AppendFullName(out);
+    if (!out.empty()) out += '/';
+    out += name_;
+    return out;
+}
+
+std::string Ndm_Pin::GetFullName() const {
+    std::string out;
+    block_->AppendFullName(out);
+    if (!out.empty()) out += '.';
+    out += name_;
+    return out;
+}
+
+Ndm_Network* Ndm_Pin::GetNetwork() const { return signal_ ? signal_->GetNetwork() : nullptr; }
+
+// ---- blocks ----
+
+Ndm_Block::Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* view)
+    : Ndm_PropertyHolder(Ndm_ObjKind::Block), name_(name), parent_(parent), view_(view) {}
+
+Ndm_Block::~Ndm_Block() = default;
+
+void Ndm_Block::SetTypeName(const char* type) {
+    type_ = view_->GetDesign()->Intern(type ? type : "");
+}
+
+Ndm_MemberIndex& Ndm_Block::Index() const {
+    if (!index_) index_ = std::make_unique<Ndm_MemberIndex>();
+    return *index_;
+}
+
+Ndm_Block* Ndm_Block::CreateBlock(const char* name, unsigned int /*flags*/) {
+    if (!name) return nullptr;
+    Ndm_Design* design = view_->GetDesign();
+    const char* stored = design->Intern(name);
+    Ndm_Block* block = &design->block_pool_.emplace_back(Ndm_Token(), stored, this, view_);
+    blocks_.push_back(block);
+    if (index_ && index_->built[kBlocks]) index_->Add(design, kBlocks, stored, block);
+    return block;
+}
+
+Ndm_Signal* Ndm_Block::CreateSignal(const char* name) {
+    if (!name) return nullptr;
+    Ndm_Design* design = view_->GetDesign();
+    const char* stored = design->Intern(name);
+    Ndm_Signal* signal = &design->signal_pool_.emplace_back(Ndm_Token(), stored, this);
+    signals_.push_back(signal);
+    if (index_ && index_->built[kSignals]) index_->Add(design, kSignals, stored, signal);
+    return signal;
+}
+
+Ndm_Pin* Ndm_Block::CreatePin(const char* name, Ndm_Dir dir) {
+    if (!name) return nullptr;
+    Ndm_Design* design = view_->GetDesign();
+    const char* stored = design->Intern(name);
+    Ndm_Pin* pin = &design->pin_pool_.emplace_back(Ndm_Token(), stored, this, dir);
+    pins_.push_back(pin);
+    if (index_ && index_->built[kPins]) index_->Add(design, kPins, stored, pin);
+    return pin;
+}
+
+void Ndm_Block::Release() {
+    for (Ndm_Block* child : blocks_) child->Release();
+    for (Ndm_Signal* signal : signals_) {
+        if (signal->network_) signal->network_->Remove(signal);
+        signal->DeleteAllProperties();
+    }
+    for (Ndm_Pin* pin : pins_) pin->DeleteAllProperties();
+    blocks_.clear();
+    blocks_.shrink_to_fit();
+    signals_.clear();
+    signals_.shrink_to_fit();
+    pins_.clear();
+    pins_.shrink_to_fit();
+    index_.reset();
+    DeleteAllProperties();
+    parent_ = nullptr;
+}
+
+bool Ndm_Block::DeleteBlock(Ndm_Block* child) {
+    auto it = std::find(blocks_.begin(), blocks_.end(), child);
+    if (it == blocks_.end()) return false;
+    blocks_.erase(it);
+    if (index_) index_->Drop(kBlocks);
+    // Pins elsewhere that pointed at signals of the subtree keep their pointers; the objects
+    // stay allocated in the pools until the design goes, so nothing dangles.
+    child->Release();
+    return true;
+}
+
+
+template <class T>
+T* Ndm_Block::Lookup(const std::vector<T*>& members, int category, const char* name,
+                     bool ignore_case) const {
+    if (!name) return nullptr;
+    if (!ignore_case && members.size() <= kSmall) return ScanExact(members, name);
+    std::string folded;
+    if (ignore_case) {
+        folded = FoldName(name);
+        if (members.size() <= kSmall) return ScanFolded(members, folded);
+    }
+    Ndm_Design* design = view_->GetDesign();
+    Ndm_MemberIndex& idx = Index();
+    if (!idx.built[category]) idx.Build(design, category, members);
+    const char* key = design->FindInterned(ignore_case ? std::string_view(folded) : name);
+    if (!key) return nullptr;
+    return static_cast<T*>((ignore_case ? idx.folded : idx.exact)[category].Find(key));
+}
+
+Ndm_Block* Ndm_Block::GetBlockByName(const char* name) const {
+    return Lookup(blocks_, kBlocks, name, false);
+}
+Ndm_Signal* Ndm_Block::GetSignalByName(const char* name) const {
+    return Lookup(signals_, kSignals, name, false);
+}
+Ndm_Pin* Ndm_Block::GetPinByName(const char* name) const { return Lookup(pins_, kPins, name, false); }
+Ndm_Block* Ndm_Block::GetBlockByIName(const char* name) const {
+    return Lookup(blocks_, kBlocks, name, true);
+}
+Ndm_Signal* Ndm_Block::GetSignalByIName(const char* name) const {
+    return Lookup(signals_, kSignals, name, true);
+}
+Ndm_Pin* Ndm_Block::GetPinByIName(const char* name) const { return Lookup(pins_, kPins, name, true); }
+
+// ---- networks ----
+
+void Ndm_Network::AddSignal(Ndm_Signal* signal) {
+    if (!signal || signal->network_) return;
+    signal->network_ = this;
+    signal->next_in_network_ = nullptr;
+    if (last_)
+        last_->next_in_network_ = signal;
+    else
+        first_ = signal;
+    last_ = signal;
+    ++count_;
+    int depth = Depth(signal->GetBlock());
+    if (!top_ || depth < top_depth_) {
+        top_ = signal;
+        top_depth_ = depth;
+        name_ = view_->GetDesign()->Intern(signal->GetFullName());
+    }
+}
+
+void Ndm_Network::Remove(Ndm_Signal* signal) {
+    Ndm_Signal* prev = nullptr;
+    for (Ndm_Signal* s = first_; s; prev = s, s = s->next_in_network_) {
+        if (s != signal) continue;
+        (prev ? prev->next_in_network_ : first_) = s->next_in_network_;
+        if (last_ == s) last_ = prev;
+        --count_;
+        break;
+    }
+    signal->network_ = nullptr;
+    signal->next_in_network_ = nullptr;
+    if (top_ != signal) return;
+    top_ = nullptr;
+    name_ = "";
+    for (Ndm_Signal* s = first_; s; s = s->next_in_network_) {
+        int depth = Depth(s->GetBlock());
+        if (!top_ || depth < top_depth_) {
+            top_ = s;
+            top_depth_ = depth;
+        }
+    }
+    if (top_) {
+        name_ = view_->GetDesign()->Intern(top_->GetFullName());
+    } else {
+        auto& nets = view_->networks_;
+        nets.erase(std::find(nets.begin(), nets.end(), this));
+    }
+}
+
+// ---- views and design ----
+
+Ndm_Block* Ndm_View::CreateTopBlock(const char* name) {
+    if (top_ || !name) return top_;
+    top_ = &design_->block_pool_.emplace_back(Ndm_Token(), design_->Intern(name), nullptr, this);
+    return top_;
+}
+
+Ndm_Network* Ndm_View::CreateNetwork() {
+    Ndm_Network* net = &design_->network_pool_.emplace_back(Ndm_Token(), this);
+    networks_.push_back(net);
+    return net;
+}
+
+Ndm_Design::Ndm_Design(const char* name)
+    : Ndm_PropertyHolder(Ndm_ObjKind::Design), names_(std::make_unique<Ndm_NamePool>()) {
+    name_ = names_->Intern(name ? name : "");
+}
+
+Ndm_Design::~Ndm_Design() = default;
+
+const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
+
+const char* Ndm_Design::FindInterned(std::string_view name) const { return names_->Find(name); }
+
+Ndm_View* Ndm_Design::GetViewByName(const char* name) const {
+    if (!name) return nullptr;
+    for (Ndm_View* v : views_)
+        if (std::strcmp(v->GetName(), name) == 0) return v;
+    return nullptr;
+}
+
+Ndm_View* Ndm_Design::CreateView(const char* name) {
+    if (!name) return nullptr;
+    if (Ndm_View* v = GetViewByName(name)) return v;
+    Ndm_View* v = &view_pool_.emplace_back(Ndm_Token(), Intern(name), this);
+    views_.push_back(v);
+    return v;
+}
+
+Ndm_Design::Stats Ndm_Design::GetStats() const {
+    Stats s;
+    for (const Ndm_View* v : views_) {
+        s.networks += v->networks_.size();
+        if (!v->top_) continue;
+        std::vector<const Ndm_Block*> stack{v->top_};
+        while (!stack.empty()) {
+            const Ndm_Block* b = stack.back();
+            stack.pop_back();
+            ++s.blocks;
+            s.signals += b->signals_.size();
+            s.pins += b->pins_.size();
+            for (const Ndm_Block* c : b->blocks_) stack.push_back(c);
+        }
+    }
+    s.name_bytes = names_->bytes();
+    return s;
+}

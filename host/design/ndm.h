@@ -1,0 +1,249 @@
+// The design database: a design holds views; a view holds the block hierarchy under its top
+// block and the networks; blocks hold child blocks, signals and pins, all in stored order.
+// Every object is a property holder. Names are interned in the design, so an object carries
+// pointers only; objects live in design-owned pools and are never moved.
+//
+// Name lookups (GetBlockByName, GetSignalByName, GetPinByName and the I-variants ignoring
+// ASCII case) answer "the first object in stored order with that name" through per-block
+// hash indexes built on first use for blocks with many members; they never scan a large block.
+#pragma once
+
+#include <cstdint>
+#include <deque>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "host/design/ndm_property.h"
+
+class Ndm_Design;
+class Ndm_View;
+class Ndm_Block;
+class Ndm_Signal;
+class Ndm_Pin;
+class Ndm_Network;
+class Ndm_NamePool;
+class Ndm_MemberIndex;
+
+// Only the database itself can make objects: constructors take this token.
+class Ndm_Token {
+    Ndm_Token() = default;
+    friend class Ndm_Design;
+    friend class Ndm_View;
+    friend class Ndm_Block;
+    friend class Ndm_Network;
+};
+
+// Pin and port directions.
+enum class Ndm_Dir : uint8_t { None, Input, Output, Inout };
+const char* Ndm_DirName(Ndm_Dir dir);  // "", "input", "output", "inout"
+
+class Ndm_Signal : public Ndm_PropertyHolder {
+public:
+    Ndm_Signal(Ndm_Token, const char* name, Ndm_Block* block)
+        : Ndm_PropertyHolder(Ndm_ObjKind::Signal), name_(name), block_(block) {}
+    const char* GetName() const { return name_; }
+    // Owner block's full name, "/", the name (just the name in the top block).
+    std::string GetFullName() const;
+    Ndm_Block* GetBlock() const { return block_; }
+    // Network the signal belongs to, or null.
+    Ndm_Network* GetNetwork() const { return network_; }
+    // Next signal of the same network, in network order.
+    Ndm_Signal* GetNextInNetwork() const { return next_in_network_; }
+
+private:
+    friend class Ndm_Block;
+    friend class Ndm_Network;
+    friend class Ndm_Design;
+
+    const char* name_;
+    Ndm_Block* block_;
+    Ndm_Network* network_ = nullptr;
+    Ndm_Signal* next_in_network_ = nullptr;
+};
+
+class Ndm_Pin : public Ndm_PropertyHolder {
+public:
+    Ndm_Pin(Ndm_Token, const char* name, Ndm_Block* block, Ndm_Dir dir)
+        : Ndm_PropertyHolder(Ndm_ObjKind::Pin), dir_(dir), name_(name), block_(block) {}
+    const char* GetName() const { return name_; }
+    // Owner block's full name, ".", the name (just the name on the top block).
+    std::string GetFullName() const;
+    Ndm_Block* GetBlock() const { return block_; }
+    Ndm_Dir GetDirection() const { return dir_; }
+    // Signal outside the block that the pin connects to (in the owner's parent; for a pin of
+    // the top block, the port's own signal), or null.
+    Ndm_Signal* GetSignal() const { return signal_; }
+    void SetSignal(Ndm_Signal* signal) { signal_ = signal; }
+    // Network of the connected signal, or null.
+    Ndm_Network* GetNetwork() const;
+
+private:
+    friend class Ndm_Block;
+    friend class Ndm_Design;
+
+    Ndm_Dir dir_;
+    const char* name_;
+    Ndm_Block* block_;
+    Ndm_Signal* signal_ = nullptr;
+};
+
+class Ndm_Block : public Ndm_PropertyHolder {
+public:
+    Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* view);
+    const char* GetName() const { return name_; }
+    // Names from below the top block joined by "/"; empty for the top block.
+    std::string GetFullName() const;
+    // Appends the full name to out (no allocation when out has room).
+    void AppendFullName(std::string& out) const;
+    Ndm_Block* GetParent() const { return parent_; }
+    Ndm_View* GetView() const { return view_; }
+    // Cell type or module name the block was made from (empty for made-up blocks).
+    const char* GetTypeName() const { return type_; }
+    void SetTypeName(const char* type);
+
+    int GetNumBlocks() const { return static_cast<int>(blocks_.size()); }
+    std::span<Ndm_Block* const> GetBlockItr() const { return blocks_; }
+    int GetNumSignals() const { return static_cast<int>(signals_.size()); }
+    std::span<Ndm_Signal* const> GetSignalItr() const { return signals_; }
+    int GetNumPins() const { return static_cast<int>(pins_.size()); }
+    std::span<Ndm_Pin* const> GetPinItr() const { return pins_; }
+
+    // Appends a child block; flags are reserved (pass 0). Null when name is null.
+    Ndm_Block* CreateBlock(const char* name, unsigned int flags = 0);
+    // Removes a child block and its whole subtree (signals leave their networks; the
+    // objects' properties are released). False when child is not a child of this block.
+    bool DeleteBlock(Ndm_Block* child);
+    // Appends a signal or a pin.
+    Ndm_Signal* CreateSignal(const char* name);
+    Ndm_Pin* CreatePin(const char* name, Ndm_Dir dir = Ndm_Dir::None);
+
+    // First member in stored order with exactly this name, or null.
+    Ndm_Block* GetBlockByName(const char* name) const;
+    Ndm_Signal* GetSignalByName(const char* name) const;
+    Ndm_Pin* GetPinByName(const char* name) const;
+    // First member in stored order whose name equals name ignoring ASCII case, or null.
+    Ndm_Block* GetBlockByIName(const char* name) const;
+    Ndm_Signal* GetSignalByIName(const char* name) const;
+    Ndm_Pin* GetPinByIName(const char* name) const;
+
+    ~Ndm_Block();
+
+private:
+    friend class Ndm_View;
+    friend class Ndm_Design;
+    Ndm_MemberIndex& Index() const;
+    template <class T>
+    T* Lookup(const std::vector<T*>& members, int category, const char* name,
+              bool ignore_case) const;
+    void Release();  // drops members and properties of a deleted subtree
+
+    const char* name_;
+    const char* type_ = "";
+    Ndm_Block* parent_;
+    Ndm_View* view_;
+    std::vector<Ndm_Block*> blocks_;
+    std::vector<Ndm_Signal*> signals_;
+    std::vector<Ndm_Pin*> pins_;
+    mutable std::unique_ptr<Ndm_MemberIndex> index_;
+};
+
+class Ndm_Network : public Ndm_PropertyHolder {
+public:
+    Ndm_Network(Ndm_Token, Ndm_View* view) : Ndm_PropertyHolder(Ndm_ObjKind::Network), view_(view) {}
+    // Full name of the top signal (the highest in the hierarchy; the first of those in
+    // creation order).
+    const char* GetName() const { return name_; }
+    Ndm_Signal* GetTopSignal() const { return top_; }
+    // Signals of the network in the order they were added.
+    Ndm_Signal* GetFirstSignal() const { return first_; }
+    int GetNumSignals() const { return count_; }
+    // Adds a signal (not yet in a network); a signal higher in the hierarchy than the
+    // current top one becomes the top signal and renames the network.
+    void AddSignal(Ndm_Signal* signal);
+    Ndm_View* GetView() const { return view_; }
+
+private:
+    friend class Ndm_View;
+    friend class Ndm_Block;
+    void Remove(Ndm_Signal* signal);
+
+    Ndm_View* view_;
+    const char* name_ = "";
+    Ndm_Signal* top_ = nullptr;
+    Ndm_Signal* first_ = nullptr;
+    Ndm_Signal* last_ = nullptr;
+    int count_ = 0;
+    int top_depth_ = 0;
+};
+
+class Ndm_View : public Ndm_PropertyHolder {
+public:
+    Ndm_View(Ndm_Token, const char* name, Ndm_Design* design)
+        : Ndm_PropertyHolder(Ndm_ObjKind::View), name_(name), design_(design) {}
+    const char* GetName() const { return name_; }
+    Ndm_Design* GetDesign() const { return design_; }
+    // Top block, or null before CreateTopBlock.
+    Ndm_Block* GetBlock() const { return top_; }
+    // Creates the top block (once).
+    Ndm_Block* CreateTopBlock(const char* name);
+    // Networks in creation order.
+    std::span<Ndm_Network* const> GetNetworkItr() const { return networks_; }
+    int GetNumNetworks() const { return static_cast<int>(networks_.size()); }
+    // A new, empty network.
+    Ndm_Network* CreateNetwork();
+
+private:
+    friend class Ndm_Design;
+    friend class Ndm_Block;
+    friend class Ndm_Network;
+
+    const char* name_;
+    Ndm_Design* design_;
+    Ndm_Block* top_ = nullptr;
+    std::vector<Ndm_Network*> networks_;
+};
+
+class Ndm_Design : public Ndm_PropertyHolder {
+public:
+    explicit Ndm_Design(const char* name = "");
+    ~Ndm_Design();
+    Ndm_Design(const Ndm_Design&) = delete;
+    Ndm_Design& operator=(const Ndm_Design&) = delete;
+
+    const char* GetName() const { return name_; }
+    // View of that name, or null.
+    Ndm_View* GetViewByName(const char* name) const;
+    // Views in creation order.
+    std::span<Ndm_View* const> GetViewItr() const { return views_; }
+    // Creates a view; returns the existing one when the name is taken.
+    Ndm_View* CreateView(const char* name);
+
+    // Interned copy of a name, valid as long as the design.
+    const char* Intern(std::string_view name);
+    // Interned copy when the name is known to the design, else null.
+    const char* FindInterned(std::string_view name) const;
+
+    // Object counts and an estimate of the memory the design holds, for reports.
+    struct Stats {
+        size_t blocks = 0, signals = 0, pins = 0, networks = 0, name_bytes = 0;
+    };
+    Stats GetStats() const;
+
+private:
+    friend class Ndm_Block;
+    friend class Ndm_View;
+    friend class Ndm_Network;
+    friend class Ndm_MemberIndex;
+
+    std::unique_ptr<Ndm_NamePool> names_;
+    const char* name_;
+    std::deque<Ndm_View> view_pool_;
+    std::vector<Ndm_View*> views_;
+    std::deque<Ndm_Block> block_pool_;
+    std::deque<Ndm_Signal> signal_pool_;
+    std::deque<Ndm_Pin> pin_pool_;
+    std::deque<Ndm_Network> network_pool_;
+};
