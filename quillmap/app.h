@@ -1,4 +1,29 @@
-// Entry of the quillmap command line; returns the process exit status.
+// The quillmap command line: global options, subcommands, exit status.
 #pragma once
+
+#include <functional>
+#include <memory>
+#include <string>
+
+namespace CLI {
+class App;
+}
+class Ndm_Design;
+
+// Exit statuses of quillmap.
+enum QuillmapStatus { kStatusOk = 0, kStatusErrors = 1, kStatusFatal = 2 };
+
+// Options shared by every subcommand.
+struct QuillmapOptions {
+    std::string messages = "text";  // "text" or "jsonl"
+    bool debug = false;
+};
+
+// Reads a design file (Yosys JSON netlist or native design file); null after a message.
+std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top);
+
+// Each subcommand registers itself and sets run to its action, which returns an exit status.
+using QuillmapAction = std::function<int()>;
+void AddDesignCommands(CLI::App& app, QuillmapAction& run);
 
 int QuillmapMain(int argc, char** argv);

@@ -1,0 +1,206 @@
+// Portability layer: string helpers, formatting, the host string, messages, atomic files.
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+
+#include "host/port/env.h"
+#include "host/port/file.h"
+#include "host/port/msgman.h"
+#include "host/port/string_base.h"
+#include "host/port/ut_str.h"
+
+namespace {
+
+struct Owned {
+    explicit Owned(char* p) : p(p) {}
+    ~Owned() { delete[] p; }
+    char* p;
+};
+
+TEST(UtStrTest, WildcardMatching) {
+    EXPECT_TRUE(UT_STR::Match("u1/reg_3", "u1/reg*"));
+    EXPECT_TRUE(UT_STR::Match("data<7>", "data<?>"));
+    EXPECT_FALSE(UT_STR::Match("data<17>", "data<?>"));
+    EXPECT_TRUE(UT_STR::Match("abcabcx", "*abc*x"));  // needs backtracking over the first *
+    EXPECT_TRUE(UT_STR::Match("", "*"));
+    EXPECT_FALSE(UT_STR::Match("", "?"));
+    EXPECT_FALSE(UT_STR::Match("U1/REG", "u1/reg"));
+    EXPECT_TRUE(UT_STR::IMatch("U1/REG_0", "u1/reg*"));
+    EXPECT_FALSE(UT_STR::IMatch("u1/reg", "u1/reg?"));
+    // a long text against a pattern of many stars stays fast (no exponential backtracking)
+    std::string text(20000, 'a');
+    EXPECT_FALSE(UT_STR::Match(text.c_str(), "*a*a*a*a*a*a*b"));
+}
+
+TEST(UtStrTest, ComparisonsAndCopies) {
+    EXPECT_EQ(UT_STR::ICompare("Clk", "cLK"), 0);
+    EXPECT_NE(UT_STR::Compare("Clk", "clk"), 0);
+    EXPECT_EQ(UT_STR::INCompare("TOPx", "topy", 3), 0);
+    EXPECT_LT(UT_STR::ICompare("ab", "abc"), 0);
+    EXPECT_EQ(UT_STR::Compare(nullptr, ""), 0);
+
+    Owned dup(UT_STR::Dup("loc"));
+    EXPECT_STREQ(UT_STR::Upper(dup.p), "LOC");
+    EXPECT_EQ(UT_STR::Dup(nullptr), nullptr);
+    Owned cat(UT_STR::Cat("a,", "b"));
+    EXPECT_STREQ(cat.p, "a,b");
+
+    char buf[4];
+    EXPECT_STREQ(UT_STR::NCopy(buf, "abcdef", 3), "abc");
+    EXPECT_EQ(UT_STR::Len(nullptr), 0u);
+}
+
+TEST(UtStrTest, GetTokenSplitsAtFirstDelimiter) {
+    char text[] = "u1/u2.D.x";
+    char token[8];
+    ASSERT_EQ(UT_STR::GetToken(text, token, sizeof token, "."), 1);
+    EXPECT_STREQ(token, "u1/u2");
+    EXPECT_STREQ(text, "D.x");
+
+    char none[] = "nodot";
+    EXPECT_EQ(UT_STR::GetToken(none, token, sizeof token, "."), 0);
+    EXPECT_STREQ(none, "nodot");
+
+    char longname[] = "abcdefghijkl.P";
+    ASSERT_EQ(UT_STR::GetToken(longname, token, sizeof token, "."), 1);
+    EXPECT_STREQ(token, "abcdefg");  // truncated to the token buffer
+    EXPECT_STREQ(longname, "P");
+}
+
+TEST(UtStrTest, StrToInt32) {
+    bool ok = false;
+    EXPECT_EQ(UT_STR::StrToINT32(" 50 ", &ok), 50);
+    EXPECT_TRUE(ok);
+    EXPECT_EQ(UT_STR::StrToINT32("-7", &ok), -7);
+    EXPECT_EQ(UT_STR::StrToINT32("12abc", &ok), -1);
+    EXPECT_FALSE(ok);
+    EXPECT_EQ(UT_STR::StrToINT32("99999999999", &ok), -1);
+    EXPECT_FALSE(ok);
+    EXPECT_EQ(UT_STR::StrToINT32("", &ok), -1);
+}
+
+TEST(FormatTest, IntegerDirectiveAndFixedPoint) {
+    Owned text(zepform("%s %I %f pS %%I", "x", 42, 2500.0));
+    EXPECT_STREQ(text.p, "x 42 2500.000000 pS %I");
+    EXPECT_EQ(Port_Format("%5I|%-3I|", 7, 1), "    7|1  |");
+    std::string big(5000, 'n');
+    EXPECT_EQ(Port_Format("<%s>", big.c_str()).size(), 5002u);
+}
+
+TEST(StringBaseTest, SplitTrimSearch) {
+    using S = Port::StringBase<char>;
+    auto pieces = S::Split(S("ag1 = SITE_A0:SITE_A7"), "=", true, "", "");
+    ASSERT_EQ(pieces.size(), 2u);
+    EXPECT_EQ(pieces[0].Trim(" \t").str(), "ag1");
+    EXPECT_EQ(pieces[1].Trim(" \t").str(), "SITE_A0:SITE_A7");
+
+    EXPECT_EQ(S::Split(S("a  b   c"), " ", true, "", "").size(), 3u);
+    EXPECT_EQ(S::Split(S("a  b"), " ", false, "", "").size(), 3u);
+    auto quoted = S::Split(S("x \"a b\" y"), " ", true, "\"", "\"");
+    ASSERT_EQ(quoted.size(), 3u);
+    EXPECT_EQ(quoted[1].str(), "\"a b\"");
+
+    S key("initp_0F");
+    EXPECT_EQ(key.GetIndexOfString("INITP_", S::IGNORE_CASE), 0);
+    EXPECT_EQ(key.GetIndexOfString("INITP_", S::EXACT), -1);
+    EXPECT_EQ(S("abc").Compare("ABC", S::IGNORE_CASE), 0);
+    EXPECT_EQ(S("abcdef").Truncate(2).str(), "ab");
+    EXPECT_EQ(S().doFormat("%I-%s", 3, "x").str(), "3-x");
+}
+
+TEST(MessageTest, SinksCountsAndDebugChannel) {
+    Port_MsgManData::ResetCounts();
+    {
+        Port_MsgCapture capture;
+        auto msg = Port_MsgManData::createObject("Quillmap", "lunbase", __LINE__, "1.0");
+        msg.issueError("Line %i in '%s': bad.\n", 3, "a.ucf");
+        msg.issueWarning("w\n");
+        Port_MsgManData::debugStub("hidden %I\n", 1);
+        ASSERT_EQ(capture.messages().size(), 2u);
+        EXPECT_EQ(capture.messages()[0].text, "Line 3 in 'a.ucf': bad.\n");
+        EXPECT_EQ(capture.messages()[0].module, "lunbase");
+        EXPECT_EQ(Port_MsgManData::Count(Port_Severity::Error), 1);
+        EXPECT_EQ(Port_MsgManData::Count(Port_Severity::Warning), 1);
+    }
+    {
+        Port_MsgCapture capture(/*debug=*/true);
+        Port_MsgManData::debugStub("MGR::cb_net %I\n", 7);
+        EXPECT_EQ(capture.Texts(Port_Severity::Debug), std::vector<std::string>{"MGR::cb_net 7\n"});
+    }
+}
+
+TEST(MessageTest, FatalIsDeliveredThenThrown) {
+    Port_MsgCapture capture;
+    auto msg = Port_MsgManData::createObject("Quillmap", "lunbase", __LINE__, "1.0");
+    try {
+        msg.issueFatal(2, "No design supplied!\n");
+        FAIL() << "fatal returned";
+    } catch (const Port_FatalError& e) {
+        EXPECT_EQ(e.code(), 2);
+        EXPECT_FALSE(e.user());
+    }
+    ASSERT_EQ(capture.messages().size(), 1u);
+    EXPECT_EQ(capture.messages()[0].severity, Port_Severity::Fatal);
+    EXPECT_TRUE(capture.messages()[0].has_code);
+    EXPECT_THROW(msg.issueUserFatal(5, "x\n"), Port_FatalError);
+}
+
+TEST(MessageTest, JsonLinesEscapeText) {
+    char* buf = nullptr;
+    size_t size = 0;
+    FILE* mem = open_memstream(&buf, &size);
+    Port_JsonSink sink(mem);
+    Port_Message m{Port_Severity::Internal, "Quillmap", "lunmgr", 1, true, 2, "a \"q\"\\\n\x01"};
+    sink.Emit(m);
+    std::fclose(mem);
+    std::string line(buf, size);
+    std::free(buf);
+    EXPECT_EQ(line,
+              "{\"severity\":\"internal_error\",\"program\":\"Quillmap\",\"module\":\"lunmgr\","
+              "\"code\":2,\"text\":\"a \\\"q\\\"\\\\\\n\\u0001\"}\n");
+}
+
+TEST(FileTest, AtomicFileLeavesNothingHalfWritten) {
+    auto dir = std::filesystem::temp_directory_path() / ("lun_port_" + std::to_string(getpid()));
+    std::filesystem::create_directories(dir);
+    std::string target = (dir / "out.txt").string();
+    {
+        Port::AtomicFile f(target);
+        ASSERT_TRUE(f.Write("partial"));
+        // destroyed without Commit: neither target nor temporary remains
+    }
+    EXPECT_FALSE(Port::File::exist(target.c_str()));
+    EXPECT_TRUE(std::filesystem::is_empty(dir));
+    {
+        Port::AtomicFile f(target);
+        ASSERT_TRUE(f.Write("done"));
+        ASSERT_TRUE(f.Commit());
+    }
+    std::ifstream in(target);
+    std::string content;
+    in >> content;
+    EXPECT_EQ(content, "done");
+    Port::AtomicFile bad((dir / "missing" / "x").string());
+    EXPECT_FALSE(bad.Commit());
+    EXPECT_FALSE(bad.error().empty());
+    std::filesystem::remove_all(dir);
+}
+
+TEST(FileTest, EnvAndDirectories) {
+    ::setenv("LUN_TEST_EMPTY_VAR", "", 1);
+    ASSERT_NE(Port_Env::GetEnv("LUN_TEST_EMPTY_VAR"), nullptr);  // empty counts as set
+    ::unsetenv("LUN_TEST_EMPTY_VAR");
+    EXPECT_EQ(Port_Env::GetEnv("LUN_TEST_EMPTY_VAR"), nullptr);
+    auto dir = std::filesystem::temp_directory_path() / ("lun_mk_" + std::to_string(getpid()));
+    std::string nested = (dir / "a" / "b").string();
+    EXPECT_FALSE(Port::File::mkdir(nested.c_str(), false));
+    EXPECT_TRUE(Port::File::mkdir(nested.c_str(), true));
+    EXPECT_TRUE(Port::File::exist(nested.c_str()));
+    std::filesystem::remove_all(dir);
+}
+
+}  // namespace
