@@ -177,6 +177,12 @@ Ndm_Pin* Ndm_Block::CreatePin(const char* name, Ndm_Dir dir) {
     return pin;
 }
 
+void Ndm_Block::Reserve(size_t blocks, size_t signals, size_t pins) {
+    if (blocks) blocks_.reserve(blocks_.size() + blocks);
+    if (signals) signals_.reserve(signals_.size() + signals);
+    if (pins) pins_.reserve(pins_.size() + pins);
+}
+
 void Ndm_Block::Release() {
     for (Ndm_Block* child : blocks_) child->Release();
     for (Ndm_Signal* signal : signals_) {

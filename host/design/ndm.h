@@ -119,6 +119,9 @@ public:
     // Appends a signal or a pin.
     Ndm_Signal* CreateSignal(const char* name);
     Ndm_Pin* CreatePin(const char* name, Ndm_Dir dir = Ndm_Dir::None);
+    // Reserves room for that many more members of each kind (readers that know the counts
+    // avoid regrowing the member lists).
+    void Reserve(size_t blocks, size_t signals, size_t pins);
 
     // First member in stored order with exactly this name, or null.
     Ndm_Block* GetBlockByName(const char* name) const;
@@ -214,6 +217,8 @@ public:
     Ndm_Design& operator=(const Ndm_Design&) = delete;
 
     const char* GetName() const { return name_; }
+    // Renames the design (readers learn the name only after parsing).
+    void SetName(std::string_view name) { name_ = Intern(name); }
     // View of that name, or null.
     Ndm_View* GetViewByName(const char* name) const;
     // Views in creation order.

@@ -1,0 +1,174 @@
+#include "host/design/dump.h"
+
+#include <cstdio>
+#include <string>
+
+namespace {
+
+class Dumper {
+public:
+    explicit Dumper(std::ostream& out) : out_(out) { buf_.reserve(kFlush + 4096); }
+    ~Dumper() { Flush(); }
+
+    void Design(const Ndm_Design& design) {
+        Line(0, "design");
+        Quoted(design.GetName());
+        End();
+        Properties(design, 1);
+        for (const Ndm_View* view : design.GetViewItr()) View(*view);
+    }
+
+private:
+    static constexpr size_t kFlush = 1 << 16;
+
+    void View(const Ndm_View& view) {
+        Line(0, "view");
+        Quoted(view.GetName());
+        End();
+        Properties(view, 1);
+        if (const Ndm_Block* top = view.GetBlock()) Block(*top, 1);
+        for (const Ndm_Network* net : view.GetNetworkItr()) {
+            Line(1, "network");
+            Quoted(net->GetName());
+            buf_ += " signals ";
+            buf_ += std::to_string(net->GetNumSignals());
+            End();
+            Properties(*net, 2);
+            for (const Ndm_Signal* s = net->GetFirstSignal(); s; s = s->GetNextInNetwork()) {
+                Line(2, "signal");
+                FullName(*s);
+                End();
+            }
+        }
+    }
+
+    void Block(const Ndm_Block& block, int depth) {
+        Line(depth, "block");
+        if (block.GetParent()) {
+            FullName(block);
+        } else {
+            Quoted(block.GetName());  // the top block's full name is empty
+        }
+        buf_ += " type ";
+        Quoted(block.GetTypeName());
+        End();
+        Properties(block, depth + 1);
+        for (const Ndm_Signal* signal : block.GetSignalItr()) {
+            Line(depth + 1, "signal");
+            FullName(*signal);
+            End();
+            Properties(*signal, depth + 2);
+        }
+        for (const Ndm_Pin* pin : block.GetPinItr()) {
+            Line(depth + 1, "pin");
+            FullName(*pin);
+            buf_ += ' ';
+            buf_ += pin->GetDirection() == Ndm_Dir::None ? "none" : Ndm_DirName(pin->GetDirection());
+            if (const Ndm_Signal* signal = pin->GetSignal()) {
+                buf_ += " -> ";
+                FullName(*signal);
+            }
+            End();
+            Properties(*pin, depth + 2);
+        }
+        for (const Ndm_Block* child : block.GetBlockItr()) Block(*child, depth + 1);
+    }
+
+    void Properties(const Ndm_PropertyHolder& holder, int depth) {
+        for (const Ndm_Property* p : holder.GetPropertyItr()) Property(*p, depth);
+    }
+
+    void Property(const Ndm_Property& p, int depth) {
+        Line(depth, "%");
+        Quoted(p.GetName());
+        buf_ += ' ';
+        const char* type = Ndm_PropTypeName(p.GetType());
+        buf_ += type ? type : "unknown";
+        buf_ += ' ';
+        switch (p.GetType()) {
+            case NDM_PROP_BOOL: buf_ += p.GetBool() ? "true" : "false"; break;
+            case NDM_PROP_INT32: buf_ += std::to_string(p.GetInt32()); break;
+            case NDM_PROP_FLOAT64: {
+                char num[32];
+                std::snprintf(num, sizeof num, "%.17g", p.GetFloat64());
+                buf_ += num;
+                break;
+            }
+            case NDM_PROP_STRING: Quoted(p.GetValueString()); break;
+            case NDM_PROP_STRING_LIST: {
+                buf_ += '[';
+                bool first = true;
+                for (const std::string& s : p.GetStrings()) {
+                    if (!first) buf_ += ", ";
+                    first = false;
+                    Quoted(s.c_str(), s.size());
+                }
+                buf_ += ']';
+                break;
+            }
+            case NDM_PROP_LIST: buf_ += std::to_string(p.GetNumEntries()); break;
+            default: break;
+        }
+        End();
+        for (const Ndm_Property* e : p.GetListItr()) Property(*e, depth + 1);
+    }
+
+    void Line(int depth, const char* word) {
+        buf_.append(static_cast<size_t>(depth) * 2, ' ');
+        buf_ += word;
+        buf_ += ' ';
+    }
+
+    void End() {
+        buf_ += '\n';
+        if (buf_.size() >= kFlush) Flush();
+    }
+
+    void Flush() {
+        out_.write(buf_.data(), static_cast<std::streamsize>(buf_.size()));
+        buf_.clear();
+    }
+
+    template <class T>
+    void FullName(const T& object) {
+        name_.clear();
+        name_ = object.GetFullName();
+        Quoted(name_.c_str(), name_.size());
+    }
+
+    void Quoted(const char* text) { Quoted(text ? text : "", text ? std::char_traits<char>::length(text) : 0); }
+
+    void Quoted(const char* text, size_t size) {
+        buf_ += '"';
+        for (size_t i = 0; i < size; ++i) {
+            unsigned char c = static_cast<unsigned char>(text[i]);
+            switch (c) {
+                case '"': buf_ += "\\\""; break;
+                case '\\': buf_ += "\\\\"; break;
+                case '\n': buf_ += "\\n"; break;
+                case '\t': buf_ += "\\t"; break;
+                case '\r': buf_ += "\\r"; break;
+                default:
+                    if (c < 0x20 || c == 0x7f) {
+                        char hex[8];
+                        std::snprintf(hex, sizeof hex, "\\u%04x", c);
+                        buf_ += hex;
+                    } else {
+                        buf_ += static_cast<char>(c);
+                    }
+            }
+        }
+        buf_ += '"';
+    }
+
+    std::ostream& out_;
+    std::string buf_;
+    std::string name_;
+};
+
+}  // namespace
+
+void Ndm_Dump(const Ndm_Design& design, std::ostream& out) {
+    Dumper dumper(out);
+    dumper.Design(design);
+}

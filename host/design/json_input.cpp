@@ -1,0 +1,233 @@
+#include "host/design/json_input.h"
+
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+
+namespace Ndm_JsonInput {
+
+namespace {
+
+struct FileCloser {
+    void operator()(FILE* f) const { std::fclose(f); }
+};
+
+int HexDigit(char c) {
+    if (c >= '0' && c <= '9') return c - '0';
+    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
+    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
+    return -1;
+}
+
+bool Hex4(const char* p, uint32_t& out) {
+    out = 0;
+    for (int i = 0; i < 4; ++i) {
+        int d = HexDigit(p[i]);
+        if (d < 0) return false;
+        out = out * 16 + static_cast<uint32_t>(d);
+    }
+    return true;
+}
+
+void AppendUtf8(std::string& out, uint32_t cp) {
+    if (cp < 0x80) {
+        out += static_cast<char>(cp);
+    } else if (cp < 0x800) {
+        out += static_cast<char>(0xC0 | (cp >> 6));
+        out += static_cast<char>(0x80 | (cp & 0x3F));
+    } else if (cp < 0x10000) {
+        out += static_cast<char>(0xE0 | (cp >> 12));
+        out += static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
+        out += static_cast<char>(0x80 | (cp & 0x3F));
+    } else {
+        out += static_cast<char>(0xF0 | (cp >> 18));
+        out += static_cast<char>(0x80 | ((cp >> 12) & 0x3F));
+        out += static_cast<char>(0x80 | ((cp >> 6) & 0x3F));
+        out += static_cast<char>(0x80 | (cp & 0x3F));
+    }
+}
+
+// Offset of the first byte that does not start a valid UTF-8 sequence, or size.
+size_t FirstBadUtf8(const unsigned char* s, size_t size) {
+    size_t i = 0;
+    while (i < size) {
+        unsigned char c = s[i];
+        size_t n;
+        uint32_t min;
+        if (c < 0x80) {
+            ++i;
+            continue;
+        } else if ((c & 0xE0) == 0xC0) {
+            n = 1, min = 0x80;
+        } else if ((c & 0xF0) == 0xE0) {
+            n = 2, min = 0x800;
+        } else if ((c & 0xF8) == 0xF0) {
+            n = 3, min = 0x10000;
+        } else {
+            return i;
+        }
+        if (i + n >= size) return i;
+        uint32_t cp = c & (0x3F >> n);
+        for (size_t k = 1; k <= n; ++k) {
+            if ((s[i + k] & 0xC0) != 0x80) return i;
+            cp = (cp << 6) | (s[i + k] & 0x3F);
+        }
+        if (cp < min || cp > 0x10FFFF || (cp >= 0xD800 && cp <= 0xDFFF)) return i;
+        i += n + 1;
+    }
+    return size;
+}
+
+// Offset of the opening quote of a string that is never closed, or size.
+size_t UnclosedQuote(const char* s, size_t size) {
+    size_t open = size;
+    bool in_string = false;
+    for (size_t i = 0; i < size; ++i) {
+        char c = s[i];
+        if (in_string) {
+            if (c == '\\')
+                ++i;
+            else if (c == '"')
+                in_string = false;
+        } else if (c == '"') {
+            in_string = true;
+            open = i;
+        }
+    }
+    return in_string ? open : size;
+}
+
+}  // namespace
+
+bool LoadFile(const char* path, simdjson::padded_string& out, std::string& error) {
+    std::unique_ptr<FILE, FileCloser> file(std::fopen(path, "rb"));
+    if (!file) {
+        error = std::strerror(errno);
+        return false;
+    }
+    struct stat st {};
+    if (::fstat(fileno(file.get()), &st) != 0) {
+        error = std::strerror(errno);
+        return false;
+    }
+    if (S_ISDIR(st.st_mode)) {
+        error = "it is a directory";
+        return false;
+    }
+    size_t size = static_cast<size_t>(st.st_size);
+    simdjson::padded_string buf(size);
+    if (size && buf.data() == nullptr) {
+        error = "out of memory";
+        return false;
+    }
+    size_t got = size ? std::fread(buf.data(), 1, size, file.get()) : 0;
+    if (got != size) {
+        error = std::ferror(file.get()) ? std::strerror(errno) : "the file changed while being read";
+        return false;
+    }
+    out = std::move(buf);
+    return true;
+}
+
+bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out) {
+    const char* begin = raw.raw();
+    const char* p = begin;
+    // Stage 1 has validated string boundaries: an unescaped quote ends the string.
+    const char* escape = nullptr;
+    for (;; ++p) {
+        char c = *p;
+        if (c == '"') break;
+        if (c == '\\') {
+            if (!escape) escape = p;
+            ++p;
+        }
+    }
+    if (!escape) {
+        out = std::string_view(begin, static_cast<size_t>(p - begin));
+        return true;
+    }
+    const char* end = p;
+    scratch.assign(begin, static_cast<size_t>(escape - begin));
+    for (p = escape; p < end; ++p) {
+        if (*p != '\\') {
+            scratch += *p;
+            continue;
+        }
+        char e = *++p;
+        switch (e) {
+            case '"': scratch += '"'; break;
+            case '\\': scratch += '\\'; break;
+            case '/': scratch += '/'; break;
+            case 'b': scratch += '\b'; break;
+            case 'f': scratch += '\f'; break;
+            case 'n': scratch += '\n'; break;
+            case 'r': scratch += '\r'; break;
+            case 't': scratch += '\t'; break;
+            case 'u': {
+                uint32_t cp;
+                if (end - p < 5 || !Hex4(p + 1, cp)) return false;
+                p += 4;
+                if (cp >= 0xD800 && cp <= 0xDBFF) {
+                    uint32_t lo;
+                    if (end - p < 7 || p[1] != '\\' || p[2] != 'u' || !Hex4(p + 3, lo) || lo < 0xDC00 ||
+                        lo > 0xDFFF)
+                        return false;
+                    p += 6;
+                    cp = 0x10000 + ((cp - 0xD800) << 10) + (lo - 0xDC00);
+                } else if (cp >= 0xDC00 && cp <= 0xDFFF) {
+                    return false;
+                }
+                AppendUtf8(scratch, cp);
+                break;
+            }
+            default: return false;
+        }
+    }
+    out = scratch;
+    return true;
+}
+
+size_t Offset(simdjson::ondemand::document& doc, const simdjson::padded_string& buf) {
+    const char* at = nullptr;
+    if (doc.current_location().get(at) || !at) return buf.size();
+    if (at < buf.data() || at > buf.data() + buf.size()) return buf.size();
+    return static_cast<size_t>(at - buf.data());
+}
+
+size_t EarlyErrorOffset(simdjson::error_code error, const simdjson::padded_string& buf) {
+    if (error == simdjson::UTF8_ERROR)
+        return FirstBadUtf8(reinterpret_cast<const unsigned char*>(buf.data()), buf.size());
+    if (error == simdjson::UNCLOSED_STRING) return UnclosedQuote(buf.data(), buf.size());
+    if (error == simdjson::EMPTY) return 0;
+    return buf.size();
+}
+
+const char* SyntaxReason(simdjson::error_code error) {
+    switch (error) {
+        case simdjson::EMPTY: return "no JSON value";
+        case simdjson::UTF8_ERROR: return "invalid UTF-8";
+        case simdjson::UNCLOSED_STRING: return "unclosed string";
+        case simdjson::UNESCAPED_CHARS: return "control character inside a string";
+        case simdjson::STRING_ERROR: return "malformed string";
+        case simdjson::NUMBER_ERROR: return "malformed number";
+        case simdjson::T_ATOM_ERROR:
+        case simdjson::F_ATOM_ERROR:
+        case simdjson::N_ATOM_ERROR: return "malformed literal";
+        case simdjson::DEPTH_ERROR: return "nesting too deep";
+        case simdjson::INCOMPLETE_ARRAY_OR_OBJECT: return "the text ends inside an array or object";
+        case simdjson::TRAILING_CONTENT: return "unexpected text after the JSON value";
+        case simdjson::CAPACITY: return "the file is too large (4 GB at most)";
+        case simdjson::MEMALLOC: return "out of memory";
+        default: return "malformed JSON";
+    }
+}
+
+bool IsSyntaxError(simdjson::error_code error) {
+    return error != simdjson::SUCCESS && error != simdjson::INCORRECT_TYPE &&
+           error != simdjson::NUMBER_OUT_OF_RANGE && error != simdjson::NO_SUCH_FIELD;
+}
+
+}  // namespace Ndm_JsonInput
