@@ -1,1 +1,52 @@
 // Shared helpers of the test programs.
+#include "support/test_support.h"
+
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+namespace lun_test {
+
+ScratchDir::ScratchDir() {
+    static std::atomic<int> counter{0};
+    auto dir = std::filesystem::temp_directory_path() /
+               ("lun_test_" + std::to_string(getpid()) + "_" + std::to_string(counter++));
+    std::filesystem::remove_all(dir);
+    std::filesystem::create_directories(dir);
+    path_ = dir.string();
+}
+
+ScratchDir::~ScratchDir() {
+    std::error_code ec;
+    std::filesystem::remove_all(path_, ec);
+}
+
+std::string ScratchDir::Write(const std::string& name, const std::string& content) const {
+    std::string file = path_ + "/" + name;
+    std::ofstream out(file, std::ios::binary);
+    out << content;
+    return file;
+}
+
+std::string ReadFile(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::ostringstream text;
+    text << in.rdbuf();
+    return text.str();
+}
+
+int RunCommand(const std::string& command, std::string* out, std::string* err) {
+    ScratchDir dir;
+    std::string full = command + " >" + dir.path() + "/out 2>" + dir.path() + "/err";
+    int status = std::system(full.c_str());
+    if (out) *out = ReadFile(dir.path() + "/out");
+    if (err) *err = ReadFile(dir.path() + "/err");
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+}  // namespace lun_test
