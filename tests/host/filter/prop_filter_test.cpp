@@ -104,13 +104,9 @@ protected:
     Ndh_PropInFilter filter{path.c_str(), nullptr};
 };
 
-TEST_F(FilterTest, ValidDefinitionsIssueNoMessage) {
-    EXPECT_TRUE(filter.IsValid());
-    EXPECT_EQ(filter.GetError(), "");
-    EXPECT_TRUE(capture.messages().empty());
-}
-
 TEST_F(FilterTest, FiveVerdicts) {
+    ASSERT_TRUE(filter.IsValid());
+    EXPECT_TRUE(capture.messages().empty());
     auto ok = RunStr(filter, obj.net, "LOC", "P10");
     EXPECT_TRUE(ok.Succeed());
     EXPECT_EQ(ok.GetFlags(), unsigned(Ndh_PropFiltResult::kSucceed));
@@ -417,18 +413,14 @@ TEST_P(ShippedFilter, ValueShapesOfRealFiles) {
     Objects obj;
     Ndh_PropInFilter filter(Path().c_str(), nullptr);
     EXPECT_TRUE(RunStr(filter, obj.net, "loc", "P1,P2,P3").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.pin, "LOC", "SITE_A0").Succeed());
     EXPECT_TRUE(RunStr(filter, obj.inst, "LOC", "SITE_X0Y58").Succeed());
     EXPECT_TRUE(RunStr(filter, obj.net, "DRIVE", "8").Succeed());
     EXPECT_EQ(obj.net->GetPropertyByName("DRIVE")->GetInt32(), 8);
-    EXPECT_TRUE(RunStr(filter, obj.net, "SLEW", "QUIETIO").Succeed());
     EXPECT_TRUE(RunFlag(filter, obj.net, "pullup").Succeed());
-    EXPECT_TRUE(RunFlag(filter, obj.net, "KEEPER").Succeed());
     EXPECT_TRUE(RunFlag(filter, obj.net, "KEEP").Succeed());
     // FALSE is the meaningful value here: kept as text, not dropped as a false flag.
     EXPECT_TRUE(RunStr(filter, obj.net, "CLOCK_DEDICATED_ROUTE", "FALSE").Succeed());
     EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.net, "CLOCK_DEDICATED_ROUTE"), "FALSE");
-    EXPECT_TRUE(RunStr(filter, obj.net, "TNM_NET", "FFS : grp").Succeed());
     EXPECT_TRUE(RunStr(filter, obj.net, "PERIOD", "10000.000000 pS HIGH 50.000000 %").Succeed());
     EXPECT_TRUE(RunStr(filter, obj.net, "TIG", "TS_a").Succeed());
     EXPECT_TRUE(RunStr(filter, obj.net, "TIG", "TS_b").Succeed());
@@ -444,8 +436,6 @@ TEST_P(ShippedFilter, ValueShapesOfRealFiles) {
     EXPECT_EQ(obj.config->GetPropertyByName("PLACE")->GetStrings().size(), 2u);
     EXPECT_TRUE(RunStr(filter, obj.config, "RLOC_RANGE", "set1 = X0Y0:X3Y3").Succeed());
     EXPECT_EQ(obj.config->GetPropertyByName("RLOC_RANGE")->GetType(), NDM_PROP_STRING);
-    EXPECT_TRUE(RunStr(filter, obj.net, "FROM_UCF", "LOC").BadPropName());
-    EXPECT_TRUE(RunStr(filter, obj.net, "DRIVE", "strong").BadDataType());
     EXPECT_TRUE(RunStr(filter, obj.config, "LOC", "P1").BadDataType());
 }
 
