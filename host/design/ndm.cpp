@@ -42,6 +42,37 @@ T* ScanFolded(const std::vector<T*>& members, const std::string& folded) {
     return nullptr;
 }
 
+// Three-way comparison of a name with a text, byte-wise, optionally folding ASCII case.
+int CompareName(const char* name, std::string_view text, bool fold) {
+    size_t i = 0;
+    for (; name[i] && i < text.size(); ++i) {
+        unsigned char a = static_cast<unsigned char>(name[i]);
+        unsigned char b = static_cast<unsigned char>(text[i]);
+        if (fold) {
+            if (a >= 'A' && a <= 'Z') a = static_cast<unsigned char>(a + 32);
+            if (b >= 'A' && b <= 'Z') b = static_cast<unsigned char>(b + 32);
+        }
+        if (a != b) return a < b ? -1 : 1;
+    }
+    if (i == text.size()) return name[i] ? 1 : 0;
+    return -1;
+}
+
+// Whether name starts with prefix (optionally folding ASCII case).
+bool HasPrefix(const char* name, std::string_view prefix, bool fold) {
+    for (size_t i = 0; i < prefix.size(); ++i) {
+        unsigned char a = static_cast<unsigned char>(name[i]);
+        unsigned char b = static_cast<unsigned char>(prefix[i]);
+        if (a == 0) return false;
+        if (fold) {
+            if (a >= 'A' && a <= 'Z') a = static_cast<unsigned char>(a + 32);
+            if (b >= 'A' && b <= 'Z') b = static_cast<unsigned char>(b + 32);
+        }
+        if (a != b) return false;
+    }
+    return true;
+}
+
 int Depth(const Ndm_Block* block) {
     int d = 0;
     for (const Ndm_Block* b = block; b && b->GetParent(); b = b->GetParent()) ++d;
@@ -50,28 +81,69 @@ int Depth(const Ndm_Block* block) {
 
 }  // namespace
 
-// Per-block hash indexes of members by exact and by case-folded interned name.
+// Per-block hash indexes of members by exact and by case-folded interned name. Name-sorted
+// member lists (exact and folded; stored order among equal names) answer prefix queries and
+// "every member of that name" when names repeat; they are made on the first such query.
 class Ndm_MemberIndex {
 public:
     Ndm_PtrMap exact[3];
     Ndm_PtrMap folded[3];
     bool built[3] = {false, false, false};
+    bool dup_exact[3] = {false, false, false};   // some name occurs twice
+    bool dup_folded[3] = {false, false, false};  // some name occurs twice ignoring case
+    uint32_t max_len[3] = {0, 0, 0};             // longest member name
+    std::unique_ptr<std::vector<void*>> sorted[3][2];  // [category][fold]
+
+    static const char* NameOf(int category, const void* member) {
+        switch (category) {
+            case kBlocks: return static_cast<const Ndm_Block*>(member)->GetName();
+            case kSignals: return static_cast<const Ndm_Signal*>(member)->GetName();
+            default: return static_cast<const Ndm_Pin*>(member)->GetName();
+        }
+    }
 
     void Add(Ndm_Design* design, int category, const char* name, void* member) {
-        exact[category].InsertIfAbsent(name, member);
-        folded[category].InsertIfAbsent(design->Intern(FoldName(name)), member);
+        if (exact[category].InsertIfAbsent(name, member) != member) dup_exact[category] = true;
+        if (folded[category].InsertIfAbsent(design->Intern(FoldName(name)), member) != member)
+            dup_folded[category] = true;
+        size_t len = std::strlen(name);
+        if (len > max_len[category]) max_len[category] = static_cast<uint32_t>(len);
+        // A new member is last in stored order: it goes after the equal names.
+        for (int fold = 0; fold < 2; ++fold) {
+            std::vector<void*>* list = sorted[category][fold].get();
+            if (!list) continue;
+            auto at = std::upper_bound(list->begin(), list->end(), name,
+                                       [&](const char* key, const void* m) {
+                                           return CompareName(key, NameOf(category, m), fold) < 0;
+                                       });
+            list->insert(at, member);
+        }
     }
     template <class T>
     void Build(Ndm_Design* design, int category, const std::vector<T*>& members) {
-        exact[category].Clear();
-        folded[category].Clear();
+        Drop(category);
         for (T* m : members) Add(design, category, m->GetName(), m);
         built[category] = true;
+    }
+    template <class T>
+    std::vector<void*>& Sorted(int category, bool fold, const std::vector<T*>& members) {
+        std::unique_ptr<std::vector<void*>>& list = sorted[category][fold ? 1 : 0];
+        if (!list) {
+            list = std::make_unique<std::vector<void*>>(members.begin(), members.end());
+            std::stable_sort(list->begin(), list->end(), [&](const void* a, const void* b) {
+                return CompareName(NameOf(category, a), NameOf(category, b), fold) < 0;
+            });
+        }
+        return *list;
     }
     void Drop(int category) {
         exact[category].Clear();
         folded[category].Clear();
         built[category] = false;
+        dup_exact[category] = dup_folded[category] = false;
+        max_len[category] = 0;
+        sorted[category][0].reset();
+        sorted[category][1].reset();
     }
 };
 
@@ -152,6 +224,7 @@ Ndm_Block* Ndm_Block::CreateBlock(const char* name, unsigned int /*flags*/) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = design->Intern(name);
     Ndm_Block* block = &design->block_pool_.emplace_back(Ndm_Token(), stored, this, view_);
+    block->order_ = blocks_.empty() ? 0 : blocks_.back()->order_ + 1;
     blocks_.push_back(block);
     if (index_ && index_->built[kBlocks]) index_->Add(design, kBlocks, stored, block);
     return block;
@@ -162,6 +235,7 @@ Ndm_Signal* Ndm_Block::CreateSignal(const char* name) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = design->Intern(name);
     Ndm_Signal* signal = &design->signal_pool_.emplace_back(Ndm_Token(), stored, this);
+    signal->order_ = signals_.empty() ? 0 : signals_.back()->order_ + 1;
     signals_.push_back(signal);
     if (index_ && index_->built[kSignals]) index_->Add(design, kSignals, stored, signal);
     return signal;
@@ -245,6 +319,87 @@ Ndm_Signal* Ndm_Block::GetSignalByIName(const char* name) const {
     return Lookup(signals_, kSignals, name, true);
 }
 Ndm_Pin* Ndm_Block::GetPinByIName(const char* name) const { return Lookup(pins_, kPins, name, true); }
+
+void Ndm_Block::GetBlocksByName(std::string_view name, bool ignore_case,
+                                std::vector<Ndm_Block*>& out) const {
+    if (blocks_.size() <= kSmall) {
+        for (Ndm_Block* b : blocks_)
+            if (CompareName(b->name_, name, ignore_case) == 0) out.push_back(b);
+        return;
+    }
+    Ndm_Design* design = view_->GetDesign();
+    Ndm_MemberIndex& idx = Index();
+    if (!idx.built[kBlocks]) idx.Build(design, kBlocks, blocks_);
+    if (name.size() > idx.max_len[kBlocks]) return;
+    std::string folded;
+    if (ignore_case) {
+        folded.assign(name);
+        for (char& c : folded)
+            if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+    }
+    const char* key = design->FindInterned(ignore_case ? std::string_view(folded) : name);
+    if (!key) return;
+    void* first = (ignore_case ? idx.folded : idx.exact)[kBlocks].Find(key);
+    if (!first) return;
+    if (!(ignore_case ? idx.dup_folded : idx.dup_exact)[kBlocks]) {
+        out.push_back(static_cast<Ndm_Block*>(first));
+        return;
+    }
+    std::vector<void*>& list = idx.Sorted(kBlocks, ignore_case, blocks_);
+    auto at = std::lower_bound(list.begin(), list.end(), name, [&](const void* m, std::string_view key) {
+        return CompareName(static_cast<const Ndm_Block*>(m)->name_, key, ignore_case) < 0;
+    });
+    for (; at != list.end() && CompareName(static_cast<Ndm_Block*>(*at)->name_, name, ignore_case) == 0; ++at)
+        out.push_back(static_cast<Ndm_Block*>(*at));
+}
+
+template <class T>
+void Ndm_Block::ByPrefix(const std::vector<T*>& members, int category, std::string_view prefix,
+                         bool ignore_case, std::vector<T*>& out) const {
+    if (prefix.empty()) {
+        out.insert(out.end(), members.begin(), members.end());
+        return;
+    }
+    if (members.size() <= kSmall) {
+        for (T* m : members)
+            if (HasPrefix(m->GetName(), prefix, ignore_case)) out.push_back(m);
+        return;
+    }
+    Ndm_Design* design = view_->GetDesign();
+    Ndm_MemberIndex& idx = Index();
+    if (!idx.built[category]) idx.Build(design, category, members);
+    if (prefix.size() > idx.max_len[category]) return;
+    std::vector<void*>& list = idx.Sorted(category, ignore_case, members);
+    auto at = std::lower_bound(list.begin(), list.end(), prefix, [&](const void* m, std::string_view key) {
+        return CompareName(static_cast<const T*>(m)->GetName(), key, ignore_case) < 0;
+    });
+    size_t start = out.size();
+    for (; at != list.end() && HasPrefix(static_cast<T*>(*at)->GetName(), prefix, ignore_case); ++at)
+        out.push_back(static_cast<T*>(*at));
+    std::sort(out.begin() + static_cast<std::ptrdiff_t>(start), out.end(),
+              [](const T* a, const T* b) { return a->GetOrder() < b->GetOrder(); });
+}
+
+void Ndm_Block::GetBlocksByPrefix(std::string_view prefix, bool ignore_case,
+                                  std::vector<Ndm_Block*>& out) const {
+    ByPrefix(blocks_, kBlocks, prefix, ignore_case, out);
+}
+
+void Ndm_Block::GetSignalsByPrefix(std::string_view prefix, bool ignore_case,
+                                   std::vector<Ndm_Signal*>& out) const {
+    ByPrefix(signals_, kSignals, prefix, ignore_case, out);
+}
+
+size_t Ndm_Block::GetMaxBlockNameLength() const {
+    if (blocks_.size() <= kSmall) {
+        size_t len = 0;
+        for (const Ndm_Block* b : blocks_) len = std::max(len, std::strlen(b->name_));
+        return len;
+    }
+    Ndm_MemberIndex& idx = Index();
+    if (!idx.built[kBlocks]) idx.Build(view_->GetDesign(), kBlocks, blocks_);
+    return idx.max_len[kBlocks];
+}
 
 // ---- networks ----
 

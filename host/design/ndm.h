@@ -45,6 +45,8 @@ public:
     Ndm_Signal(Ndm_Token, const char* name, Ndm_Block* block)
         : Ndm_PropertyHolder(Ndm_ObjKind::Signal), name_(name), block_(block) {}
     const char* GetName() const { return name_; }
+    // Stored-order key among the signals of the block: a later signal has a larger key.
+    uint32_t GetOrder() const { return order_; }
     // Owner block's full name, "/", the name (just the name in the top block).
     std::string GetFullName() const;
     Ndm_Block* GetBlock() const { return block_; }
@@ -58,6 +60,7 @@ private:
     friend class Ndm_Network;
     friend class Ndm_Design;
 
+    uint32_t order_ = 0;  // fits in the base's tail padding
     const char* name_;
     Ndm_Block* block_;
     Ndm_Network* network_ = nullptr;
@@ -94,6 +97,8 @@ class Ndm_Block : public Ndm_PropertyHolder {
 public:
     Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* view);
     const char* GetName() const { return name_; }
+    // Stored-order key among the children of the parent: a later child has a larger key.
+    uint32_t GetOrder() const { return order_; }
     // Names from below the top block joined by "/"; empty for the top block.
     std::string GetFullName() const;
     // Appends the full name to out (no allocation when out has room).
@@ -132,6 +137,17 @@ public:
     Ndm_Signal* GetSignalByIName(const char* name) const;
     Ndm_Pin* GetPinByIName(const char* name) const;
 
+    // Appends every child block whose name is name (exactly, or ignoring ASCII case), in
+    // stored order.
+    void GetBlocksByName(std::string_view name, bool ignore_case, std::vector<Ndm_Block*>& out) const;
+    // Appends every child block (signal) whose name starts with prefix, in stored order.
+    void GetBlocksByPrefix(std::string_view prefix, bool ignore_case,
+                           std::vector<Ndm_Block*>& out) const;
+    void GetSignalsByPrefix(std::string_view prefix, bool ignore_case,
+                            std::vector<Ndm_Signal*>& out) const;
+    // Length of the longest child block name (0 without children).
+    size_t GetMaxBlockNameLength() const;
+
     ~Ndm_Block();
 
 private:
@@ -141,8 +157,12 @@ private:
     template <class T>
     T* Lookup(const std::vector<T*>& members, int category, const char* name,
               bool ignore_case) const;
+    template <class T>
+    void ByPrefix(const std::vector<T*>& members, int category, std::string_view prefix,
+                  bool ignore_case, std::vector<T*>& out) const;
     void Release();  // drops members and properties of a deleted subtree
 
+    uint32_t order_ = 0;  // fits in the base's tail padding
     const char* name_;
     const char* type_ = "";
     Ndm_Block* parent_;
