@@ -1,0 +1,43 @@
+#include "host/design/design_io.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <string>
+
+#include "host/design/native_format.h"
+#include "host/design/yosys_reader.h"
+#include "host/port/msgman.h"
+
+namespace {
+
+const Port_MsgManData& Msg() {
+    static const Port_MsgManData msg =
+        Port_MsgManData::createObject("Quillmap", "netlist", __LINE__, "1.0");
+    return msg;
+}
+
+}  // namespace
+
+std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_module) {
+    if (!path) return nullptr;
+    // The marker is the first member of a native file, so the head of the file tells.
+    char head[512];
+    size_t got = 0;
+    if (FILE* f = std::fopen(path, "rb")) {
+        got = std::fread(head, 1, sizeof head, f);
+        std::fclose(f);
+    } else {
+        Msg().issueError("%s", Port_Format("Cannot read design file '%s': %s.", path, std::strerror(errno)).c_str());
+        return nullptr;
+    }
+    if (!Ndm_IsNativeText(head, got)) return Ndm_ReadYosysJson(path, top_module);
+    auto design = Ndm_ReadNative(path);
+    if (design && top_module && std::strcmp(design->GetName(), top_module) != 0) {
+        Msg().issueError("%s", Port_Format("Design file '%s' holds design '%s', not '%s'.", path,
+                                           design->GetName(), top_module)
+                                   .c_str());
+        return nullptr;
+    }
+    return design;
+}
