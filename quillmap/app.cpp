@@ -34,6 +34,7 @@ int QuillmapMain(int argc, char** argv) {
     app.add_flag("--debug", options.debug, "Show the debug channel (trace lines)");
 
     QuillmapAction run;
+    AddAnnotateCommand(app, run, options);
     AddDesignCommands(app, run);
 
     try {

@@ -25,5 +25,6 @@ std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const st
 // Each subcommand registers itself and sets run to its action, which returns an exit status.
 using QuillmapAction = std::function<int()>;
 void AddDesignCommands(CLI::App& app, QuillmapAction& run);
+void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
 
 int QuillmapMain(int argc, char** argv);

@@ -1,0 +1,111 @@
+// The annotate subcommand: runs the constraint files over a design and saves the result.
+#include <CLI/CLI.hpp>
+#include <string>
+#include <vector>
+
+#include "host/design/native_format.h"
+#include "host/design/ndm.h"
+#include "host/port/msgman.h"
+#include "manager/lunmgr.h"
+#include "quillmap/app.h"
+
+namespace {
+
+struct AnnotateArgs {
+    std::string design;
+    std::string top;
+    std::vector<std::string> ucf;
+    std::vector<std::string> ncf;
+    std::string filter;
+    bool case_sensitive = false;
+    bool case_insensitive = false;
+    bool second_pass = false;
+    std::vector<std::string> best_effort;
+    bool allow_unmatched_locs = false;
+    std::string output;
+    CLI::Option* ucf_opt = nullptr;
+    CLI::Option* ncf_opt = nullptr;
+    CLI::Option* best_effort_opt = nullptr;
+    const CLI::App* cmd = nullptr;
+};
+
+struct ConstraintFile {
+    CP_FILE_TYPE kind;
+    std::string path;
+};
+
+// The constraint files in the order they were given on the command line.
+std::vector<ConstraintFile> FilesInOrder(const AnnotateArgs& args) {
+    std::vector<ConstraintFile> files;
+    size_t u = 0, n = 0;
+    for (const CLI::Option* opt : args.cmd->parse_order()) {
+        if (opt == args.ucf_opt && u < args.ucf.size()) files.push_back({CP_UCF, args.ucf[u++]});
+        if (opt == args.ncf_opt && n < args.ncf.size()) files.push_back({CP_NCF, args.ncf[n++]});
+    }
+    return files;
+}
+
+int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
+    auto design = QuillmapLoadDesign(args.design, args.top);
+    if (!design) return kStatusErrors;
+    Ndm_View* view = design->GetViewByName("EXPANDED");
+    if (!view && !design->GetViewItr().empty()) view = design->GetViewItr().front();
+    if (!view || !view->GetBlock()) {
+        Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+            .issueError("Design '%s' has no view to annotate.\n", args.design.c_str());
+        return kStatusErrors;
+    }
+    for (const ConstraintFile& file : FilesInOrder(args)) {
+        Ta_LunMgr mgr(file.path.c_str(), file.kind, args.filter.empty() ? nullptr : args.filter.c_str());
+        if (args.case_sensitive) mgr.set_case_sensitive(true);
+        if (args.case_insensitive) mgr.set_case_sensitive(false);
+        if (args.second_pass) mgr.set_second_pass(true);
+        if (options.debug) mgr.set_debug_callbacks();
+        if (args.best_effort_opt->count() > 0)
+            mgr.set_best_effort(1, args.best_effort.empty() || args.best_effort.front().empty()
+                                       ? "DEFAULT"
+                                       : args.best_effort.front().c_str());
+        if (args.allow_unmatched_locs) mgr.AllowUnmatchedLocs();
+        mgr.annotate(view);
+    }
+    if (!args.output.empty() && !Ndm_WriteNative(*design, args.output.c_str())) return kStatusErrors;
+    return kStatusOk;
+}
+
+}  // namespace
+
+void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options) {
+    static AnnotateArgs args;
+    CLI::App* cmd = app.add_subcommand(
+        "annotate",
+        "Annotate a design with the constraints of UCF and NCF files.\n"
+        "The files are applied in the order given. Every INST, NET and PIN statement puts its\n"
+        "constraints on the objects it names; timing specifications, groups and global\n"
+        "settings go to constraint blocks. Unmatched names, illegal values and conflicts are\n"
+        "reported with the file name and line.");
+    args.cmd = cmd;
+    cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
+    cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");
+    args.ucf_opt = cmd->add_option("--ucf", args.ucf, "User constraints file (repeatable)");
+    args.ncf_opt = cmd->add_option("--ncf", args.ncf, "Netlist constraints file (repeatable)");
+    cmd->add_option("--filter", args.filter,
+                    "Property definition file (default: ucf.pfd from the data folder)");
+    auto* cs = cmd->add_flag("--case-sensitive", args.case_sensitive,
+                             "Names must match design names exactly (default for NCF files)");
+    cmd->add_flag("--case-insensitive", args.case_insensitive,
+                  "Fall back to a case-insensitive match, reporting each use (default for UCF files)")
+        ->excludes(cs);
+    cmd->add_flag("--second-pass", args.second_pass,
+                  "Second pass over a UCF: objects annotated by the first pass are left alone and no\n"
+                  "timing, group or CONFIG statement is recorded");
+    args.best_effort_opt =
+        cmd->add_option("--best-effort", args.best_effort,
+                        "Pass over INST and NET names that match nothing without a message; the\n"
+                        "optional value labels the run (default DEFAULT)")
+            ->expected(0, 1);
+    cmd->add_flag("--allow-unmatched-locs,--aul", args.allow_unmatched_locs,
+                  "Location constraints (LOC, IOSTANDARD, DRIVE, SLEW) on names that match nothing\n"
+                  "give an information message instead of an error");
+    cmd->add_option("-o,--output", args.output, "Save the annotated design as a native design file");
+    cmd->callback([&run, &options] { run = [&options] { return RunAnnotate(args, options); }; });
+}

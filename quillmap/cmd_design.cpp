@@ -1,0 +1,89 @@
+// Subcommands that read and write whole designs: dump and convert.
+#include <CLI/CLI.hpp>
+#include <fstream>
+#include <sstream>
+#include <iostream>
+
+#include "host/design/design_io.h"
+#include "host/design/dump.h"
+#include "host/design/native_format.h"
+#include "host/design/ndm.h"
+#include "host/port/file.h"
+#include "host/port/msgman.h"
+#include "quillmap/app.h"
+
+namespace {
+
+struct DesignArgs {
+    std::string design;
+    std::string top;
+    std::string output;
+};
+
+void AddDesignArgs(CLI::App* cmd, DesignArgs& args) {
+    cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")
+        ->required();
+    cmd->add_option("--top", args.top,
+                    "Top module of a Yosys netlist (default: the module marked top)");
+}
+
+}  // namespace
+
+std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top) {
+    return Ndm_LoadDesign(path.c_str(), top.empty() ? nullptr : top.c_str());
+}
+
+static void AddDumpCommand(CLI::App& app, QuillmapAction& run) {
+    static DesignArgs args;
+    CLI::App* cmd = app.add_subcommand(
+        "dump",
+        "Print a design's objects and properties in a stable text form.\n"
+        "One object per line, indented by depth: blocks with their type, signals, pins with\n"
+        "direction and connected signal, then the networks; properties indented below\n"
+        "their object as NAME (type) = value. See docs/design-database.md.");
+    AddDesignArgs(cmd, args);
+    cmd->add_option("-o,--output", args.output, "Write the dump to this file instead of stdout");
+    cmd->callback([&run] {
+        run = [] {
+            auto design = QuillmapLoadDesign(args.design, args.top);
+            if (!design) return static_cast<int>(kStatusErrors);
+            if (args.output.empty()) {
+                Ndm_Dump(*design, std::cout);
+                std::cout.flush();
+                return std::cout ? static_cast<int>(kStatusOk) : static_cast<int>(kStatusErrors);
+            }
+            std::ostringstream text;
+            Ndm_Dump(*design, text);
+            Port::AtomicFile out(args.output);
+            if (!out.Write(text.str()) || !out.Commit()) {
+                Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+                    .issueError("Could not write '%s': %s\n", args.output.c_str(), out.error().c_str());
+                return static_cast<int>(kStatusErrors);
+            }
+            return static_cast<int>(kStatusOk);
+        };
+    });
+}
+
+static void AddConvertCommand(CLI::App& app, QuillmapAction& run) {
+    static DesignArgs args;
+    CLI::App* cmd = app.add_subcommand(
+        "convert",
+        "Read a design (Yosys JSON netlist or native design file) and save it as a native\n"
+        "design file, which keeps every property and constraint block.");
+    AddDesignArgs(cmd, args);
+    cmd->add_option("-o,--output", args.output, "Native design file to write")->required();
+    cmd->callback([&run] {
+        run = [] {
+            auto design = QuillmapLoadDesign(args.design, args.top);
+            if (!design) return static_cast<int>(kStatusErrors);
+            return Ndm_WriteNative(*design, args.output.c_str()) ? static_cast<int>(kStatusOk)
+                                                                 : static_cast<int>(kStatusErrors);
+        };
+    });
+}
+
+void AddDesignCommands(CLI::App& app, QuillmapAction& run) {
+    AddDumpCommand(app, run);
+    AddConvertCommand(app, run);
+}
