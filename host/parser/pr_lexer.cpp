@@ -90,6 +90,7 @@ void Lexer::next(Token& tok, Arena& arena) {
             state.pos = size_;
             tok.kind = Tok::End;
             tok.quoted = false;
+            tok.in_quote = false;
             tok.line = state.line;
             tok.col = static_cast<int>(size_ - state.line_start) + 1;
             tok.begin = tok.end = size_;
@@ -118,6 +119,7 @@ void Lexer::next(Token& tok, Arena& arena) {
     tok.col = static_cast<int>(p - state.line_start) + 1;
     tok.begin = p;
     tok.quoted = false;
+    tok.in_quote = false;
     state.at_line_start = false;
     char c = d[p];
     switch (cls(c)) {
@@ -184,6 +186,7 @@ void Lexer::word(Token& tok, Arena& arena) {
                 unsigned char x = static_cast<unsigned char>(d[p]);
                 char text[4] = {'\\', 'x', hex[x >> 4], hex[x & 15]};
                 tok.kind = Tok::BadByte;
+                tok.in_quote = true;
                 tok.col = static_cast<int>(p - state.line_start) + 1;
                 tok.begin = p;
                 tok.end = p + 1;
@@ -275,10 +278,10 @@ void Lexer::comment_line(std::string& text, std::string& line_text) {
     state.at_line_start = false;
 }
 
-bool Lexer::skip_to_semicolon() {
+bool Lexer::skip_to_semicolon(bool in_quote) {
     const char* d = data_;
     std::size_t p = state.pos;
-    bool quoted = false;
+    bool quoted = in_quote;
     while (p < size_) {
         char c = d[p];
         if (c == '\n') {

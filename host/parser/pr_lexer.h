@@ -53,7 +53,8 @@ enum class Tok : std::uint8_t {
 
 struct Token {
     Tok kind = Tok::End;
-    bool quoted = false;  // a word holding at least one quoted section
+    bool quoted = false;     // a word holding at least one quoted section
+    bool in_quote = false;   // BadByte: met inside a quoted section
     int line = 0;
     int col = 0;
     std::size_t begin = 0;  // source range
@@ -83,8 +84,9 @@ public:
     void comment_line(std::string& text, std::string& line_text);
 
     // Passes over bytes up to and including the next ';' outside quoted sections and
-    // comments. False when the file ends first.
-    bool skip_to_semicolon();
+    // comments, starting inside a quoted section when `in_quote`. False when the file ends
+    // first.
+    bool skip_to_semicolon(bool in_quote = false);
 
     // End of the file, less one line end at its very end.
     std::size_t trimmed_end() const;

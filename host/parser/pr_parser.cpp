@@ -162,7 +162,8 @@ private:
 
     enum class Resume : std::uint8_t { SkipToSemicolon, AtSemicolon, NextLine, Eof };
     struct Failure {
-        bool value = false;  // cb_error rather than cb_syntax_error
+        bool value = false;     // cb_error rather than cb_syntax_error
+        bool in_quote = false;  // resume inside a quoted section
         int line = 0;
         int col = 0;
         const char* text = "";
@@ -418,6 +419,7 @@ bool Reader::fail(const Token& t) {
         break;
     default:
         f.text = t.text.data();
+        f.in_quote = t.in_quote;
         break;
     }
     return false;
@@ -454,7 +456,7 @@ void Reader::report() {
     }
     std::size_t end = f.end;
     if (f.resume == Resume::SkipToSemicolon)
-        end = lexer_.skip_to_semicolon() ? lexer_.state.pos : lexer_.trimmed_end();
+        end = lexer_.skip_to_semicolon(f.in_quote) ? lexer_.state.pos : lexer_.trimmed_end();
     else if (f.resume == Resume::Eof)
         end = lexer_.trimmed_end();
     if (end < first_.begin) end = first_.begin;
