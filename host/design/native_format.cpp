@@ -296,6 +296,8 @@ public:
         if (error_code e = parser_.iterate(buf_).get(doc_))
             return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
         od::object root;
+        od::json_type type;
+        if (error_code e = doc_.type().get(type)) return SyntaxError(e, Where());
         if (error_code e = doc_.get_object().get(root)) return JsonError(e, "the file must hold a JSON object");
         bool marked = false;
         for (auto item : root) {

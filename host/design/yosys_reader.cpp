@@ -251,6 +251,8 @@ bool Reader::Load() {
 
 bool Reader::ParseRoot() {
     od::object root;
+    od::json_type type;
+    if (error_code e = doc_.type().get(type)) return SyntaxError(e, Where());
     if (error_code e = doc_.get_object().get(root)) {
         if (Ndm_JsonInput::IsSyntaxError(e)) return SyntaxError(e, Where());
         return Error(Port_Format("'%s' is not a Yosys JSON netlist: the file does not hold a JSON object.",

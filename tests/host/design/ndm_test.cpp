@@ -1,0 +1,212 @@
+// The design database: name lookups, full names, properties, deletion and networks.
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "host/design/ndm.h"
+
+namespace {
+
+struct Tree {
+    Ndm_Design design{"d"};
+    Ndm_View* view = design.CreateView("EXPANDED");
+    Ndm_Block* top = view->CreateTopBlock("top");
+};
+
+// Fills a block with n blocks, signals and pins named m0..m(n-1), plus duplicates that differ
+// in case and in position, so the first-in-stored-order rule is visible.
+void Populate(Ndm_Block* b, int n) {
+    for (int i = 0; i < n; ++i) {
+        std::string name = "m" + std::to_string(i);
+        b->CreateBlock(name.c_str());
+        b->CreateSignal(name.c_str());
+        b->CreatePin(name.c_str());
+    }
+    b->CreateBlock("Dup");
+    b->CreateSignal("Dup");
+    b->CreatePin("Dup");
+    b->CreateBlock("dup");
+    b->CreateSignal("dup");
+    b->CreatePin("dup");
+    b->CreateBlock("dup");
+    b->CreateSignal("dup");
+    b->CreatePin("dup");
+}
+
+template <class T>
+int IndexOf(std::span<T* const> items, const T* item) {
+    for (size_t i = 0; i < items.size(); ++i)
+        if (items[i] == item) return static_cast<int>(i);
+    return -1;
+}
+
+void CheckLookups(Ndm_Block* b, int n) {
+    // Exact: the first "dup" (not "Dup"), case-insensitive: "Dup", which comes first.
+    EXPECT_EQ(IndexOf(b->GetBlockItr(), b->GetBlockByName("dup")), n + 1);
+    EXPECT_EQ(IndexOf(b->GetSignalItr(), b->GetSignalByName("dup")), n + 1);
+    EXPECT_EQ(IndexOf(b->GetPinItr(), b->GetPinByName("dup")), n + 1);
+    EXPECT_EQ(IndexOf(b->GetBlockItr(), b->GetBlockByIName("DUP")), n);
+    EXPECT_EQ(IndexOf(b->GetSignalItr(), b->GetSignalByIName("dUp")), n);
+    EXPECT_EQ(IndexOf(b->GetPinItr(), b->GetPinByIName("dup")), n);
+    EXPECT_EQ(b->GetBlockByName("DUP"), nullptr);
+    EXPECT_EQ(b->GetSignalByName("never-seen-name"), nullptr);
+    EXPECT_EQ(b->GetPinByIName("NEVER-SEEN-NAME"), nullptr);
+    EXPECT_EQ(b->GetBlockByName(nullptr), nullptr);
+    for (int i = 0; i < n; ++i) {
+        std::string name = "m" + std::to_string(i);
+        std::string upper = "M" + std::to_string(i);
+        EXPECT_EQ(IndexOf(b->GetBlockItr(), b->GetBlockByName(name.c_str())), i);
+        EXPECT_EQ(IndexOf(b->GetSignalItr(), b->GetSignalByIName(upper.c_str())), i);
+        EXPECT_EQ(IndexOf(b->GetPinItr(), b->GetPinByIName(upper.c_str())), i);
+    }
+}
+
+TEST(DesignDatabase, LookupsFindTheFirstInStoredOrderInSmallAndLargeBlocks) {
+    Tree t;
+    Ndm_Block* small = t.top->CreateBlock("small");
+    Populate(small, 2);  // 5 members of each kind: searched directly
+    CheckLookups(small, 2);
+    Ndm_Block* large = t.top->CreateBlock("large");
+    Populate(large, 40);  // hashed
+    CheckLookups(large, 40);
+
+    // Members added after the index exists are found, without displacing earlier ones.
+    large->CreateSignal("late");
+    large->CreateSignal("LATE");
+    large->CreateSignal("m3");
+    EXPECT_EQ(large->GetSignalByName("late"), large->GetSignalItr()[large->GetNumSignals() - 3]);
+    EXPECT_EQ(large->GetSignalByIName("Late"), large->GetSignalItr()[large->GetNumSignals() - 3]);
+    EXPECT_EQ(large->GetSignalByName("LATE"), large->GetSignalItr()[large->GetNumSignals() - 2]);
+    EXPECT_EQ(IndexOf(large->GetSignalItr(), large->GetSignalByName("m3")), 3);
+}
+
+TEST(DesignDatabase, FullNames) {
+    Tree t;
+    Ndm_Block* a = t.top->CreateBlock("a");
+    Ndm_Block* b = a->CreateBlock("b");
+    EXPECT_EQ(t.top->GetFullName(), "");
+    EXPECT_EQ(a->GetFullName(), "a");
+    EXPECT_EQ(b->GetFullName(), "a/b");
+    EXPECT_EQ(t.top->CreateSignal("clk")->GetFullName(), "clk");
+    EXPECT_EQ(b->CreateSignal("n[1]")->GetFullName(), "a/b/n[1]");
+    EXPECT_EQ(t.top->CreatePin("clk", Ndm_Dir::Input)->GetFullName(), "clk");
+    EXPECT_EQ(b->CreatePin("D")->GetFullName(), "a/b.D");
+    // Deep hierarchies are named completely.
+    Ndm_Block* deep = t.top;
+    std::string expect;
+    for (int i = 0; i < 300; ++i) {
+        deep = deep->CreateBlock("x");
+        expect += i ? "/x" : "x";
+    }
+    EXPECT_EQ(deep->GetFullName(), expect);
+}
+
+TEST(DesignDatabase, PropertiesReplaceInPlaceAndListsKeepDuplicates) {
+    Tree t;
+    t.top->CreatePropertyInt32("a", 1);
+    t.top->CreatePropertyString("b", "x");
+    t.top->CreatePropertyBool("c");
+    Ndm_Property* replaced = t.top->CreatePropertyFloat64("b", 2.5);
+    ASSERT_EQ(t.top->GetNumProperties(), 3);
+    EXPECT_EQ(t.top->GetPropertyItr()[1], replaced);
+    EXPECT_EQ(replaced->GetType(), NDM_PROP_FLOAT64);
+    EXPECT_EQ(t.top->GetPropertyByName("b")->GetFloat64(), 2.5);
+    EXPECT_EQ(replaced->GetValueString(), nullptr);  // neutral value for another type
+    EXPECT_EQ(replaced->GetInt32(), 0);
+
+    Ndm_Property* list = t.top->CreatePropertyList("TIMING");
+    Ndm_Property* first = list->CreatePropertyString("OFFSET", "IN 2 ns");
+    list->CreatePropertyString("OFFSET", "OUT 3 ns");
+    EXPECT_EQ(list->GetNumEntries(), 2);
+    EXPECT_EQ(list->GetEntryByName("OFFSET"), first);
+    EXPECT_EQ(first->GetOwner(), t.top);
+    EXPECT_TRUE(list->DeleteEntry(first));
+    EXPECT_STREQ(list->GetEntryByName("OFFSET")->GetValueString(), "OUT 3 ns");
+    EXPECT_EQ(t.top->CreatePropertyInt32("x", 1)->CreatePropertyInt32("y", 2), nullptr);
+
+    EXPECT_TRUE(t.top->DeleteProperty("a"));
+    EXPECT_FALSE(t.top->DeleteProperty("a"));
+    EXPECT_EQ(t.top->GetNumProperties(), 4);  // b, c, TIMING, x
+    EXPECT_STREQ(t.top->GetPropertyItr()[0]->GetName(), "b");
+}
+
+TEST(DesignDatabase, NetworksAreNamedAfterTheHighestSignal) {
+    Tree t;
+    Ndm_Block* a = t.top->CreateBlock("a");
+    Ndm_Block* b = a->CreateBlock("b");
+    Ndm_Signal* deep = b->CreateSignal("x");
+    Ndm_Signal* mid = a->CreateSignal("y");
+    Ndm_Signal* mid2 = a->CreateSignal("z");
+    Ndm_Signal* high = t.top->CreateSignal("w");
+    Ndm_Network* net = t.view->CreateNetwork();
+    net->AddSignal(deep);
+    EXPECT_STREQ(net->GetName(), "a/b/x");
+    net->AddSignal(mid);
+    EXPECT_STREQ(net->GetName(), "a/y");
+    net->AddSignal(mid2);  // same depth: the first stays the top signal
+    EXPECT_STREQ(net->GetName(), "a/y");
+    net->AddSignal(high);
+    EXPECT_STREQ(net->GetName(), "w");
+    EXPECT_EQ(net->GetTopSignal(), high);
+    net->AddSignal(high);  // already in a network: ignored
+    EXPECT_EQ(net->GetNumSignals(), 4);
+    // Members keep the order they were added in.
+    EXPECT_EQ(net->GetFirstSignal(), deep);
+    EXPECT_EQ(deep->GetNextInNetwork(), mid);
+    EXPECT_EQ(high->GetNextInNetwork(), nullptr);
+    Ndm_Pin* pin = b->CreatePin("P");
+    pin->SetSignal(mid);
+    EXPECT_EQ(pin->GetNetwork(), net);
+}
+
+TEST(DesignDatabase, DeleteBlockRemovesTheSubtreeFromLookupsAndNetworks) {
+    Tree t;
+    for (int i = 0; i < 12; ++i) t.top->CreateBlock(i == 5 ? "dup" : ("b" + std::to_string(i)).c_str());
+    Ndm_Block* second_dup = t.top->CreateBlock("dup");
+    Ndm_Block* victim = t.top->GetBlockByName("dup");
+    ASSERT_NE(victim, second_dup);
+    Ndm_Block* inner = victim->CreateBlock("inner");
+    Ndm_Signal* s1 = inner->CreateSignal("s1");
+    Ndm_Signal* s2 = second_dup->CreateSignal("s2");
+    Ndm_Signal* s3 = victim->CreateSignal("s3");
+    Ndm_Network* shared = t.view->CreateNetwork();
+    shared->AddSignal(s3);
+    shared->AddSignal(s1);
+    shared->AddSignal(s2);
+    Ndm_Network* doomed = t.view->CreateNetwork();
+    doomed->AddSignal(inner->CreateSignal("only"));
+    ASSERT_STREQ(shared->GetName(), "dup/s3");
+
+    EXPECT_FALSE(t.top->DeleteBlock(inner));  // not a child of top
+    EXPECT_TRUE(t.top->DeleteBlock(victim));
+    EXPECT_FALSE(t.top->DeleteBlock(victim));
+    EXPECT_EQ(t.top->GetNumBlocks(), 12);
+    EXPECT_EQ(t.top->GetBlockByName("dup"), second_dup);
+    EXPECT_EQ(t.top->GetBlockByIName("DUP"), second_dup);
+    EXPECT_EQ(shared->GetNumSignals(), 1);
+    EXPECT_EQ(shared->GetFirstSignal(), s2);
+    EXPECT_STREQ(shared->GetName(), "dup/s2");
+    EXPECT_EQ(s1->GetNetwork(), nullptr);
+    ASSERT_EQ(t.view->GetNumNetworks(), 1);  // the emptied network is gone
+    EXPECT_EQ(t.view->GetNetworkItr()[0], shared);
+    // New children are indexed as before.
+    Ndm_Block* fresh = t.top->CreateBlock("dup2");
+    EXPECT_EQ(t.top->GetBlockByName("dup2"), fresh);
+}
+
+TEST(DesignDatabase, ViewsAndStats) {
+    Tree t;
+    EXPECT_EQ(t.design.CreateView("EXPANDED"), t.view);
+    EXPECT_EQ(t.design.GetViewByName("OTHER"), nullptr);
+    EXPECT_EQ(t.view->CreateTopBlock("again"), t.top);
+    t.top->CreateBlock("a")->CreatePin("p");
+    t.top->CreateSignal("s");
+    Ndm_Design::Stats s = t.design.GetStats();
+    EXPECT_EQ(s.blocks, 2u);
+    EXPECT_EQ(s.signals, 1u);
+    EXPECT_EQ(s.pins, 1u);
+    EXPECT_EQ(t.design.FindInterned("a"), t.design.Intern("a"));
+    EXPECT_EQ(t.design.FindInterned("no-such-text"), nullptr);
+}
+
+}  // namespace
