@@ -36,6 +36,7 @@ int QuillmapMain(int argc, char** argv) {
     QuillmapAction run;
     AddAnnotateCommand(app, run, options);
     AddDesignCommands(app, run);
+    AddExtractCommand(app, run);
 
     try {
         app.parse(argc, argv);

@@ -26,5 +26,6 @@ std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const st
 using QuillmapAction = std::function<int()>;
 void AddDesignCommands(CLI::App& app, QuillmapAction& run);
 void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
+void AddExtractCommand(CLI::App& app, QuillmapAction& run);
 
 int QuillmapMain(int argc, char** argv);

@@ -1,0 +1,82 @@
+// The extract subcommand: writes a design's constraint blocks back as constraint text.
+#include <CLI/CLI.hpp>
+#include <iostream>
+#include <sstream>
+#include <string>
+
+#include "extract/cst_extractor.h"
+#include "host/design/ndm.h"
+#include "host/port/file.h"
+#include "host/port/msgman.h"
+#include "host/port/stream.h"
+#include "quillmap/app.h"
+
+namespace {
+
+struct ExtractArgs {
+    std::string design;
+    std::string top;
+    std::string output;
+    bool normalize = false;
+};
+
+Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
+
+int RunExtract(const ExtractArgs& args) {
+    auto design = QuillmapLoadDesign(args.design, args.top);
+    if (!design) return kStatusErrors;
+    Ndm_View* view = design->GetViewByName("EXPANDED");
+    if (!view && !design->GetViewItr().empty()) view = design->GetViewItr().front();
+    if (!view || !view->GetBlock()) {
+        Msg(__LINE__).issueError("Design '%s' has no view to extract from.\n", args.design.c_str());
+        return kStatusErrors;
+    }
+
+    // The text is collected first so that a fatal error leaves neither a partial output file
+    // nor partial output on stdout.
+    CstExtractor extractor;
+    if (args.normalize) extractor.NormalizeProperties(view);
+    std::ostringstream text;
+    Port::Stream stream(text);
+    extractor.Extract(view, stream);
+
+    if (args.output.empty()) {
+        std::cout << text.str();
+        std::cout.flush();
+        return std::cout ? kStatusOk : kStatusErrors;
+    }
+    Port::AtomicFile out(args.output);
+    if (!out.Write(text.str()) || !out.Commit()) {
+        Msg(__LINE__).issueError("Could not write '%s': %s\n", args.output.c_str(), out.error().c_str());
+        return kStatusErrors;
+    }
+    return kStatusOk;
+}
+
+}  // namespace
+
+void AddExtractCommand(CLI::App& app, QuillmapAction& run) {
+    static ExtractArgs args;
+    CLI::App* cmd = app.add_subcommand(
+        "extract",
+        "Write the constraint blocks of a design (view EXPANDED, else the first view) as\n"
+        "constraint-file text, to stdout or to the -o file.\n"
+        "Blocks are visited depth first, the children of a block (in stored order) before the\n"
+        "block itself; each CONFIG, TIMEGRP and TIMESPEC block gives one section: a header line\n"
+        "(\"// Global Constraints\", \"// Timing Groups\" or \"// Timing Constraints\"), one\n"
+        "statement per line ending in \" ;\", and an empty line. Constraints attached to\n"
+        "instances, nets and pins are not written.\n"
+        "The written blocks are then deleted from the design in memory only; the input file\n"
+        "is never modified. With --normalize, netlist-form properties are first rewritten\n"
+        "(integer SLEW 80/20/10 to FAST/SLOW/QUIETIO, DELAYMODE 0 to NODELAY, FIXED to P,\n"
+        "LOG_PICSPEC, LOG_PICSPEED, LOG_VENDOR, INITSTATE, VL_LEVEL to PICSPEC, PICSPEED,\n"
+        "VENDOR, INIT, LEVEL).\n"
+        "A fatal error (an unexpected property type or value) writes nothing and exits with\n"
+        "status 2. See docs/extraction.md.");
+    cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
+    cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");
+    cmd->add_option("-o,--output", args.output, "Write the constraint text to this file instead of stdout");
+    cmd->add_flag("--normalize", args.normalize,
+                  "Rewrite netlist-form properties into their constraint-file form first");
+    cmd->callback([&run] { run = [] { return RunExtract(args); }; });
+}
