@@ -3,6 +3,7 @@
 // statement; records come from pools that are reused, so steady-state parsing allocates
 // nothing.
 #include <fcntl.h>
+#include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -1286,31 +1287,62 @@ private:
 
 enum class ReadResult { Ok, CannotOpen, CannotRead };
 
-// Reads the whole file into `data`/`size`.
-ReadResult read_file(const char* name, std::unique_ptr<char[]>& data, std::size_t& size) {
+// The bytes of a constraint file: large regular files are mapped, others read into memory.
+class FileText {
+public:
+    FileText() = default;
+    ~FileText() {
+        if (mapped_) ::munmap(mapped_, size_);
+    }
+    FileText(const FileText&) = delete;
+    FileText& operator=(const FileText&) = delete;
+
+    ReadResult load(const char* name);
+    const char* data() const { return mapped_ ? static_cast<const char*>(mapped_) : buffer_.get(); }
+    std::size_t size() const { return size_; }
+
+private:
+    static constexpr std::size_t kMapThreshold = 1 << 20;
+    void* mapped_ = nullptr;
+    std::unique_ptr<char[]> buffer_;
+    std::size_t size_ = 0;
+};
+
+ReadResult FileText::load(const char* name) {
     FileDescriptor fd(::open(name, O_RDONLY | O_CLOEXEC));
     if (fd.get() < 0) return ReadResult::CannotOpen;
     struct stat st {};
     if (::fstat(fd.get(), &st) != 0 || S_ISDIR(st.st_mode)) return ReadResult::CannotOpen;
+    const bool regular = S_ISREG(st.st_mode);
+    if (regular && static_cast<std::size_t>(st.st_size) >= kMapThreshold) {
+        void* p = ::mmap(nullptr, static_cast<std::size_t>(st.st_size), PROT_READ,
+                         MAP_PRIVATE | MAP_POPULATE, fd.get(), 0);
+        if (p != MAP_FAILED) {
+            ::madvise(p, static_cast<std::size_t>(st.st_size), MADV_SEQUENTIAL);
+            mapped_ = p;
+            size_ = static_cast<std::size_t>(st.st_size);
+            return ReadResult::Ok;
+        }
+    }
     std::size_t capacity = 4096;
-    if (S_ISREG(st.st_mode) && st.st_size > 0) capacity = static_cast<std::size_t>(st.st_size) + 1;
-    data = std::make_unique_for_overwrite<char[]>(capacity);
-    size = 0;
+    if (regular && st.st_size > 0) capacity = static_cast<std::size_t>(st.st_size) + 1;
+    buffer_ = std::make_unique_for_overwrite<char[]>(capacity);
+    size_ = 0;
     for (;;) {
-        if (size == capacity) {
+        if (size_ == capacity) {
             const std::size_t bigger = capacity * 2;
             auto grown = std::make_unique_for_overwrite<char[]>(bigger);
-            std::memcpy(grown.get(), data.get(), size);
-            data = std::move(grown);
+            std::memcpy(grown.get(), buffer_.get(), size_);
+            buffer_ = std::move(grown);
             capacity = bigger;
         }
-        const ssize_t n = ::read(fd.get(), data.get() + size, capacity - size);
+        const ssize_t n = ::read(fd.get(), buffer_.get() + size_, capacity - size_);
         if (n < 0) {
             if (errno == EINTR) continue;
             return ReadResult::CannotRead;
         }
         if (n == 0) return ReadResult::Ok;
-        size += static_cast<std::size_t>(n);
+        size_ += static_cast<std::size_t>(n);
     }
 }
 
@@ -1322,9 +1354,8 @@ Pr_Logical_Parser& Pr_Logical_Parser::operator=(const Pr_Logical_Parser& other) 
 Pr_Logical_Parser::~Pr_Logical_Parser() = default;
 
 bool Pr_Logical_Parser::parse() {
-    std::unique_ptr<char[]> data;
-    std::size_t size = 0;
-    switch (read_file(filename_.c_str(), data, size)) {
+    FileText text;
+    switch (text.load(filename_.c_str())) {
     case ReadResult::CannotOpen:
         messages().issueError("Could not open constraint file '%s'.\n", filename_.c_str());
         return false;
@@ -1334,7 +1365,7 @@ bool Pr_Logical_Parser::parse() {
     case ReadResult::Ok:
         break;
     }
-    pr_detail::Reader reader(*this, data.get(), size);
+    pr_detail::Reader reader(*this, text.data(), text.size());
     return reader.run();
 }
 
