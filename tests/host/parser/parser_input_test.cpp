@@ -225,3 +225,24 @@ TEST(ParserErrors, BinaryLineAndHugeName) {
     ASSERT_EQ(big.size(), 1u);
     EXPECT_EQ(big[0].what, "net(" + name + ";(LOC,1," + name + "))");
 }
+
+TEST(ParserFile, LargeFileWithoutFinalNewline) {
+    // Large enough to be mapped rather than read; the last byte ends a statement.
+    std::string text;
+    for (int i = 0; i < 60000; ++i) text += "NET n" + std::to_string(i) + " LOC = P1;\n";
+    text += "NET last LOC = \"" + std::string(300000, 'q') + "\";";
+    bool ok = false;
+    const auto calls = parse_text(text, &ok);
+    EXPECT_TRUE(ok);
+    ASSERT_EQ(calls.size(), 60001u);
+    EXPECT_EQ(calls[59999].what, "net(n59999;(LOC,1,P1))");
+    EXPECT_EQ(calls.back().line, 60001);
+    EXPECT_EQ(calls.back().ascii.size(), text.size() - text.rfind("NET last"));
+
+    // Cut off inside a quoted section at the very end of a large file.
+    text.pop_back();
+    text.pop_back();
+    const auto cut = parse_text(text, &ok);
+    EXPECT_FALSE(ok);
+    EXPECT_EQ(cut.back().what.substr(0, 21), "syntax(60001,16,\"qqqq");
+}
