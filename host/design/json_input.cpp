@@ -1,6 +1,8 @@
 #include "host/design/json_input.h"
 
+#include <sys/mman.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <cerrno>
 #include <cstdio>
@@ -10,6 +12,9 @@
 namespace Ndm_JsonInput {
 
 namespace {
+
+// Files at least this large are mapped rather than read.
+constexpr size_t kMapAtLeast = 1 << 20;
 
 struct FileCloser {
     void operator()(FILE* f) const { std::fclose(f); }
@@ -102,7 +107,8 @@ size_t UnclosedQuote(const char* s, size_t size) {
 
 }  // namespace
 
-bool LoadFile(const char* path, simdjson::padded_string& out, std::string& error) {
+bool Input::Open(const char* path, std::string& error) {
+    Release();
     std::unique_ptr<FILE, FileCloser> file(std::fopen(path, "rb"));
     if (!file) {
         error = std::strerror(errno);
@@ -118,6 +124,25 @@ bool LoadFile(const char* path, simdjson::padded_string& out, std::string& error
         return false;
     }
     size_t size = static_cast<size_t>(st.st_size);
+    if (S_ISREG(st.st_mode) && size >= kMapAtLeast) {
+        // An anonymous region with room for the padding, the file mapped over its start: bytes
+        // after the end of the file read as zeros.
+        size_t page = static_cast<size_t>(::sysconf(_SC_PAGESIZE));
+        size_t total = (size + simdjson::SIMDJSON_PADDING + page - 1) / page * page;
+        void* region = ::mmap(nullptr, total, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+        if (region != MAP_FAILED) {
+            void* mapped = ::mmap(region, size, PROT_READ, MAP_PRIVATE | MAP_FIXED | MAP_POPULATE,
+                                  fileno(file.get()), 0);
+            if (mapped != MAP_FAILED) {
+                map_ = region;
+                map_size_ = total;
+                data_ = static_cast<const char*>(region);
+                size_ = size;
+                return true;
+            }
+            ::munmap(region, total);
+        }
+    }
     simdjson::padded_string buf(size);
     if (size && buf.data() == nullptr) {
         error = "out of memory";
@@ -128,8 +153,19 @@ bool LoadFile(const char* path, simdjson::padded_string& out, std::string& error
         error = std::ferror(file.get()) ? std::strerror(errno) : "the file changed while being read";
         return false;
     }
-    out = std::move(buf);
+    copy_ = std::move(buf);
+    data_ = copy_.data() ? copy_.data() : "";
+    size_ = size;
     return true;
+}
+
+void Input::Release() {
+    if (map_) ::munmap(map_, map_size_);
+    map_ = nullptr;
+    map_size_ = 0;
+    copy_ = simdjson::padded_string();
+    data_ = "";
+    size_ = 0;
 }
 
 bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out) {
@@ -190,19 +226,19 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
     return true;
 }
 
-size_t Offset(simdjson::ondemand::document& doc, const simdjson::padded_string& buf) {
+size_t Offset(simdjson::ondemand::document& doc, const Input& input) {
     const char* at = nullptr;
-    if (doc.current_location().get(at) || !at) return buf.size();
-    if (at < buf.data() || at > buf.data() + buf.size()) return buf.size();
-    return static_cast<size_t>(at - buf.data());
+    if (doc.current_location().get(at) || !at) return input.size();
+    if (at < input.data() || at > input.data() + input.size()) return input.size();
+    return static_cast<size_t>(at - input.data());
 }
 
-size_t EarlyErrorOffset(simdjson::error_code error, const simdjson::padded_string& buf) {
+size_t EarlyErrorOffset(simdjson::error_code error, const Input& input) {
     if (error == simdjson::UTF8_ERROR)
-        return FirstBadUtf8(reinterpret_cast<const unsigned char*>(buf.data()), buf.size());
-    if (error == simdjson::UNCLOSED_STRING) return UnclosedQuote(buf.data(), buf.size());
+        return FirstBadUtf8(reinterpret_cast<const unsigned char*>(input.data()), input.size());
+    if (error == simdjson::UNCLOSED_STRING) return UnclosedQuote(input.data(), input.size());
     if (error == simdjson::EMPTY) return 0;
-    return buf.size();
+    return input.size();
 }
 
 const char* SyntaxReason(simdjson::error_code error) {

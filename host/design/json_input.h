@@ -8,19 +8,41 @@
 
 namespace Ndm_JsonInput {
 
-// Reads a whole file into a padded buffer; on failure error tells why (from errno).
-bool LoadFile(const char* path, simdjson::padded_string& out, std::string& error);
+// A whole input file with the padding the parser needs after its end. Large files are mapped
+// (no copy, pages read in bulk); small ones are read into a padded buffer.
+class Input {
+public:
+    Input() = default;
+    ~Input() { Release(); }
+    Input(const Input&) = delete;
+    Input& operator=(const Input&) = delete;
+    // Opens path; on failure error tells why (from errno).
+    bool Open(const char* path, std::string& error);
+    void Release();
+    const char* data() const { return data_; }
+    size_t size() const { return size_; }
+    simdjson::padded_string_view view() const {
+        return simdjson::padded_string_view(data_, size_, size_ + simdjson::SIMDJSON_PADDING);
+    }
+
+private:
+    simdjson::padded_string copy_;
+    void* map_ = nullptr;
+    size_t map_size_ = 0;
+    const char* data_ = "";
+    size_t size_ = 0;
+};
 
 // Text of a JSON string from its raw form. Texts without escapes are views into the input;
 // others are decoded into scratch. False for a malformed escape.
 bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out);
 
-// Byte offset of the parse position in buf (the end of buf when the parser has finished).
-size_t Offset(simdjson::ondemand::document& doc, const simdjson::padded_string& buf);
+// Byte offset of the parse position in the input (its size when the parser has finished).
+size_t Offset(simdjson::ondemand::document& doc, const Input& input);
 
 // Best byte offset for an error found before iteration starts (bad UTF-8, an unclosed
-// string); the size of buf when none can be told.
-size_t EarlyErrorOffset(simdjson::error_code error, const simdjson::padded_string& buf);
+// string); the input size when none can be told.
+size_t EarlyErrorOffset(simdjson::error_code error, const Input& input);
 
 // Short reason for a JSON syntax error, e.g. "unclosed string".
 const char* SyntaxReason(simdjson::error_code error);

@@ -291,9 +291,9 @@ public:
 
     bool Read() {
         std::string why;
-        if (!Ndm_JsonInput::LoadFile(path_, buf_, why))
+        if (!buf_.Open(path_, why))
             return Error(Port_Format("Cannot read design file '%s': %s.", path_, why.c_str()));
-        if (error_code e = parser_.iterate(buf_).get(doc_))
+        if (error_code e = parser_.iterate(buf_.view()).get(doc_))
             return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
         od::object root;
         od::json_type type;
@@ -658,7 +658,7 @@ private:
 
     const char* path_;
     Ndm_Design& design_;
-    simdjson::padded_string buf_;
+    Ndm_JsonInput::Input buf_;
     od::parser parser_;
     od::document doc_;
     std::string scratch_;

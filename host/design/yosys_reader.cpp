@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <cstring>
 #include <numeric>
+#include <type_traits>
 #include <string>
 #include <vector>
 
@@ -86,6 +87,22 @@ struct Module {
     bool instantiated = false;
 };
 
+// Describes the value being read, for messages; built only when a message is issued.
+class What {
+public:
+    template <class F>
+        requires std::is_invocable_r_v<std::string, const F&>
+    What(const F& f)  // NOLINT: implicit on purpose
+        : obj_(&f), call_([](const void* o) { return std::string((*static_cast<const F*>(o))()); }) {}
+    What(const char* text)  // NOLINT
+        : obj_(text), call_([](const void* o) { return std::string(static_cast<const char*>(o)); }) {}
+    std::string operator()() const { return call_(obj_); }
+
+private:
+    const void* obj_;
+    std::string (*call_)(const void*);
+};
+
 struct Instance {
     Ndm_Block* block;
     uint32_t module;
@@ -132,10 +149,10 @@ private:
 
     // ---- parsing ----
     bool Key(od::field& field, std::string_view& out);
-    bool String(od::value value, std::string_view& out, const std::string& what);
-    bool Int(od::value value, int64_t& out, const std::string& what);
-    bool Bits(od::value value, Module& m, Range& range, const std::string& what);
-    bool Direction(od::value value, Ndm_Dir& dir, const std::string& what);
+    bool String(od::value value, std::string_view& out, const What& what);
+    bool Int(od::value value, int64_t& out, const What& what);
+    bool Bits(od::value value, Module& m, Range& range, const What& what);
+    bool Direction(od::value value, Ndm_Dir& dir, const What& what);
     bool ParseRoot();
     bool ParseModule(od::object object, Module& m);
     bool ParseAttributes(od::value value, Module& m);
@@ -160,7 +177,7 @@ private:
 
     const char* path_;
     Ndm_Design& design_;
-    simdjson::padded_string buf_;
+    Ndm_JsonInput::Input buf_;
     od::parser parser_;
     od::document doc_;
     std::string scratch_;
@@ -183,19 +200,19 @@ bool Reader::Key(od::field& field, std::string_view& out) {
     return true;
 }
 
-bool Reader::String(od::value value, std::string_view& out, const std::string& what) {
+bool Reader::String(od::value value, std::string_view& out, const What& what) {
     od::raw_json_string raw;
-    if (error_code e = value.get_raw_json_string().get(raw)) return JsonError(e, what + " must be a string");
+    if (error_code e = value.get_raw_json_string().get(raw)) return JsonError(e, what() + " must be a string");
     if (!Ndm_JsonInput::Text(raw, scratch_, out)) return SyntaxError(simdjson::STRING_ERROR, Where());
     return true;
 }
 
-bool Reader::Int(od::value value, int64_t& out, const std::string& what) {
-    if (error_code e = value.get_int64().get(out)) return JsonError(e, what + " must be an integer");
+bool Reader::Int(od::value value, int64_t& out, const What& what) {
+    if (error_code e = value.get_int64().get(out)) return JsonError(e, what() + " must be an integer");
     return true;
 }
 
-bool Reader::Direction(od::value value, Ndm_Dir& dir, const std::string& what) {
+bool Reader::Direction(od::value value, Ndm_Dir& dir, const What& what) {
     std::string_view text;
     if (!String(value, text, what)) return false;
     if (text == "input")
@@ -205,24 +222,24 @@ bool Reader::Direction(od::value value, Ndm_Dir& dir, const std::string& what) {
     else if (text == "inout")
         dir = Ndm_Dir::Inout;
     else
-        return ShapeError(what + " must be \"input\", \"output\" or \"inout\"");
+        return ShapeError(what() + " must be \"input\", \"output\" or \"inout\"");
     return true;
 }
 
-bool Reader::Bits(od::value value, Module& m, Range& range, const std::string& what) {
+bool Reader::Bits(od::value value, Module& m, Range& range, const What& what) {
     od::array array;
     if (error_code e = value.get_array().get(array))
-        return JsonError(e, what + " must be an array of bits");
+        return JsonError(e, what() + " must be an array of bits");
     range.first = static_cast<uint32_t>(m.bits.size());
     for (auto item : array) {
         od::value bit;
         od::json_type type;
-        if (error_code e = std::move(item).get(bit)) return JsonError(e, what + " must be an array of bits");
-        if (error_code e = bit.type().get(type)) return JsonError(e, what + " must be an array of bits");
+        if (error_code e = std::move(item).get(bit)) return JsonError(e, what() + " must be an array of bits");
+        if (error_code e = bit.type().get(type)) return JsonError(e, what() + " must be an array of bits");
         if (type == od::json_type::number) {
             int64_t n;
-            if (error_code e = bit.get_int64().get(n)) return JsonError(e, what + " holds a bad bit number");
-            if (n < 0 || n > INT32_MAX) return ShapeError(what + " holds a bad bit number");
+            if (error_code e = bit.get_int64().get(n)) return JsonError(e, what() + " holds a bad bit number");
+            if (n < 0 || n > INT32_MAX) return ShapeError(what() + " holds a bad bit number");
             m.bits.push_back(static_cast<int32_t>(n));
             if (n > m.max_bit) m.max_bit = n;
         } else if (type == od::json_type::string) {
@@ -230,10 +247,10 @@ bool Reader::Bits(od::value value, Module& m, Range& range, const std::string& w
             if (!String(bit, text, what)) return false;
             int32_t c = text == "0" ? kConst0 : text == "1" ? kConst1 : text == "x" ? kConstX
                       : text == "z" ? kConstZ : 0;
-            if (!c) return ShapeError(what + " holds a constant other than \"0\", \"1\", \"x\", \"z\"");
+            if (!c) return ShapeError(what() + " holds a constant other than \"0\", \"1\", \"x\", \"z\"");
             m.bits.push_back(c);
         } else {
-            return ShapeError(what + " must hold bit numbers and constants");
+            return ShapeError(what() + " must hold bit numbers and constants");
         }
     }
     range.count = static_cast<uint32_t>(m.bits.size() - range.first);
@@ -242,9 +259,9 @@ bool Reader::Bits(od::value value, Module& m, Range& range, const std::string& w
 
 bool Reader::Load() {
     std::string why;
-    if (!Ndm_JsonInput::LoadFile(path_, buf_, why))
+    if (!buf_.Open(path_, why))
         return Error(Port_Format("Cannot read netlist file '%s': %s.", path_, why.c_str()));
-    if (error_code e = parser_.iterate(buf_).get(doc_))
+    if (error_code e = parser_.iterate(buf_.view()).get(doc_))
         return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
     return ParseRoot();
 }
@@ -325,7 +342,7 @@ bool Reader::ParseAttributes(od::value value, Module& m) {
         if (error_code e = field.value().type().get(type)) return JsonError(e, "bad attribute" + InModule());
         if (type == od::json_type::number) {
             int64_t n;
-            if (!Int(field.value(), n, "attribute \"top\"" + InModule())) return false;
+            if (!Int(field.value(), n, [&] { return "attribute \"top\"" + InModule(); })) return false;
             m.top_attr = n != 0;
         } else if (type == od::json_type::string) {
             // Yosys writes constant attribute values as binary digit strings.
@@ -349,30 +366,30 @@ bool Reader::ParsePorts(od::value value, Module& m) {
         if (!Key(field, name)) return false;
         Port port;
         port.name = design_.Intern(StripEscape(name));
-        std::string what = Port_Format("port '%s' in module '%s'", port.name, m.name);
+        auto what = [&] { return Port_Format("port '%s' in module '%s'", port.name, m.name); };
         od::object body;
-        if (error_code e = field.value().get_object().get(body)) return JsonError(e, what + " must be an object");
+        if (error_code e = field.value().get_object().get(body)) return JsonError(e, what() + " must be an object");
         bool has_bits = false;
         for (auto pitem : body) {
             od::field pfield;
-            if (error_code e = std::move(pitem).get(pfield)) return JsonError(e, "bad member of " + what);
+            if (error_code e = std::move(pitem).get(pfield)) return JsonError(e, "bad member of " + what());
             od::raw_json_string key = pfield.key();
             if (key == "direction") {
-                if (!Direction(pfield.value(), port.dir, "\"direction\" of " + what)) return false;
+                if (!Direction(pfield.value(), port.dir, [&] { return "\"direction\" of " + what(); })) return false;
             } else if (key == "bits") {
-                if (!Bits(pfield.value(), m, port.bits, "\"bits\" of " + what)) return false;
+                if (!Bits(pfield.value(), m, port.bits, [&] { return "\"bits\" of " + what(); })) return false;
                 has_bits = true;
             } else if (key == "offset") {
                 int64_t n;
-                if (!Int(pfield.value(), n, "\"offset\" of " + what)) return false;
+                if (!Int(pfield.value(), n, [&] { return "\"offset\" of " + what(); })) return false;
                 port.offset = static_cast<int32_t>(n);
             } else if (key == "upto") {
                 int64_t n;
-                if (!Int(pfield.value(), n, "\"upto\" of " + what)) return false;
+                if (!Int(pfield.value(), n, [&] { return "\"upto\" of " + what(); })) return false;
                 port.upto = n != 0;
             }
         }
-        if (!has_bits) return ShapeError(what + " has no \"bits\"");
+        if (!has_bits) return ShapeError(what() + " has no \"bits\"");
         m.ports.push_back(port);
     }
     return true;
@@ -399,50 +416,51 @@ bool Reader::ParseCells(od::value value, Module& m) {
 }
 
 bool Reader::ParseCell(od::object object, Module& m, Cell& cell) {
-    std::string what = Port_Format("cell '%s' in module '%s'", cell.name, m.name);
+    auto what = [&] { return Port_Format("cell '%s' in module '%s'", cell.name, m.name); };
     dirs_.clear();
     cell.first_conn = static_cast<uint32_t>(m.conns.size());
     for (auto item : object) {
         od::field field;
-        if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member of " + what);
+        if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member of " + what());
         od::raw_json_string key = field.key();
         if (key == "type") {
             std::string_view type;
-            if (!String(field.value(), type, "\"type\" of " + what)) return false;
+            if (!String(field.value(), type, [&] { return "\"type\" of " + what(); })) return false;
             cell.type = design_.Intern(StripEscape(type));
         } else if (key == "port_directions") {
             od::object dirs;
             if (error_code e = field.value().get_object().get(dirs))
-                return JsonError(e, "\"port_directions\" of " + what + " must be an object");
+                return JsonError(e, "\"port_directions\" of " + what() + " must be an object");
             for (auto ditem : dirs) {
                 od::field dfield;
-                if (error_code e = std::move(ditem).get(dfield)) return JsonError(e, "bad port direction of " + what);
+                if (error_code e = std::move(ditem).get(dfield)) return JsonError(e, "bad port direction of " + what());
                 std::string_view pname;
                 if (!Key(dfield, pname)) return false;
                 const char* port = design_.Intern(StripEscape(pname));
                 Ndm_Dir dir;
-                if (!Direction(dfield.value(), dir, Port_Format("direction of port '%s' of ", port) + what))
+                if (!Direction(dfield.value(), dir, [&] { return Port_Format("direction of port '%s' of ", port) + what(); }))
                     return false;
                 dirs_.emplace_back(port, dir);
             }
         } else if (key == "connections") {
             od::object conns;
             if (error_code e = field.value().get_object().get(conns))
-                return JsonError(e, "\"connections\" of " + what + " must be an object");
+                return JsonError(e, "\"connections\" of " + what() + " must be an object");
             for (auto citem : conns) {
                 od::field cfield;
-                if (error_code e = std::move(citem).get(cfield)) return JsonError(e, "bad connection of " + what);
+                if (error_code e = std::move(citem).get(cfield)) return JsonError(e, "bad connection of " + what());
                 std::string_view pname;
                 if (!Key(cfield, pname)) return false;
                 Conn conn;
                 conn.name = design_.Intern(StripEscape(pname));
-                if (!Bits(cfield.value(), m, conn.bits, Port_Format("connection '%s' of ", conn.name) + what))
+                if (!Bits(cfield.value(), m, conn.bits,
+                          [&] { return Port_Format("connection '%s' of ", conn.name) + what(); }))
                     return false;
                 m.conns.push_back(conn);
             }
         }
     }
-    if (!cell.type) return ShapeError(what + " has no \"type\"");
+    if (!cell.type) return ShapeError(what() + " has no \"type\"");
     cell.num_conns = static_cast<uint32_t>(m.conns.size() - cell.first_conn);
     // Directions usually come in the order of the connections; search only when they do not.
     for (uint32_t k = 0; k < cell.num_conns; ++k) {
@@ -481,15 +499,18 @@ bool Reader::ParseNets(od::value value, Module& m) {
             if (error_code e = std::move(nitem).get(nfield)) return JsonError(e, "bad member of netname" + InModule());
             od::raw_json_string key = nfield.key();
             if (key == "bits") {
-                if (!Bits(nfield.value(), m, net.bits,
-                          Port_Format("\"bits\" of netname '%s' in module '%s'", net.name, m.name)))
+                if (!Bits(nfield.value(), m, net.bits, [&] {
+                        return Port_Format("\"bits\" of netname '%s' in module '%s'", net.name, m.name);
+                    }))
                     return false;
                 has_bits = true;
             } else if (key == "offset" || key == "upto") {
                 bool is_offset = key == "offset";
                 int64_t n;
-                if (!Int(nfield.value(), n, Port_Format("\"%s\" of netname '%s' in module '%s'",
-                                                         is_offset ? "offset" : "upto", net.name, m.name)))
+                if (!Int(nfield.value(), n, [&] {
+                        return Port_Format("\"%s\" of netname '%s' in module '%s'", is_offset ? "offset" : "upto",
+                                           net.name, m.name);
+                    }))
                     return false;
                 if (is_offset)
                     net.offset = static_cast<int32_t>(n);
@@ -752,15 +773,30 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
     }
 }
 
-// One network per connected set of bits carrying at least one signal; signals join in
-// preorder of their blocks, in stored order within a block.
+// One network per connected set of bits carrying at least one signal; blocks join in preorder.
+// Within a block, the bits of port names join first, then other public names, then generated
+// ("$...") names: the first of the top-most signals to join names the network, so a net that
+// reaches a port is named after the port.
 void Reader::Networks(Ndm_View* view) {
     constexpr uint32_t kNone = UINT32_MAX;
     std::vector<uint32_t> network_of_root(parent_.size(), kNone);
+    std::vector<uint32_t> order;
     for (const Instance& inst : instances_) {
-        const Module& m = modules_[inst.module];
+        Module& m = modules_[inst.module];
         std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
-        for (size_t s = 0; s < signals.size(); ++s) {
+        order.clear();
+        Ndm_PtrMap ports;
+        for (const Port& port : m.ports) ports.InsertIfAbsent(port.name, const_cast<char*>(port.name));
+        for (int rank = 0; rank < 3; ++rank) {
+            for (size_t n = 0; n < m.nets.size(); ++n) {
+                const Net& net = m.nets[n];
+                int r = ports.Find(net.name) ? 0 : (net.name[0] == '$' ? 2 : 1);
+                if (r != rank) continue;
+                for (uint32_t i = 0; i < net.bits.count; ++i) order.push_back(m.net_first_signal[n] + i);
+            }
+        }
+        for (uint32_t s : order) {
+            if (s >= signals.size()) continue;
             int32_t bit = m.signal_bit[s];
             if (bit < 0) continue;
             uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
@@ -782,7 +818,7 @@ bool Reader::Build(const char* top_module) {
     // The JSON input and the parser's buffers are no longer needed.
     doc_ = od::document();
     parser_ = od::parser();
-    buf_ = simdjson::padded_string();
+    buf_.Release();
 
     const Module& m = modules_[top];
     design_.SetName(m.name);
