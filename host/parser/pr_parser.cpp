@@ -995,6 +995,7 @@ bool Reader::reference(const Token& t, TsValue& v) {
         f.begin = w.begin + at;
         return f;
     };
+    if (t.text.empty()) return fail(t);  // ""
     v.reference = t.text.data();
     if (!t.quoted) {
         const std::size_t op = t.text.find_first_of("*/");

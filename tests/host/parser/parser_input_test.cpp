@@ -1,6 +1,7 @@
 // File-level behaviour: comments, line ends, source texts, bad input and recovery.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <filesystem>
 
 #include "host/port/msgman.h"
@@ -245,4 +246,40 @@ TEST(ParserFile, LargeFileWithoutFinalNewline) {
     const auto cut = parse_text(text, &ok);
     EXPECT_FALSE(ok);
     EXPECT_EQ(cut.back().what.substr(0, 21), "syntax(60001,16,\"qqqq");
+}
+
+TEST(ParserErrors, TokenSoupNeverBreaksTheParser) {
+    // Random mixtures of the language's pieces: the parser must stay within the file, give
+    // callbacks with sane positions, and come back to a clean statement at the end.
+    static const char* const pieces[] = {
+        "NET", "INST", "TIMESPEC", "TIMEGRP", "OFFSET", "CONFIG", "PERIOD", "FROM", "TO", "TIG",
+        "HIGH", "LOW", "IN", "BEFORE", "EXCEPT", "RISING", "PHASE", "PRIORITY", "TNM", "LOC",
+        "INIT_00..01", "RLOC_RANGE", "MAXDELAY", "=", ";", "|", ",", ":", "*", "/", "\"", "\"a b\"",
+        "#", "//", "\n", "\r\n", " ", "\t", "10", "-1.5", "ns", "MHz", "%", "50%", "2.5ns", "x",
+        "a:b", "\x01", "\x7f", "\xff", "+", "TS_a*2", "C", "mV"};
+    unsigned seed = 12345;
+    auto rnd = [&seed](unsigned n) {
+        seed = seed * 1103515245u + 12345u;
+        return (seed >> 16) % n;
+    };
+    for (int file = 0; file < 300; ++file) {
+        std::string text;
+        const unsigned count = 1 + rnd(60);
+        for (unsigned i = 0; i < count; ++i) {
+            text += pieces[rnd(std::size(pieces))];
+            if (rnd(3) == 0) text += ' ';
+        }
+        const int lines = 1 + static_cast<int>(std::count(text.begin(), text.end(), '\n'));
+        text += "\nNET sentinel;\n";
+        const auto calls = parse_text(text);
+        ASSERT_FALSE(calls.empty()) << text;
+        for (const Call& c : calls) {
+            EXPECT_GE(c.line, 1) << text;
+            EXPECT_LE(c.line, lines + 1) << text;
+            EXPECT_LE(c.ascii.size(), text.size()) << text;
+        }
+        // The sentinel is read unless an open statement or quote swallowed it.
+        const Call& last = calls.back();
+        EXPECT_TRUE(last.what == "net(sentinel;)" || last.line <= lines) << text;
+    }
 }

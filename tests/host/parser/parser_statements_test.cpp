@@ -231,6 +231,7 @@ TEST(ParserTimespec, ReferenceOperatorSpellings) {
         {"TIMESPEC T = PERIOD g TS_clk/2.5;",
          "period(T,g,TS_clk,false,2.5,true,true,0,false,0,50,null,NONE)"},
         {"TIMESPEC T = PERIOD g *2;", "syntax(1,23,*2)"},
+        {"TIMESPEC T = PERIOD g \"\" * 2;", "syntax(1,23,)"},
         {"TIMESPEC T = PERIOD g TS_clk *;", "syntax(1,31,;)"},
     });
 }
