@@ -29,7 +29,9 @@ constexpr std::array<std::uint8_t, 256> make_classes() {
 
 constexpr std::array<std::uint8_t, 256> kClass = make_classes();
 
-inline std::uint8_t cls(char c) { return kClass[static_cast<unsigned char>(c)]; }
+inline std::uint8_t cls(char c) {
+    return kClass[static_cast<unsigned char>(c)];
+}
 
 constexpr std::size_t kBlockSize = 64 * 1024;
 
@@ -62,7 +64,8 @@ std::string_view Arena::copy(std::string_view text) {
 
 Lexer::Lexer(const char* data, std::size_t size) : data_(data), size_(size) {
     if (size >= 3 && static_cast<unsigned char>(data[0]) == 0xEF &&
-        static_cast<unsigned char>(data[1]) == 0xBB && static_cast<unsigned char>(data[2]) == 0xBF) {
+        static_cast<unsigned char>(data[1]) == 0xBB &&
+        static_cast<unsigned char>(data[2]) == 0xBF) {
         state.pos = 3;
         state.line_start = 3;
     }
@@ -123,26 +126,26 @@ void Lexer::next(Token& tok, Arena& arena) {
     state.at_line_start = false;
     char c = d[p];
     switch (cls(c)) {
-    case kPunct:
-        tok.kind = c == ';' ? Tok::Semi : c == '=' ? Tok::Eq : c == '|' ? Tok::Bar : Tok::Comma;
-        tok.text = c == ';' ? ";" : c == '=' ? "=" : c == '|' ? "|" : ",";
-        tok.end = p + 1;
-        state.pos = p + 1;
-        break;
-    case kControl: {
-        static const char hex[] = "0123456789ABCDEF";
-        unsigned char b = static_cast<unsigned char>(c);
-        char text[4] = {'\\', 'x', hex[b >> 4], hex[b & 15]};
-        tok.kind = Tok::BadByte;
-        tok.text = arena.copy({text, 4});
-        tok.end = p + 1;
-        state.pos = p + 1;
-        break;
-    }
-    default:
-        state.pos = p;
-        word(tok, arena);
-        return;
+        case kPunct:
+            tok.kind = c == ';' ? Tok::Semi : c == '=' ? Tok::Eq : c == '|' ? Tok::Bar : Tok::Comma;
+            tok.text = c == ';' ? ";" : c == '=' ? "=" : c == '|' ? "|" : ",";
+            tok.end = p + 1;
+            state.pos = p + 1;
+            break;
+        case kControl: {
+            static const char hex[] = "0123456789ABCDEF";
+            unsigned char b = static_cast<unsigned char>(c);
+            char text[4] = {'\\', 'x', hex[b >> 4], hex[b & 15]};
+            tok.kind = Tok::BadByte;
+            tok.text = arena.copy({text, 4});
+            tok.end = p + 1;
+            state.pos = p + 1;
+            break;
+        }
+        default:
+            state.pos = p;
+            word(tok, arena);
+            return;
     }
     tok.after = state;
 }
@@ -267,7 +270,8 @@ void Lexer::comment_line(std::string& text, std::string& line_text) {
         out.clear();
         for (std::size_t i = from; i < to;) {
             const void* nul = std::memchr(d + i, '\0', to - i);
-            std::size_t stop = nul ? static_cast<std::size_t>(static_cast<const char*>(nul) - d) : to;
+            std::size_t stop =
+                nul ? static_cast<std::size_t>(static_cast<const char*>(nul) - d) : to;
             out.append(d + i, stop - i);
             i = stop + 1;
         }

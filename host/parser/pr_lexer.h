@@ -13,7 +13,7 @@ namespace pr_detail {
 // Bump allocator for the texts of one statement. reset() rewinds and keeps the blocks, so
 // steady-state parsing allocates nothing. Returned memory stays put until reset().
 class Arena {
-public:
+  public:
     char* alloc(std::size_t n);
     // A NUL-terminated copy; the view excludes the NUL.
     std::string_view copy(std::string_view text);
@@ -22,7 +22,7 @@ public:
         used_ = 0;
     }
 
-private:
+  private:
     struct Block {
         std::unique_ptr<char[]> data;
         std::size_t size;
@@ -53,8 +53,8 @@ enum class Tok : std::uint8_t {
 
 struct Token {
     Tok kind = Tok::End;
-    bool quoted = false;     // a word holding at least one quoted section
-    bool in_quote = false;   // BadByte: met inside a quoted section
+    bool quoted = false;    // a word holding at least one quoted section
+    bool in_quote = false;  // BadByte: met inside a quoted section
     int line = 0;
     int col = 0;
     std::size_t begin = 0;  // source range
@@ -64,7 +64,7 @@ struct Token {
 };
 
 class Lexer {
-public:
+  public:
     // A byte-order mark at the very start is skipped.
     Lexer(const char* data, std::size_t size);
 
@@ -93,7 +93,7 @@ public:
 
     LexState state;
 
-private:
+  private:
     std::size_t line_end(std::size_t pos) const;  // offset of the LF ending pos's line, or size
     void word(Token& tok, Arena& arena);
 

@@ -19,7 +19,7 @@ class Reader;
 // An array of NUL-terminated texts kept in one buffer; begin()/end() give `const char*`s.
 // Clearing keeps the capacity, so a reused list allocates nothing once warmed up.
 class TextList {
-public:
+  public:
     TextList() = default;
     TextList(const TextList& other);
     TextList& operator=(const TextList& other);
@@ -33,7 +33,7 @@ public:
     const char* const* begin() const { return ptrs_.data(); }
     const char* const* end() const { return ptrs_.data() + ptrs_.size(); }
 
-private:
+  private:
     void relink();
 
     std::string buf_;
@@ -44,9 +44,10 @@ private:
 
 // Where a statement (or comment line) came from.
 class Pr_Logical_ConstraintHandle {
-public:
+  public:
     Pr_Logical_ConstraintHandle() = default;
-    Pr_Logical_ConstraintHandle(int line, const char* text) : line_(line), text_(text ? text : "") {}
+    Pr_Logical_ConstraintHandle(int line, const char* text)
+        : line_(line), text_(text ? text : "") {}
 
     // Line of the statement's first token, from 1.
     int getline() const { return line_; }
@@ -58,14 +59,14 @@ public:
         text_.assign(text.data(), text.size());
     }
 
-private:
+  private:
     int line_ = 0;
     std::string text_;
 };
 
 // One constraint of a NET, INST, PIN, MODEL, AREA_GROUP or SET statement.
 class Pr_Logical_Constraint {
-public:
+  public:
     enum Pr_Logical_ConstraintType {
         BASE = 0,
         STRING = 1,
@@ -83,10 +84,10 @@ public:
     // The key exactly as written.
     const char* get_name() const { return name_.c_str(); }
 
-protected:
+  protected:
     void set_name(std::string_view name) { name_.assign(name.data(), name.size()); }
 
-private:
+  private:
     friend class pr_detail::Reader;
     Pr_Logical_ConstraintType type_;
     std::string name_;
@@ -96,13 +97,13 @@ using Pr_Logical_ConstraintType = Pr_Logical_Constraint::Pr_Logical_ConstraintTy
 
 // Kind 1: key = value.
 class Pr_Logical_StringConstraint : public Pr_Logical_Constraint {
-public:
+  public:
     explicit Pr_Logical_StringConstraint(const char* name = "", const char* value = "")
         : Pr_Logical_Constraint(STRING, name), value_(value ? value : "") {}
 
     const char* get_value() const { return value_.c_str(); }
 
-private:
+  private:
     friend class pr_detail::Reader;
     void reset(std::string_view name, std::string_view value) {
         set_name(name);
@@ -113,7 +114,7 @@ private:
 
 // Kind 2: key with a list of values (possibly none).
 class Pr_Logical_StringListConstraint : public Pr_Logical_Constraint {
-public:
+  public:
     explicit Pr_Logical_StringListConstraint(const char* name = "",
                                              std::initializer_list<const char*> values = {})
         : Pr_Logical_Constraint(STRING_LIST_TYPE, name) {
@@ -126,7 +127,7 @@ public:
     const char* const* begin_value() const { return values_.begin(); }
     const char* const* end_value() const { return values_.end(); }
 
-private:
+  private:
     friend class pr_detail::Reader;
     void reset(std::string_view name) {
         set_name(name);
@@ -137,7 +138,7 @@ private:
 
 // Kind 3: INIT_hh..hh / INITP_hh..hh = value, one property name per number of the range.
 class Pr_Logical_InitRangeConstraint : public Pr_Logical_Constraint {
-public:
+  public:
     // Expands the names from `name`: a key of the exact form INIT_hh..hh or INITP_hh..hh
     // (any letter case) with an ascending or single-number range gives INIT_ (or INITP_)
     // followed by each number as two upper-case hexadecimal digits; any other key, or a
@@ -154,7 +155,7 @@ public:
     // ("INIT_" or "INITP_") and the two numbers as written (first may exceed last).
     static bool parse_key(std::string_view key, const char** prefix, int* first, int* last);
 
-private:
+  private:
     friend class pr_detail::Reader;
     Pr_Logical_InitRangeConstraint() : Pr_Logical_InitRangeConstraint(INIT_, "", "") {}
     void reset(std::string_view name, std::string_view value);
@@ -166,7 +167,7 @@ private:
 
 // Kind 4: OFFSET = ( IN | OUT ) time [VALID time] ( BEFORE | AFTER ) clock [TIMEGRP g] [level].
 class Pr_Logical_OffsetConstraint : public Pr_Logical_Constraint {
-public:
+  public:
     // `valid`, `tgname` and `level` may be null (absent).
     Pr_Logical_OffsetConstraint(const char* name, bool in, double time, const double* valid,
                                 bool before, const char* clock, const char* tgname,
@@ -182,9 +183,10 @@ public:
     // The level word in upper case, or the empty text.
     const char* get_high_or_low() const { return level_.c_str(); }
 
-private:
+  private:
     friend class pr_detail::Reader;
-    Pr_Logical_OffsetConstraint() : Pr_Logical_OffsetConstraint("", true, 0, nullptr, true, "", nullptr, nullptr) {}
+    Pr_Logical_OffsetConstraint()
+        : Pr_Logical_OffsetConstraint("", true, 0, nullptr, true, "", nullptr, nullptr) {}
 
     bool in_ = true;
     double time_ = 0;
@@ -198,7 +200,7 @@ private:
 
 // Kind 5: PERIOD = value { ( HIGH | LOW ) [figure] | INPUT_JITTER time }.
 class Pr_Logical_PeriodConstraint : public Pr_Logical_Constraint {
-public:
+  public:
     // `jitter` may be null (absent).
     Pr_Logical_PeriodConstraint(const char* name, double period, bool low, double hightime,
                                 double highpercent, const double* jitter);
@@ -210,7 +212,7 @@ public:
     double gethighpercent() const { return highpercent_; }
     const double* get_input_jitter() const { return jitter_ ? &*jitter_ : nullptr; }
 
-private:
+  private:
     friend class pr_detail::Reader;
     Pr_Logical_PeriodConstraint() : Pr_Logical_PeriodConstraint("", 0, false, 0, 50, nullptr) {}
 
@@ -223,7 +225,7 @@ private:
 
 // The object of a statement and its constraints in written order.
 class Pr_Logical_ConstraintDefn {
-public:
+  public:
     explicit Pr_Logical_ConstraintDefn(const char* object_name = "")
         : name_(object_name ? object_name : "") {}
     Pr_Logical_ConstraintDefn(const Pr_Logical_ConstraintDefn&) = delete;
@@ -240,7 +242,7 @@ public:
     Pr_Logical_Constraint* const* begin_constraint() const { return list_.data(); }
     Pr_Logical_Constraint* const* end_constraint() const { return list_.data() + list_.size(); }
 
-private:
+  private:
     friend class pr_detail::Reader;
     std::string name_;
     std::vector<Pr_Logical_Constraint*> list_;
@@ -261,7 +263,7 @@ enum PR_EDGE {
 inline constexpr int PR_NO_PRIORITY = 2147483647;
 
 class Pr_Logical_Parser {
-public:
+  public:
     // Binds the parser to a file; a null name is allowed (parse() then reports it cannot open).
     explicit Pr_Logical_Parser(const char* filename);
     Pr_Logical_Parser(const Pr_Logical_Parser& other);
@@ -295,13 +297,12 @@ public:
                             const char* clock, const char* regs, const char* level,
                             const Handle* handle);
     virtual bool cb_troffset(const char* group, bool in, double time, const double* valid,
-                             bool before, const char* clock, const char* regs,
-                             const char* level, const Handle* handle);
+                             bool before, const char* clock, const char* regs, const char* level,
+                             const Handle* handle);
     virtual bool cb_tspec_maxdelay(const char* name, bool has_from, bool has_to,
-                                   const std::vector<const char*>& points,
-                                   const char* reference, bool multiply, double value,
-                                   bool is_time, int priority, bool datapathonly,
-                                   const Handle* handle);
+                                   const std::vector<const char*>& points, const char* reference,
+                                   bool multiply, double value, bool is_time, int priority,
+                                   bool datapathonly, const Handle* handle);
     virtual bool cb_tspec_period(const char* name, const char* group, const char* reference,
                                  bool multiply, double value, bool is_time, bool phase_plus,
                                  double phase, bool low, double duration, double percent,
@@ -333,6 +334,6 @@ public:
     // The file name as given; the empty text when none was given.
     const char* get_filename() const { return filename_.c_str(); }
 
-private:
+  private:
     std::string filename_;
 };

@@ -20,7 +20,9 @@ namespace pr_detail {
 
 namespace {
 
-inline char upper(char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c; }
+inline char upper(char c) {
+    return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c;
+}
 
 // `a` equals the upper-case word `up` in any letter case.
 bool ieq(std::string_view a, std::string_view up) {
@@ -39,7 +41,9 @@ inline bool is_colon(const Token& t) {
     return t.kind == Tok::Word && !t.quoted && t.text.size() == 1 && t.text[0] == ':';
 }
 
-inline bool is_terminator(const Token& t) { return t.kind == Tok::Bar || t.kind == Tok::Semi; }
+inline bool is_terminator(const Token& t) {
+    return t.kind == Tok::Bar || t.kind == Tok::Semi;
+}
 
 inline bool looks_numeric(const Token& t) {
     return t.kind == Tok::Word && !t.quoted && numeric_looking(t.text);
@@ -47,11 +51,11 @@ inline bool looks_numeric(const Token& t) {
 
 // Words that may not stand as a TIMESPEC reference name.
 constexpr std::string_view kStructural[] = {
-    "PERIOD",  "FROM",      "THRU",         "TO",       "TIG",      "IGNORE",  "DROP_SPEC",
-    "HIGH",    "LOW",       "IN",           "OUT",      "BEFORE",   "AFTER",   "VALID",
-    "DATAPATHONLY", "PRIORITY", "PHASE",    "INPUT_JITTER", "EXCEPT", "RISING", "FALLING",
-    "TRANSHI", "TRANSLO",   "TIMEGRP",      "AREA_GROUP", "OFFSET", "MODEL",   "PROHIBIT",
-    "VREF"};
+    "PERIOD",     "FROM",   "THRU",         "TO",       "TIG",     "IGNORE",
+    "DROP_SPEC",  "HIGH",   "LOW",          "IN",       "OUT",     "BEFORE",
+    "AFTER",      "VALID",  "DATAPATHONLY", "PRIORITY", "PHASE",   "INPUT_JITTER",
+    "EXCEPT",     "RISING", "FALLING",      "TRANSHI",  "TRANSLO", "TIMEGRP",
+    "AREA_GROUP", "OFFSET", "MODEL",        "PROHIBIT", "VREF"};
 
 bool structural_or_unit(std::string_view w) {
     if (find_unit(w)) return true;
@@ -62,11 +66,16 @@ bool structural_or_unit(std::string_view w) {
 
 bool edge_of(const Token& t, PR_EDGE& edge) {
     if (t.kind != Tok::Word || t.quoted) return false;
-    if (ieq(t.text, "RISING")) edge = PR_RISING;
-    else if (ieq(t.text, "FALLING")) edge = PR_FALLING;
-    else if (ieq(t.text, "TRANSHI")) edge = PR_TRANSHI;
-    else if (ieq(t.text, "TRANSLO")) edge = PR_TRANSLO;
-    else return false;
+    if (ieq(t.text, "RISING"))
+        edge = PR_RISING;
+    else if (ieq(t.text, "FALLING"))
+        edge = PR_FALLING;
+    else if (ieq(t.text, "TRANSHI"))
+        edge = PR_TRANSHI;
+    else if (ieq(t.text, "TRANSLO"))
+        edge = PR_TRANSLO;
+    else
+        return false;
     return true;
 }
 
@@ -148,13 +157,13 @@ struct Pool {
 }  // namespace
 
 class Reader {
-public:
+  public:
     Reader(Pr_Logical_Parser& parser, const char* data, std::size_t size)
         : parser_(parser), lexer_(data, size) {}
 
     bool run();
 
-private:
+  private:
     using Handle = Pr_Logical_ConstraintHandle;
     using Defn = Pr_Logical_ConstraintDefn;
     using ObjectCallback = bool (Pr_Logical_Parser::*)(const Defn&, const Handle*);
@@ -304,18 +313,18 @@ private:
 bool Reader::run() {
     for (;;) {
         switch (lexer_.between()) {
-        case Lexer::Gap::End:
-            return ok_ && !syntax_error_;
-        case Lexer::Gap::CommentLine: {
-            const int line = lexer_.state.line;
-            lexer_.comment_line(comment_text_, comment_line_);
-            handle_.assign(line, comment_line_);
-            result(parser_.cb_comment(comment_text_.c_str(), &handle_));
-            break;
-        }
-        case Lexer::Gap::Statement:
-            statement();
-            break;
+            case Lexer::Gap::End:
+                return ok_ && !syntax_error_;
+            case Lexer::Gap::CommentLine: {
+                const int line = lexer_.state.line;
+                lexer_.comment_line(comment_text_, comment_line_);
+                handle_.assign(line, comment_line_);
+                result(parser_.cb_comment(comment_text_.c_str(), &handle_));
+                break;
+            }
+            case Lexer::Gap::Statement:
+                statement();
+                break;
         }
     }
 }
@@ -335,60 +344,61 @@ void Reader::statement() {
 bool Reader::dispatch() {
     const std::string_view w = first_.text;
     switch (upper(w[0])) {
-    case 'N':
-        if (ieq(w, "NET")) return object_statement(&Pr_Logical_Parser::cb_net);
-        break;
-    case 'I':
-        if (ieq(w, "INST")) return object_statement(&Pr_Logical_Parser::cb_comp);
-        break;
-    case 'P':
-        if (ieq(w, "PIN")) return object_statement(&Pr_Logical_Parser::cb_pin);
-        if (ieq(w, "PROHIBIT")) return expect_eq() && site_list(&Pr_Logical_Parser::cb_prohibit);
-        break;
-    case 'M':
-        if (ieq(w, "MODEL")) return object_statement(&Pr_Logical_Parser::cb_model);
-        break;
-    case 'T':
-        if (ieq(w, "TIMESPEC")) return timespec();
-        if (ieq(w, "TIMEGRP")) return timegrp();
-        if (ieq(w, "TEMPERATURE")) return temperature_or_voltage(true);
-        break;
-    case 'O':
-        if (ieq(w, "OFFSET")) return offset_statement();
-        break;
-    case 'E':
-        if (ieq(w, "ENABLE")) return enable(true);
-        if (ieq(w, "END")) {
-            if (!expect_end()) return false;
-            result(parser_.cb_end_model(&handle_));
-            return true;
-        }
-        break;
-    case 'D':
-        if (ieq(w, "DISABLE")) return enable(false);
-        break;
-    case 'A':
-        if (ieq(w, "AREA_GROUP")) return group_statement(true);
-        break;
-    case 'S':
-        if (ieq(w, "SET")) return group_statement(false);
-        if (ieq(w, "SYSTEM_JITTER")) {
-            Token eq;
-            return expect(Tok::Eq, eq) && raw_value(first_.text.data(), eq.end);
-        }
-        break;
-    case 'C':
-        if (ieq(w, "CONFIG")) return config();
-        break;
-    case 'V':
-        if (ieq(w, "VREF")) return expect_eq() && site_list(&Pr_Logical_Parser::cb_vref);
-        if (ieq(w, "VOLTAGE")) return temperature_or_voltage(false);
-        break;
-    case 'B':
-        if (ieq(w, "BEGIN")) return begin_model();
-        break;
-    default:
-        break;
+        case 'N':
+            if (ieq(w, "NET")) return object_statement(&Pr_Logical_Parser::cb_net);
+            break;
+        case 'I':
+            if (ieq(w, "INST")) return object_statement(&Pr_Logical_Parser::cb_comp);
+            break;
+        case 'P':
+            if (ieq(w, "PIN")) return object_statement(&Pr_Logical_Parser::cb_pin);
+            if (ieq(w, "PROHIBIT"))
+                return expect_eq() && site_list(&Pr_Logical_Parser::cb_prohibit);
+            break;
+        case 'M':
+            if (ieq(w, "MODEL")) return object_statement(&Pr_Logical_Parser::cb_model);
+            break;
+        case 'T':
+            if (ieq(w, "TIMESPEC")) return timespec();
+            if (ieq(w, "TIMEGRP")) return timegrp();
+            if (ieq(w, "TEMPERATURE")) return temperature_or_voltage(true);
+            break;
+        case 'O':
+            if (ieq(w, "OFFSET")) return offset_statement();
+            break;
+        case 'E':
+            if (ieq(w, "ENABLE")) return enable(true);
+            if (ieq(w, "END")) {
+                if (!expect_end()) return false;
+                result(parser_.cb_end_model(&handle_));
+                return true;
+            }
+            break;
+        case 'D':
+            if (ieq(w, "DISABLE")) return enable(false);
+            break;
+        case 'A':
+            if (ieq(w, "AREA_GROUP")) return group_statement(true);
+            break;
+        case 'S':
+            if (ieq(w, "SET")) return group_statement(false);
+            if (ieq(w, "SYSTEM_JITTER")) {
+                Token eq;
+                return expect(Tok::Eq, eq) && raw_value(first_.text.data(), eq.end);
+            }
+            break;
+        case 'C':
+            if (ieq(w, "CONFIG")) return config();
+            break;
+        case 'V':
+            if (ieq(w, "VREF")) return expect_eq() && site_list(&Pr_Logical_Parser::cb_vref);
+            if (ieq(w, "VOLTAGE")) return temperature_or_voltage(false);
+            break;
+        case 'B':
+            if (ieq(w, "BEGIN")) return begin_model();
+            break;
+        default:
+            break;
     }
     return fail(first_);
 }
@@ -402,26 +412,26 @@ bool Reader::fail(const Token& t) {
     f.col = t.col;
     f.from = t.after;
     switch (t.kind) {
-    case Tok::Semi:
-        f.text = ";";
-        f.resume = Resume::AtSemicolon;
-        f.end = t.end;
-        break;
-    case Tok::BadQuote:
-        f.text = t.text.data();
-        f.resume = Resume::NextLine;
-        f.end = t.end;
-        break;
-    case Tok::End:  // the statement runs into the end of the file
-        f.line = first_.line;
-        f.col = first_.col;
-        f.text = first_.text.data();
-        f.resume = Resume::Eof;
-        break;
-    default:
-        f.text = t.text.data();
-        f.in_quote = t.in_quote;
-        break;
+        case Tok::Semi:
+            f.text = ";";
+            f.resume = Resume::AtSemicolon;
+            f.end = t.end;
+            break;
+        case Tok::BadQuote:
+            f.text = t.text.data();
+            f.resume = Resume::NextLine;
+            f.end = t.end;
+            break;
+        case Tok::End:  // the statement runs into the end of the file
+            f.line = first_.line;
+            f.col = first_.col;
+            f.text = first_.text.data();
+            f.resume = Resume::Eof;
+            break;
+        default:
+            f.text = t.text.data();
+            f.in_quote = t.in_quote;
+            break;
     }
     return false;
 }
@@ -514,40 +524,41 @@ bool Reader::quantity(const Token& w, Pos pos, Quantity& q) {
 
     double m = 0;
     switch (q.family) {
-    case kTime:
-        shifted_digits(n, unit ? unit->shift : 3, scratch_);
-        if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
-        q.ps_text = arena_.copy(scratch_);
-        break;
-    case kFrequency: {
-        shifted_digits(n, unit->shift, scratch_);
-        double hz = 0;
-        if (!decimal_to_double(scratch_, hz) || hz == 0) return fail_value(w, separate);
-        m = 1.0e12 / hz;
-        if (!std::isfinite(m)) return fail_value(w, separate);
-        break;
-    }
-    case kPercent:
-        shifted_digits(n, 0, scratch_);
-        if (!decimal_to_double(scratch_, m) || !(m > 0 && m < 100)) return fail_value(w, separate);
-        break;
-    case kTemperature: {
-        shifted_digits(n, 0, scratch_);
-        if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
-        const double t = n.negative ? -m : m;
-        const char scale = unit ? unit->scale : 'C';
-        q.value = scale == 'F' ? ((t - 32.0) * 5.0) / 9.0 : scale == 'K' ? t - 273.15 : t;
-        q.magnitude = std::fabs(q.value);
-        return true;
-    }
-    case kVoltage:
-        shifted_digits(n, unit ? unit->shift : 0, scratch_);
-        if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
-        break;
-    default:
-        shifted_digits(n, 0, scratch_);
-        if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
-        break;
+        case kTime:
+            shifted_digits(n, unit ? unit->shift : 3, scratch_);
+            if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
+            q.ps_text = arena_.copy(scratch_);
+            break;
+        case kFrequency: {
+            shifted_digits(n, unit->shift, scratch_);
+            double hz = 0;
+            if (!decimal_to_double(scratch_, hz) || hz == 0) return fail_value(w, separate);
+            m = 1.0e12 / hz;
+            if (!std::isfinite(m)) return fail_value(w, separate);
+            break;
+        }
+        case kPercent:
+            shifted_digits(n, 0, scratch_);
+            if (!decimal_to_double(scratch_, m) || !(m > 0 && m < 100))
+                return fail_value(w, separate);
+            break;
+        case kTemperature: {
+            shifted_digits(n, 0, scratch_);
+            if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
+            const double t = n.negative ? -m : m;
+            const char scale = unit ? unit->scale : 'C';
+            q.value = scale == 'F' ? ((t - 32.0) * 5.0) / 9.0 : scale == 'K' ? t - 273.15 : t;
+            q.magnitude = std::fabs(q.value);
+            return true;
+        }
+        case kVoltage:
+            shifted_digits(n, unit ? unit->shift : 0, scratch_);
+            if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
+            break;
+        default:
+            shifted_digits(n, 0, scratch_);
+            if (!decimal_to_double(scratch_, m)) return fail_value(w, separate);
+            break;
     }
     q.magnitude = m;
     q.value = n.negative ? -m : m;
@@ -1078,11 +1089,11 @@ bool Reader::offset_statement() {
     OffsetBody b;
     if (!expect_eq() || !offset_body(b) || !expect_end()) return false;
     if (b.group)
-        result(parser_.cb_roffset(b.in, b.time, b.has_valid ? &b.valid : nullptr, b.before,
-                                  b.clock, b.group, b.level, &handle_));
+        result(parser_.cb_roffset(b.in, b.time, b.has_valid ? &b.valid : nullptr, b.before, b.clock,
+                                  b.group, b.level, &handle_));
     else
-        result(parser_.cb_offset(b.in, b.time, b.has_valid ? &b.valid : nullptr, b.before,
-                                 b.clock, b.level, &handle_));
+        result(parser_.cb_offset(b.in, b.time, b.has_valid ? &b.valid : nullptr, b.before, b.clock,
+                                 b.level, &handle_));
     return true;
 }
 
@@ -1226,8 +1237,8 @@ bool Reader::raw_value(const char* name, std::size_t from) {
     Token t;
     for (;;) {
         t = take();
-        if (t.kind != Tok::Word && t.kind != Tok::Semi && t.kind != Tok::Eq &&
-            t.kind != Tok::Bar && t.kind != Tok::Comma)
+        if (t.kind != Tok::Word && t.kind != Tok::Semi && t.kind != Tok::Eq && t.kind != Tok::Bar &&
+            t.kind != Tok::Comma)
             return fail(t);
         gap(prev, t.begin);
         if (t.kind == Tok::Semi) break;
@@ -1270,10 +1281,12 @@ bool Reader::begin_model() {
 
 namespace {
 
-Port_MsgManData messages() { return Port_MsgManData::createObject("Quillmap", "parser", __LINE__, "1.0"); }
+Port_MsgManData messages() {
+    return Port_MsgManData::createObject("Quillmap", "parser", __LINE__, "1.0");
+}
 
 class FileDescriptor {
-public:
+  public:
     explicit FileDescriptor(int fd) : fd_(fd) {}
     ~FileDescriptor() {
         if (fd_ >= 0) ::close(fd_);
@@ -1282,7 +1295,7 @@ public:
     FileDescriptor& operator=(const FileDescriptor&) = delete;
     int get() const { return fd_; }
 
-private:
+  private:
     int fd_;
 };
 
@@ -1290,7 +1303,7 @@ enum class ReadResult { Ok, CannotOpen, CannotRead };
 
 // The bytes of a constraint file: large regular files are mapped, others read into memory.
 class FileText {
-public:
+  public:
     FileText() = default;
     ~FileText() {
         if (mapped_) ::munmap(mapped_, size_);
@@ -1302,7 +1315,7 @@ public:
     const char* data() const { return mapped_ ? static_cast<const char*>(mapped_) : buffer_.get(); }
     std::size_t size() const { return size_; }
 
-private:
+  private:
     static constexpr std::size_t kMapThreshold = 1 << 20;
     void* mapped_ = nullptr;
     std::unique_ptr<char[]> buffer_;
@@ -1357,14 +1370,14 @@ Pr_Logical_Parser::~Pr_Logical_Parser() = default;
 bool Pr_Logical_Parser::parse() {
     FileText text;
     switch (text.load(filename_.c_str())) {
-    case ReadResult::CannotOpen:
-        messages().issueError("Could not open constraint file '%s'.\n", filename_.c_str());
-        return false;
-    case ReadResult::CannotRead:
-        messages().issueError("Could not read constraint file '%s'.\n", filename_.c_str());
-        return false;
-    case ReadResult::Ok:
-        break;
+        case ReadResult::CannotOpen:
+            messages().issueError("Could not open constraint file '%s'.\n", filename_.c_str());
+            return false;
+        case ReadResult::CannotRead:
+            messages().issueError("Could not read constraint file '%s'.\n", filename_.c_str());
+            return false;
+        case ReadResult::Ok:
+            break;
     }
     pr_detail::Reader reader(*this, text.data(), text.size());
     return reader.run();
@@ -1382,19 +1395,45 @@ bool Pr_Logical_Parser::cb_syntax_error(int line, int column, const char* text, 
     return false;
 }
 
-bool Pr_Logical_Parser::cb_comment(const char*, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_enable(bool, const char*, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_areagroup(const Defn&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_net(const Defn&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_comp(const Defn&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_pin(const Defn&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_model(const Defn&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_set(const Defn&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_config(const char*, const char*, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_begin_model(const char*, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_end_model(const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_prohibit(const std::vector<const char*>&, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_vref(const std::vector<const char*>&, const Handle*) { return true; }
+bool Pr_Logical_Parser::cb_comment(const char*, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_enable(bool, const char*, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_areagroup(const Defn&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_net(const Defn&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_comp(const Defn&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_pin(const Defn&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_model(const Defn&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_set(const Defn&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_config(const char*, const char*, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_begin_model(const char*, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_end_model(const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_prohibit(const std::vector<const char*>&, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_vref(const std::vector<const char*>&, const Handle*) {
+    return true;
+}
 bool Pr_Logical_Parser::cb_offset(bool, double, const double*, bool, const char*, const char*,
                                   const Handle*) {
     return true;
@@ -1425,18 +1464,25 @@ bool Pr_Logical_Parser::cb_tspec_tig(const char*, bool, bool, const std::vector<
                                      const Handle*) {
     return true;
 }
-bool Pr_Logical_Parser::cb_tspec_drop_spec(const char*, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_timegrp(const char*,
-                                   const std::vector<std::pair<const char*, PR_EDGE>>&,
+bool Pr_Logical_Parser::cb_tspec_drop_spec(const char*, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_timegrp(const char*, const std::vector<std::pair<const char*, PR_EDGE>>&,
                                    const std::vector<const char*>&, const Handle*) {
     return true;
 }
 bool Pr_Logical_Parser::cb_timegrp_areagroup(const char*, const char*, const Handle*) {
     return true;
 }
-bool Pr_Logical_Parser::cb_temperature(double, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_voltage(double, const Handle*) { return true; }
-bool Pr_Logical_Parser::cb_default(const Handle*) { return true; }
+bool Pr_Logical_Parser::cb_temperature(double, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_voltage(double, const Handle*) {
+    return true;
+}
+bool Pr_Logical_Parser::cb_default(const Handle*) {
+    return true;
+}
 
 bool Pr_Logical_Parser::dump() {
     Port_MsgManData::debugStub("Pr_Logical_Parser: constraint file '%s'\n", filename_.c_str());
@@ -1453,4 +1499,6 @@ bool Pr_Logical_Parser::load(const char* filename) {
     return true;
 }
 
-bool Pr_Logical_Parser::write(const char*) const { return false; }
+bool Pr_Logical_Parser::write(const char*) const {
+    return false;
+}

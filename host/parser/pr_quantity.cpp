@@ -13,15 +13,19 @@ struct UnitName {
 };
 
 constexpr UnitName kUnits[] = {
-    {"ps", {kTime, 0, 0}},        {"ns", {kTime, 3, 0}},        {"us", {kTime, 6, 0}},
-    {"ms", {kTime, 9, 0}},        {"hz", {kFrequency, 0, 0}},   {"khz", {kFrequency, 3, 0}},
-    {"mhz", {kFrequency, 6, 0}},  {"ghz", {kFrequency, 9, 0}},  {"%", {kPercent, 0, 0}},
+    {"ps", {kTime, 0, 0}},         {"ns", {kTime, 3, 0}},         {"us", {kTime, 6, 0}},
+    {"ms", {kTime, 9, 0}},         {"hz", {kFrequency, 0, 0}},    {"khz", {kFrequency, 3, 0}},
+    {"mhz", {kFrequency, 6, 0}},   {"ghz", {kFrequency, 9, 0}},   {"%", {kPercent, 0, 0}},
     {"c", {kTemperature, 0, 'C'}}, {"f", {kTemperature, 0, 'F'}}, {"k", {kTemperature, 0, 'K'}},
-    {"v", {kVoltage, 0, 0}},      {"mv", {kVoltage, -3, 0}},
+    {"v", {kVoltage, 0, 0}},       {"mv", {kVoltage, -3, 0}},
 };
 
-inline bool is_digit(char c) { return c >= '0' && c <= '9'; }
-inline char lower(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c; }
+inline bool is_digit(char c) {
+    return c >= '0' && c <= '9';
+}
+inline char lower(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c;
+}
 
 }  // namespace
 
@@ -97,7 +101,8 @@ void shifted_digits(const Number& n, int shift, std::string& out) {
 bool decimal_to_double(std::string_view text, double& out) {
     double v = 0;
     auto r = std::from_chars(text.data(), text.data() + text.size(), v, std::chars_format::fixed);
-    if (r.ec != std::errc() || r.ptr != text.data() + text.size() || !std::isfinite(v)) return false;
+    if (r.ec != std::errc() || r.ptr != text.data() + text.size() || !std::isfinite(v))
+        return false;
     out = v;
     return true;
 }

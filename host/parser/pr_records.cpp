@@ -3,7 +3,9 @@
 
 namespace pr_detail {
 
-TextList::TextList(const TextList& other) : buf_(other.buf_), offsets_(other.offsets_) { relink(); }
+TextList::TextList(const TextList& other) : buf_(other.buf_), offsets_(other.offsets_) {
+    relink();
+}
 
 TextList& TextList::operator=(const TextList& other) {
     if (this != &other) {
@@ -100,8 +102,7 @@ bool Pr_Logical_InitRangeConstraint::parse_key(std::string_view key, const char*
 }
 
 Pr_Logical_InitRangeConstraint::Pr_Logical_InitRangeConstraint(Pr_Logical_ConstraintType type,
-                                                               const char* name,
-                                                               const char* value)
+                                                               const char* name, const char* value)
     : Pr_Logical_Constraint(type, name), value_(value ? value : "") {
     expand();
 }
@@ -143,9 +144,8 @@ Pr_Logical_OffsetConstraint::Pr_Logical_OffsetConstraint(const char* name, bool 
     if (valid) valid_ = *valid;
 }
 
-Pr_Logical_PeriodConstraint::Pr_Logical_PeriodConstraint(const char* name, double period,
-                                                         bool low, double hightime,
-                                                         double highpercent,
+Pr_Logical_PeriodConstraint::Pr_Logical_PeriodConstraint(const char* name, double period, bool low,
+                                                         double hightime, double highpercent,
                                                          const double* jitter)
     : Pr_Logical_Constraint(PERIOD, name),
       period_(period),

@@ -252,11 +252,14 @@ TEST(ParserErrors, TokenSoupNeverBreaksTheParser) {
     // Random mixtures of the language's pieces: the parser must stay within the file, give
     // callbacks with sane positions, and come back to a clean statement at the end.
     static const char* const pieces[] = {
-        "NET", "INST", "TIMESPEC", "TIMEGRP", "OFFSET", "CONFIG", "PERIOD", "FROM", "TO", "TIG",
-        "HIGH", "LOW", "IN", "BEFORE", "EXCEPT", "RISING", "PHASE", "PRIORITY", "TNM", "LOC",
-        "INIT_00..01", "RLOC_RANGE", "MAXDELAY", "=", ";", "|", ",", ":", "*", "/", "\"", "\"a b\"",
-        "#", "//", "\n", "\r\n", " ", "\t", "10", "-1.5", "ns", "MHz", "%", "50%", "2.5ns", "x",
-        "a:b", "\x01", "\x7f", "\xff", "+", "TS_a*2", "C", "mV"};
+        "NET",        "INST",     "TIMESPEC", "TIMEGRP",  "OFFSET", "CONFIG", "PERIOD",
+        "FROM",       "TO",       "TIG",      "HIGH",     "LOW",    "IN",     "BEFORE",
+        "EXCEPT",     "RISING",   "PHASE",    "PRIORITY", "TNM",    "LOC",    "INIT_00..01",
+        "RLOC_RANGE", "MAXDELAY", "=",        ";",        "|",      ",",      ":",
+        "*",          "/",        "\"",       "\"a b\"",  "#",      "//",     "\n",
+        "\r\n",       " ",        "\t",       "10",       "-1.5",   "ns",     "MHz",
+        "%",          "50%",      "2.5ns",    "x",        "a:b",    "\x01",   "\x7f",
+        "\xff",       "+",        "TS_a*2",   "C",        "mV"};
     unsigned seed = 12345;
     auto rnd = [&seed](unsigned n) {
         seed = seed * 1103515245u + 12345u;

@@ -34,10 +34,9 @@ TEST(ParserQuantities, PeriodValuesAsTimeOrFrequency) {
         {"TIMESPEC T = PERIOD g 0.1 GHz;", hundred_mhz},
         {"TIMESPEC T = PERIOD g 250MHz;",
          "period(T,g,null,true,4000,false,true,0,false,0,50,null,NONE)"},
-        {"TIMESPEC T = PERIOD g 74.25MHz;",
-         ("period(T,g,null,true," + num(1.0e12 / 74250000.0) +
-          ",false,true,0,false,0,50,null,NONE)")
-             .c_str()},
+        {"TIMESPEC T = PERIOD g 74.25MHz;", ("period(T,g,null,true," + num(1.0e12 / 74250000.0) +
+                                             ",false,true,0,false,0,50,null,NONE)")
+                                                .c_str()},
     });
 }
 
@@ -67,8 +66,7 @@ TEST(ParserQuantities, DutyFigures) {
         {"NET c PERIOD = 10 LOW 40;", "net(c;(PERIOD,5,10000,true,0,40,null))"},
         {"NET c PERIOD = 10 LOW;", "net(c;(PERIOD,5,10000,true,0,50,null))"},
         {"NET clk PERIOD = 20ns;", "net(clk;(PERIOD,5,20000,false,0,50,null))"},
-        {"NET c PERIOD = 8 INPUT_JITTER 50 ps HIGH 30%;",
-         "net(c;(PERIOD,5,8000,false,0,30,>50))"},
+        {"NET c PERIOD = 8 INPUT_JITTER 50 ps HIGH 30%;", "net(c;(PERIOD,5,8000,false,0,30,>50))"},
         {"NET c PERIOD = : 8 : LOW : 2;", "net(c;(PERIOD,5,8000,true,0,2,null))"},
     });
 }
@@ -260,8 +258,7 @@ TEST(ParserStatements, EnableOffsetAndGroups) {
     check({
         {"ENABLE = TS_clk;", "enable(true,TS_clk)"},
         {"disable = \"TS_old\";", "enable(false,TS_old)"},
-        {"OFFSET = OUT 3 ns VALID 1 ns AFTER clk HIGH;",
-         "offset(false,3000,>1000,false,clk,HIGH)"},
+        {"OFFSET = OUT 3 ns VALID 1 ns AFTER clk HIGH;", "offset(false,3000,>1000,false,clk,HIGH)"},
         {"OFFSET = IN 2 ns BEFORE \"clk\" TIMEGRP \"regs\";",
          "roffset(true,2000,null,true,clk,regs,null)"},
         {"OFFSET = IN : 2 ns : BEFORE : clk;", "offset(true,2000,null,true,clk,null)"},

@@ -1,6 +1,7 @@
 // Test helpers: a parser that records every callback as one line of text, and temporary files.
 #pragma once
 
+#include <gtest/gtest.h>
 #include <unistd.h>
 
 #include <charconv>
@@ -8,8 +9,6 @@
 #include <fstream>
 #include <string>
 #include <vector>
-
-#include <gtest/gtest.h>
 
 #include "host/parser/pr_logical.h"
 
@@ -20,10 +19,18 @@ inline std::string num(double v) {
     auto r = std::to_chars(buf, buf + sizeof buf, v);
     return std::string(buf, r.ptr);
 }
-inline std::string b(bool v) { return v ? "true" : "false"; }
-inline std::string s(const char* t) { return t ? t : "null"; }
-inline std::string p(const double* v) { return v ? ">" + num(*v) : "null"; }
-inline std::string prio(int v) { return v == PR_NO_PRIORITY ? "NONE" : std::to_string(v); }
+inline std::string b(bool v) {
+    return v ? "true" : "false";
+}
+inline std::string s(const char* t) {
+    return t ? t : "null";
+}
+inline std::string p(const double* v) {
+    return v ? ">" + num(*v) : "null";
+}
+inline std::string prio(int v) {
+    return v == PR_NO_PRIORITY ? "NONE" : std::to_string(v);
+}
 inline std::string list(const std::vector<const char*>& v) {
     std::string out = "(";
     for (std::size_t i = 0; i < v.size(); ++i) out += (i ? "," : "") + s(v[i]);
@@ -35,13 +42,13 @@ inline std::string list(const char* const* b, const char* const* e) {
 
 // Writes `text` to a fresh file that is removed again at the end of the scope.
 class TempFile {
-public:
+  public:
     explicit TempFile(const std::string& text) {
         static int counter = 0;
-        path_ = (std::filesystem::temp_directory_path() /
-                 ("lun_parser_" + std::to_string(::getpid()) + "_" + std::to_string(counter++) +
-                  ".ucf"))
-                    .string();
+        path_ =
+            (std::filesystem::temp_directory_path() / ("lun_parser_" + std::to_string(::getpid()) +
+                                                       "_" + std::to_string(counter++) + ".ucf"))
+                .string();
         std::ofstream(path_, std::ios::binary) << text;
     }
     ~TempFile() { std::filesystem::remove(path_); }
@@ -49,7 +56,7 @@ public:
     TempFile& operator=(const TempFile&) = delete;
     const char* path() const { return path_.c_str(); }
 
-private:
+  private:
     std::string path_;
 };
 
@@ -61,7 +68,7 @@ struct Call {
 
 // Records every callback; returns `answer` from each.
 class Recorder : public Pr_Logical_Parser {
-public:
+  public:
     explicit Recorder(const char* file) : Pr_Logical_Parser(file) {}
 
     std::vector<Call> calls;
@@ -76,35 +83,37 @@ public:
     static std::string record(const Pr_Logical_Constraint* c) {
         std::string out = "(" + s(c->get_name()) + "," + std::to_string(c->get_type());
         switch (c->get_type()) {
-        case Pr_Logical_Constraint::STRING:
-            out += "," + s(dynamic_cast<const Pr_Logical_StringConstraint*>(c)->get_value());
-            break;
-        case Pr_Logical_Constraint::STRING_LIST_TYPE: {
-            auto* l = dynamic_cast<const Pr_Logical_StringListConstraint*>(c);
-            out += "," + list(l->begin_value(), l->end_value());
-            break;
-        }
-        case Pr_Logical_Constraint::INIT_: {
-            auto* i = dynamic_cast<const Pr_Logical_InitRangeConstraint*>(c);
-            out += "," + list(i->begin_name(), i->end_name()) + "," + s(i->get_constraint_value());
-            break;
-        }
-        case Pr_Logical_Constraint::OFFSET: {
-            auto* o = dynamic_cast<const Pr_Logical_OffsetConstraint*>(c);
-            out += "," + b(o->isin()) + "," + num(o->gettime()) + "," + p(o->get_valid_field()) +
-                   "," + b(o->isbefore()) + "," + s(o->getname()) + "," + s(o->gettgname()) +
-                   "," + b(o->has_high_low()) + "," + s(o->get_high_or_low());
-            break;
-        }
-        case Pr_Logical_Constraint::PERIOD: {
-            auto* q = dynamic_cast<const Pr_Logical_PeriodConstraint*>(c);
-            out += "," + num(q->getperiod()) + "," + b(q->gethigh()) + "," +
-                   num(q->gethightime()) + "," + num(q->gethighpercent()) + "," +
-                   p(q->get_input_jitter());
-            break;
-        }
-        default:
-            break;
+            case Pr_Logical_Constraint::STRING:
+                out += "," + s(dynamic_cast<const Pr_Logical_StringConstraint*>(c)->get_value());
+                break;
+            case Pr_Logical_Constraint::STRING_LIST_TYPE: {
+                auto* l = dynamic_cast<const Pr_Logical_StringListConstraint*>(c);
+                out += "," + list(l->begin_value(), l->end_value());
+                break;
+            }
+            case Pr_Logical_Constraint::INIT_: {
+                auto* i = dynamic_cast<const Pr_Logical_InitRangeConstraint*>(c);
+                out +=
+                    "," + list(i->begin_name(), i->end_name()) + "," + s(i->get_constraint_value());
+                break;
+            }
+            case Pr_Logical_Constraint::OFFSET: {
+                auto* o = dynamic_cast<const Pr_Logical_OffsetConstraint*>(c);
+                out += "," + b(o->isin()) + "," + num(o->gettime()) + "," +
+                       p(o->get_valid_field()) + "," + b(o->isbefore()) + "," + s(o->getname()) +
+                       "," + s(o->gettgname()) + "," + b(o->has_high_low()) + "," +
+                       s(o->get_high_or_low());
+                break;
+            }
+            case Pr_Logical_Constraint::PERIOD: {
+                auto* q = dynamic_cast<const Pr_Logical_PeriodConstraint*>(c);
+                out += "," + num(q->getperiod()) + "," + b(q->gethigh()) + "," +
+                       num(q->gethightime()) + "," + num(q->gethighpercent()) + "," +
+                       p(q->get_input_jitter());
+                break;
+            }
+            default:
+                break;
         }
         return out + ")";
     }
@@ -123,15 +132,15 @@ public:
     }
 
     bool cb_error(int line, int column, const char* value) override {
-        calls.push_back({"error(" + std::to_string(line) + "," + std::to_string(column) + "," +
-                             s(value) + ")",
-                         line, ""});
+        calls.push_back(
+            {"error(" + std::to_string(line) + "," + std::to_string(column) + "," + s(value) + ")",
+             line, ""});
         return answer;
     }
     bool cb_syntax_error(int line, int column, const char* text, const Handle* h) override {
-        return add("syntax(" + std::to_string(line) + "," + std::to_string(column) + "," + s(text) +
-                       ")",
-                   h);
+        return add(
+            "syntax(" + std::to_string(line) + "," + std::to_string(column) + "," + s(text) + ")",
+            h);
     }
     bool cb_comment(const char* text, const Handle* h) override {
         return add("comment(" + s(text) + ")", h);
@@ -143,7 +152,9 @@ public:
         return add("areagroup(" + defn(d) + ")", h);
     }
     bool cb_net(const Defn& d, const Handle* h) override { return add("net(" + defn(d) + ")", h); }
-    bool cb_comp(const Defn& d, const Handle* h) override { return add("comp(" + defn(d) + ")", h); }
+    bool cb_comp(const Defn& d, const Handle* h) override {
+        return add("comp(" + defn(d) + ")", h);
+    }
     bool cb_pin(const Defn& d, const Handle* h) override { return add("pin(" + defn(d) + ")", h); }
     bool cb_model(const Defn& d, const Handle* h) override {
         return add("model(" + defn(d) + ")", h);
@@ -189,8 +200,7 @@ public:
     }
     bool cb_tspec_maxdelay(const char* name, bool from, bool to,
                            const std::vector<const char*>& points, const char* ref, bool mul,
-                           double value, bool is_time, int pr, bool dpo,
-                           const Handle* h) override {
+                           double value, bool is_time, int pr, bool dpo, const Handle* h) override {
         return add("maxdelay(" + s(name) + "," + b(from) + "," + b(to) + "," + list(points) + "," +
                        s(ref) + "," + b(mul) + "," + num(value) + "," + b(is_time) + "," +
                        prio(pr) + "," + b(dpo) + ")",
@@ -202,8 +212,8 @@ public:
                          const Handle* h) override {
         return add("period(" + s(name) + "," + s(group) + "," + s(ref) + "," + b(mul) + "," +
                        num(value) + "," + b(is_time) + "," + b(phase_plus) + "," + num(phase) +
-                       "," + b(low) + "," + num(duration) + "," + num(percent) + "," +
-                       p(jitter) + "," + prio(pr) + ")",
+                       "," + b(low) + "," + num(duration) + "," + num(percent) + "," + p(jitter) +
+                       "," + prio(pr) + ")",
                    h);
     }
     bool cb_tspec_tig(const char* name, bool from, bool to, const std::vector<const char*>& points,
@@ -229,7 +239,9 @@ public:
     bool cb_temperature(double c, const Handle* h) override {
         return add("temperature(" + num(c) + ")", h);
     }
-    bool cb_voltage(double v, const Handle* h) override { return add("voltage(" + num(v) + ")", h); }
+    bool cb_voltage(double v, const Handle* h) override {
+        return add("voltage(" + num(v) + ")", h);
+    }
     bool cb_default(const Handle* h) override { return add("default()", h); }
 };
 
