@@ -58,12 +58,20 @@ TEST(ParserFile, CopyAndLoadRebindTheFile) {
     EXPECT_TRUE(r.dump());
 }
 
-TEST(ParserFile, CallbackFalseFailsTheParseButReadingGoesOn) {
+TEST(ParserFile, ResultComesFromCallbacksAndSyntaxErrors) {
     TempFile file("NET a;\nNET b;\n");
     Recorder r(file.path());
     r.answer = false;
     EXPECT_FALSE(r.parse());
     EXPECT_EQ(r.calls.size(), 2u);
+
+    // An unreadable value fails the parse only through cb_error's answer; a syntax error
+    // always does.
+    bool ok = false;
+    EXPECT_EQ(parse_text("NET a MAXDELAY = fast;\n", &ok).size(), 1u);
+    EXPECT_TRUE(ok);
+    parse_text("NET a LOC = ;\n", &ok);
+    EXPECT_FALSE(ok);
 }
 
 TEST(ParserLexical, CommentsBetweenAndInsideStatements) {
