@@ -92,6 +92,7 @@ public:
     bool dup_exact[3] = {false, false, false};   // some name occurs twice
     bool dup_folded[3] = {false, false, false};  // some name occurs twice ignoring case
     uint32_t max_len[3] = {0, 0, 0};             // longest member name
+    std::vector<uint32_t> block_lengths;         // distinct child block name lengths, ascending
     std::unique_ptr<std::vector<void*>> sorted[3][2];  // [category][fold]
 
     static const char* NameOf(int category, const void* member) {
@@ -108,6 +109,11 @@ public:
             dup_folded[category] = true;
         size_t len = std::strlen(name);
         if (len > max_len[category]) max_len[category] = static_cast<uint32_t>(len);
+        if (category == kBlocks) {
+            auto at = std::lower_bound(block_lengths.begin(), block_lengths.end(), len);
+            if (at == block_lengths.end() || *at != len)
+                block_lengths.insert(at, static_cast<uint32_t>(len));
+        }
         // A new member is last in stored order: it goes after the equal names.
         for (int fold = 0; fold < 2; ++fold) {
             std::vector<void*>* list = sorted[category][fold].get();
@@ -142,6 +148,7 @@ public:
         built[category] = false;
         dup_exact[category] = dup_folded[category] = false;
         max_len[category] = 0;
+        if (category == kBlocks) block_lengths.clear();
         sorted[category][0].reset();
         sorted[category][1].reset();
     }
@@ -330,7 +337,7 @@ void Ndm_Block::GetBlocksByName(std::string_view name, bool ignore_case,
     Ndm_Design* design = view_->GetDesign();
     Ndm_MemberIndex& idx = Index();
     if (!idx.built[kBlocks]) idx.Build(design, kBlocks, blocks_);
-    if (name.size() > idx.max_len[kBlocks]) return;
+    if (!std::binary_search(idx.block_lengths.begin(), idx.block_lengths.end(), name.size())) return;
     std::string folded;
     if (ignore_case) {
         folded.assign(name);
@@ -388,6 +395,19 @@ void Ndm_Block::GetBlocksByPrefix(std::string_view prefix, bool ignore_case,
 void Ndm_Block::GetSignalsByPrefix(std::string_view prefix, bool ignore_case,
                                    std::vector<Ndm_Signal*>& out) const {
     ByPrefix(signals_, kSignals, prefix, ignore_case, out);
+}
+
+void Ndm_Block::GetBlockNameLengths(std::vector<uint32_t>& out) const {
+    if (blocks_.size() <= kSmall) {
+        const size_t start = out.size();
+        for (const Ndm_Block* b : blocks_) out.push_back(static_cast<uint32_t>(std::strlen(b->name_)));
+        std::sort(out.begin() + static_cast<std::ptrdiff_t>(start), out.end());
+        out.erase(std::unique(out.begin() + static_cast<std::ptrdiff_t>(start), out.end()), out.end());
+        return;
+    }
+    Ndm_MemberIndex& idx = Index();
+    if (!idx.built[kBlocks]) idx.Build(view_->GetDesign(), kBlocks, blocks_);
+    out.insert(out.end(), idx.block_lengths.begin(), idx.block_lengths.end());
 }
 
 size_t Ndm_Block::GetMaxBlockNameLength() const {

@@ -147,6 +147,8 @@ public:
                             std::vector<Ndm_Signal*>& out) const;
     // Length of the longest child block name (0 without children).
     size_t GetMaxBlockNameLength() const;
+    // Appends the distinct lengths of the child block names, ascending.
+    void GetBlockNameLengths(std::vector<uint32_t>& out) const;
 
     ~Ndm_Block();
 
