@@ -67,8 +67,18 @@ bool Ta_LunMgr::cb_config(const char* name, const char* value, const Pr_Logical_
             constraint_filename, first ? first : "NONE", value, constraint_filename);
     }
     if (UT_STR::INCompare(name, "INTERNAL_VREF_BANK", 18) == 0) {
-        // Bank reference voltages go straight onto the block; a repeated one replaces the first.
-        block->DeleteProperty(name);
+        // Bank reference voltages go straight onto the block; a repeated one replaces the first,
+        // whatever the letter case it was written in.
+        for (bool again = true; again;) {
+            again = false;
+            for (Ndm_Property* p : block->GetPropertyItr()) {
+                if (UT_STR::ICompare(p->GetName(), name) == 0) {
+                    block->DeleteProperty(p);
+                    again = true;
+                    break;
+                }
+            }
+        }
         block->CreatePropertyString(name, value);
         return true;
     }

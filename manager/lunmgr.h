@@ -5,6 +5,8 @@
 // that match nothing through the unmatched-object policy.
 #pragma once
 
+#include <string>
+#include <utility>
 #include <vector>
 
 #include "frame/lunbase.h"
@@ -37,6 +39,34 @@ public:
     bool cb_config(const char* name, const char* value, const Pr_Logical_ConstraintHandle* handle) override;
     bool cb_begin_model(const char* name, const Pr_Logical_ConstraintHandle* handle) override;
     bool cb_end_model(const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_enable(bool enable, const char* name, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_areagroup(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_set(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_prohibit(const std::vector<const char*>& names, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_vref(const std::vector<const char*>& names, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_offset(bool in, double time, const double* valid, bool before, const char* clock,
+                   const char* level, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_toffset(const char* group, bool in, double time, const double* valid, bool before,
+                    const char* clock, const char* level, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_roffset(bool in, double time, const double* valid, bool before, const char* clock,
+                    const char* regs, const char* level, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_troffset(const char* group, bool in, double time, const double* valid, bool before,
+                     const char* clock, const char* regs, const char* level,
+                     const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_tspec_maxdelay(const char* name, bool has_from, bool has_to, const std::vector<const char*>& points,
+                           const char* reference, bool multiply, double value, bool is_time, int priority,
+                           bool datapathonly, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_tspec_period(const char* name, const char* group, const char* reference, bool multiply,
+                         double value, bool is_time, bool phase_plus, double phase, bool low, double duration,
+                         double percent, const double* jitter, int priority,
+                         const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_tspec_tig(const char* name, bool has_from, bool has_to, const std::vector<const char*>& points,
+                      int priority, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_tspec_drop_spec(const char* name, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_timegrp(const char* group, const std::vector<std::pair<const char*, PR_EDGE>>& members,
+                    const std::vector<const char*>& excluded, const Pr_Logical_ConstraintHandle* handle) override;
+    bool cb_timegrp_areagroup(const char* group, const char* areagroup,
+                              const Pr_Logical_ConstraintHandle* handle) override;
     bool cb_temperature(double celsius, const Pr_Logical_ConstraintHandle* handle) override;
     bool cb_voltage(double volts, const Pr_Logical_ConstraintHandle* handle) override;
 
@@ -78,6 +108,12 @@ protected:
     // Rewrites the last bus subscript of name to the next delimiter style; false when there
     // is none or every style was tried.
     bool change_bus_delimiters(char* name);
+
+    // Writes the trace line of a statement when tracing is on.
+    void Trace(const char* format, const Pr_Logical_ConstraintHandle* handle) const;
+    // Records one global or group offset entry, reporting a second entry of a generated name.
+    void RecordOffset(const char* entry, const std::string& value, bool generated, bool with_line,
+                      const Pr_Logical_ConstraintHandle* handle);
 
     // Which statement the unmatched-object policy is applied to.
     enum class ObjectKind { Inst, Net, Pin };
