@@ -35,6 +35,7 @@ int QuillmapMain(int argc, char** argv) {
 
     QuillmapAction run;
     AddAnnotateCommand(app, run, options);
+    AddPartCommand(app, run, options);
     AddDesignCommands(app, run);
     AddExtractCommand(app, run);
 

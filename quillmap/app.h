@@ -27,5 +27,6 @@ using QuillmapAction = std::function<int()>;
 void AddDesignCommands(CLI::App& app, QuillmapAction& run);
 void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
 void AddExtractCommand(CLI::App& app, QuillmapAction& run);
+void AddPartCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
 
 int QuillmapMain(int argc, char** argv);
