@@ -1,0 +1,102 @@
+// The quillmap command line: exit statuses, messages on bad input, output files.
+#include <gtest/gtest.h>
+
+#include "host/port/file.h"
+#include "support/test_support.h"
+
+namespace {
+
+using lun_test::RunCommand;
+
+const std::string kExe = QUILLMAP_EXE;
+const std::string kExample = std::string(LUN_SOURCE_DIR) + "/examples/blinky/";
+
+int Quillmap(const std::string& args, std::string* out = nullptr, std::string* err = nullptr) {
+    return RunCommand(kExe + " " + args, out, err);
+}
+
+TEST(Cli, UsageAndVersion) {
+    std::string out, err;
+    EXPECT_EQ(Quillmap("--version", &out), 0);
+    EXPECT_EQ(out.rfind("quillmap ", 0), 0u);
+    EXPECT_EQ(Quillmap("", &out, &err), 2);  // a subcommand is required
+    EXPECT_EQ(Quillmap("annotate --no-such-option x", &out, &err), 2);
+    EXPECT_EQ(Quillmap("annotate --help", &out), 0);
+    EXPECT_NE(out.find("--allow-unmatched-locs"), std::string::npos);
+}
+
+TEST(Cli, AnnotateExampleStatusFollowsMessages) {
+    lun_test::ScratchDir dir;
+    std::string out, err;
+    std::string saved = dir.path() + "/b.qdf";
+    EXPECT_EQ(Quillmap("annotate " + kExample + "blinky.json --ucf " + kExample + "blinky.ucf -o " + saved, &out, &err),
+              1);
+    EXPECT_NE(err.find("Could not find net(s) 'dbg_probe' in the design."), std::string::npos) << err;
+    EXPECT_TRUE(Port::File::exist(saved.c_str()));  // the design is saved despite errors
+    EXPECT_EQ(Quillmap("annotate " + kExample + "blinky.json --aul --ucf " + kExample + "blinky.ucf", &out, &err), 0)
+        << err;
+    EXPECT_NE(err.find("'dbg_probe' in the design.  Since the -aul switch is set"), std::string::npos) << err;
+
+    // the saved design can be dumped and extracted
+    EXPECT_EQ(Quillmap("dump " + saved, &out, &err), 0);
+    EXPECT_NE(out.find("\"TNM\" string \"cnt_regs\""), std::string::npos);
+    EXPECT_EQ(Quillmap("extract " + saved, &out, &err), 0) << err;
+    EXPECT_NE(out.find("TIMESPEC TS_clk = PERIOD \"clk_grp\" 20000.000000 pS HIGH 50.000000 % ;"), std::string::npos)
+        << out;
+}
+
+TEST(Cli, JsonLinesMessages) {
+    lun_test::ScratchDir dir;
+    std::string ucf = dir.Write("x.ucf", "NET nosuch LOC = P1;\n");
+    std::string out, err;
+    EXPECT_EQ(Quillmap("--messages jsonl annotate " + kExample + "blinky.json --ucf " + ucf, &out, &err), 1);
+    EXPECT_EQ(err,
+              "{\"severity\":\"error\",\"program\":\"Quillmap\",\"module\":\"lunmgr\",\"text\":\"Line 1 in '" + ucf +
+                  "': Could not find net(s) 'nosuch' in the design.  To suppress this error use the -aul switch, "
+                  "specify the correct net name or remove the constraint.\\n\"}\n");
+}
+
+TEST(Cli, BadInputNamesTheFile) {
+    lun_test::ScratchDir dir;
+    struct Case {
+        std::string args;
+        int status;
+        std::vector<std::string> words;  // each must appear in stderr
+    } cases[] = {
+        {"dump " + dir.path() + "/missing.json", 1, {"missing.json"}},
+        {"dump " + dir.Write("text.json", "{ \"modules\": [1, 2,"), 1, {"text.json"}},
+        {"dump " + dir.Write("plain.json", "this is not json"), 1, {"plain.json"}},
+        {"dump " + dir.Write("other.json", "{\"creator\": \"me\"}"), 1, {"other.json"}},
+        {"dump " + kExample + "blinky.json --top nosuch", 1, {"nosuch"}},
+        {"annotate " + kExample + "blinky.json --ucf " + dir.path() + "/none.ucf", 1, {"none.ucf"}},
+        {"annotate " + kExample + "blinky.json --filter " + dir.Write("bad.pfd", "LOC strng net\n") + " --ucf " +
+             kExample + "blinky.ucf",
+         1,
+         {"bad.pfd", "line 1", "strng"}},
+    };
+    for (const Case& c : cases) {
+        std::string out, err;
+        EXPECT_EQ(Quillmap(c.args, &out, &err), c.status) << c.args << "\n" << err;
+        for (const std::string& word : c.words) EXPECT_NE(err.find(word), std::string::npos) << c.args << "\n" << err;
+    }
+}
+
+TEST(Cli, FatalLeavesNoOutputBehind) {
+    lun_test::ScratchDir dir;
+    std::string ncf = dir.Write("two.ncf", "CONFIG PART = a;\nCONFIG PART = b;\n");
+    std::string saved = dir.path() + "/out.qdf";
+    std::string out, err;
+    EXPECT_EQ(Quillmap("annotate " + kExample + "blinky.json --ncf " + ncf + " -o " + saved, &out, &err), 2);
+    EXPECT_NE(err.find("Second \"CONFIG PART\" statement found"), std::string::npos) << err;
+    EXPECT_FALSE(Port::File::exist(saved.c_str()));
+}
+
+TEST(Cli, PartReadsWithoutNetlist) {
+    lun_test::ScratchDir dir;
+    std::string ucf = dir.Write("p.ucf", "CONFIG PART = qx100-fg256-2;\nCONFIG STEPPING = ES;\nNET x LOC = P1;\n");
+    std::string out, err;
+    EXPECT_EQ(Quillmap("part " + ucf, &out, &err), 0) << err;
+    EXPECT_EQ(out, "PART = qx100-fg256-2\nSTEPPING = ES\n");
+}
+
+}  // namespace
