@@ -438,6 +438,7 @@ void Ndm_Network::AddSignal(Ndm_Signal* signal) {
         top_ = signal;
         top_depth_ = depth;
         name_ = view_->GetDesign()->Intern(signal->GetFullName());
+        view_->DropNetworkIndex();
     }
 }
 
@@ -453,6 +454,7 @@ void Ndm_Network::Remove(Ndm_Signal* signal) {
     signal->network_ = nullptr;
     signal->next_in_network_ = nullptr;
     if (top_ != signal) return;
+    view_->DropNetworkIndex();
     top_ = nullptr;
     name_ = "";
     for (Ndm_Signal* s = first_; s; s = s->next_in_network_) {
@@ -480,8 +482,33 @@ Ndm_Block* Ndm_View::CreateTopBlock(const char* name) {
 
 Ndm_Network* Ndm_View::CreateNetwork() {
     Ndm_Network* net = &design_->network_pool_.emplace_back(Ndm_Token(), this);
+    net->order_ = networks_.empty() ? 0 : networks_.back()->order_ + 1;
     networks_.push_back(net);
+    DropNetworkIndex();
     return net;
+}
+
+void Ndm_View::GetNetworksByPrefix(std::string_view prefix, bool ignore_case,
+                                   std::vector<Ndm_Network*>& out) const {
+    if (prefix.empty()) {
+        out.insert(out.end(), networks_.begin(), networks_.end());
+        return;
+    }
+    std::unique_ptr<std::vector<Ndm_Network*>>& list = by_name_[ignore_case ? 1 : 0];
+    if (!list) {
+        list = std::make_unique<std::vector<Ndm_Network*>>(networks_);
+        std::stable_sort(list->begin(), list->end(), [&](const Ndm_Network* a, const Ndm_Network* b) {
+            return CompareName(a->name_, b->name_, ignore_case) < 0;
+        });
+    }
+    auto at = std::lower_bound(list->begin(), list->end(), prefix,
+                               [&](const Ndm_Network* net, std::string_view key) {
+                                   return CompareName(net->name_, key, ignore_case) < 0;
+                               });
+    const size_t start = out.size();
+    for (; at != list->end() && HasPrefix((*at)->name_, prefix, ignore_case); ++at) out.push_back(*at);
+    std::sort(out.begin() + static_cast<std::ptrdiff_t>(start), out.end(),
+              [](const Ndm_Network* a, const Ndm_Network* b) { return a->order_ < b->order_; });
 }
 
 Ndm_Design::Ndm_Design(const char* name)

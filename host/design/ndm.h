@@ -195,6 +195,7 @@ private:
     friend class Ndm_Block;
     void Remove(Ndm_Signal* signal);
 
+    uint32_t order_ = 0;  // network-order key; fits in the base's tail padding
     Ndm_View* view_;
     const char* name_ = "";
     Ndm_Signal* top_ = nullptr;
@@ -219,16 +220,25 @@ public:
     int GetNumNetworks() const { return static_cast<int>(networks_.size()); }
     // A new, empty network.
     Ndm_Network* CreateNetwork();
+    // Appends the networks whose name starts with prefix (exactly, or ignoring ASCII case), in
+    // network order. A name-sorted list is made on first use and dropped when networks change.
+    void GetNetworksByPrefix(std::string_view prefix, bool ignore_case,
+                             std::vector<Ndm_Network*>& out) const;
 
 private:
     friend class Ndm_Design;
     friend class Ndm_Block;
     friend class Ndm_Network;
+    void DropNetworkIndex() {
+        by_name_[0].reset();
+        by_name_[1].reset();
+    }
 
     const char* name_;
     Ndm_Design* design_;
     Ndm_Block* top_ = nullptr;
     std::vector<Ndm_Network*> networks_;
+    mutable std::unique_ptr<std::vector<Ndm_Network*>> by_name_[2];  // [ignore case]
 };
 
 class Ndm_Design : public Ndm_PropertyHolder {
