@@ -2,6 +2,7 @@
 // then writing and reading it as a native design file. Reports time, peak memory and memory
 // per database object. LUN_BENCH_CELLS overrides the cell count.
 #include <benchmark/benchmark.h>
+#include <malloc.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -35,6 +36,13 @@ int64_t StatusKb(const char* field) {
         if (std::strncmp(line, field, len) == 0 && line[len] == ':') kb = std::atoll(line + len + 1);
     std::fclose(f);
     return kb;
+}
+
+// Bytes the heap has handed out and not taken back (the design's own memory, unlike the
+// resident size, which keeps pages the allocator holds for reuse).
+int64_t HeapInUse() {
+    struct mallinfo2 info = mallinfo2();
+    return static_cast<int64_t>(info.uordblks + info.hblkhd);
 }
 
 // Restarts the peak resident size count (VmHWM) from the current size.
@@ -215,23 +223,25 @@ size_t Objects(const Ndm_Design& design) {
     return s.blocks + s.signals + s.pins + s.networks;
 }
 
-// Load time, growth of the resident size per object and the peak while loading.
-void Report(benchmark::State& state, const char* what, const Ndm_Design& design, int64_t rss_before,
+// Load time, heap held by the design per object, and the peak resident size while loading.
+void Report(benchmark::State& state, const char* what, const Ndm_Design& design, int64_t heap_before,
             double seconds) {
-    int64_t rss_after = StatusKb("VmRSS");
+    int64_t heap = HeapInUse() - heap_before;
     int64_t peak = StatusKb("VmHWM");
     Ndm_Design::Stats s = design.GetStats();
     size_t objects = Objects(design);
-    double per_object = objects ? 1024.0 * static_cast<double>(rss_after - rss_before) / objects : 0;
+    double per_object = objects ? static_cast<double>(heap) / static_cast<double>(objects) : 0;
+    double names = static_cast<double>(s.name_bytes);
     state.counters["objects"] = static_cast<double>(objects);
     state.counters["bytes_per_object"] = per_object;
+    state.counters["bytes_per_object_without_names"] = objects ? (static_cast<double>(heap) - names) / objects : 0;
     state.counters["peak_MB"] = static_cast<double>(peak) / 1024.0;
-    state.counters["design_MB"] = static_cast<double>(rss_after - rss_before) / 1024.0;
+    state.counters["design_MB"] = static_cast<double>(heap) / (1 << 20);
     std::printf("%s: %.2f s; %zu blocks, %zu signals, %zu pins, %zu networks; design %.0f MB "
-                "(%.0f bytes per object, names %.0f MB); peak resident %.0f MB\n",
-                what, seconds, s.blocks, s.signals, s.pins, s.networks,
-                static_cast<double>(rss_after - rss_before) / 1024.0, per_object,
-                static_cast<double>(s.name_bytes) / (1 << 20), static_cast<double>(peak) / 1024.0);
+                "(%.0f bytes per object, %.0f without the %.0f MB of names); peak resident %.0f MB\n",
+                what, seconds, s.blocks, s.signals, s.pins, s.networks, static_cast<double>(heap) / (1 << 20),
+                per_object, objects ? (static_cast<double>(heap) - names) / objects : 0, names / (1 << 20),
+                static_cast<double>(peak) / 1024.0);
 }
 
 double Seconds(const std::chrono::steady_clock::time_point& start) {
@@ -248,7 +258,7 @@ void BM_LoadYosysJson(benchmark::State& state) {
     for (auto _ : state) {
         state.PauseTiming();
         shared.design.reset();
-        int64_t rss_before = StatusKb("VmRSS");
+        int64_t heap_before = HeapInUse();
         ResetPeak();
         auto start = std::chrono::steady_clock::now();
         state.ResumeTiming();
@@ -258,7 +268,7 @@ void BM_LoadYosysJson(benchmark::State& state) {
             state.SkipWithError("the netlist did not load");
             break;
         }
-        Report(state, "Yosys JSON load", *shared.design, rss_before, Seconds(start));
+        Report(state, "Yosys JSON load", *shared.design, heap_before, Seconds(start));
         state.ResumeTiming();
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * shared.netlist->bytes()));
@@ -291,7 +301,7 @@ void BM_ReadNative(benchmark::State& state) {
     shared.design.reset();
     for (auto _ : state) {
         state.PauseTiming();
-        int64_t rss_before = StatusKb("VmRSS");
+        int64_t heap_before = HeapInUse();
         ResetPeak();
         auto start = std::chrono::steady_clock::now();
         state.ResumeTiming();
@@ -301,7 +311,7 @@ void BM_ReadNative(benchmark::State& state) {
             state.SkipWithError("the native file did not load");
             break;
         }
-        Report(state, "native read", *design, rss_before, Seconds(start));
+        Report(state, "native read", *design, heap_before, Seconds(start));
         design.reset();
         state.ResumeTiming();
     }

@@ -71,6 +71,7 @@ struct Module {
     const char* name = "";
     size_t offset = 0;  // byte offset of the module in the file, for messages
     bool top_attr = false;
+    bool box = false;  // a blackbox or whitebox library cell: its instances stay leaves
     std::vector<Port> ports;
     std::vector<Net> nets;
     std::vector<Cell> cells;
@@ -82,6 +83,7 @@ struct Module {
     std::vector<uint32_t> net_first_signal;  // per netname: index of its first signal
     std::vector<int32_t> signal_bit;         // per signal: local bit id, or -1 for a constant
     std::vector<int32_t> bit_signal;         // per local bit id: first signal carrying it, or -1
+    std::vector<uint32_t> signal_order;      // signals in the order they join networks
     Ndm_PtrMap port_index;                   // port name -> index + 1
     int state = 0;                           // for the instantiation cycle check
     bool instantiated = false;
@@ -164,6 +166,7 @@ private:
 
     // ---- building ----
     bool ResolveTypes();
+    void BoxDirections(Module& m, const Cell& cell, Module& box);
     bool ChooseTop(const char* top_module, uint32_t& top);
     bool CheckCycles(uint32_t module, std::vector<uint32_t>& stack);
     const Port* FindPort(Module& m, const char* name);
@@ -174,6 +177,7 @@ private:
     bool Expand(Ndm_Block* block, uint32_t module, uint32_t base);
     void TopPins(Ndm_Block* block, uint32_t module);
     void Networks(Ndm_View* view);
+    void SignalOrder(Module& m);
 
     const char* path_;
     Ndm_Design& design_;
@@ -337,19 +341,23 @@ bool Reader::ParseAttributes(od::value value, Module& m) {
     for (auto item : object) {
         od::field field;
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad attribute" + InModule());
-        if (field.key() != "top") continue;
+        od::raw_json_string key = field.key();
+        bool* flag = key == "top" ? &m.top_attr
+                   : key == "blackbox" || key == "whitebox" || key == "lib_whitebox" ? &m.box
+                                                                                      : nullptr;
+        if (!flag) continue;
         od::json_type type;
         if (error_code e = field.value().type().get(type)) return JsonError(e, "bad attribute" + InModule());
         if (type == od::json_type::number) {
             int64_t n;
-            if (!Int(field.value(), n, [&] { return "attribute \"top\"" + InModule(); })) return false;
-            m.top_attr = n != 0;
+            if (!Int(field.value(), n, [&] { return "attribute value" + InModule(); })) return false;
+            *flag = n != 0;
         } else if (type == od::json_type::string) {
             // Yosys writes constant attribute values as binary digit strings.
             std::string_view text;
-            if (!String(field.value(), text, "attribute \"top\"")) return false;
-            m.top_attr = text.find_first_not_of("01") == std::string_view::npos &&
-                         text.find('1') != std::string_view::npos;
+            if (!String(field.value(), text, "attribute value")) return false;
+            *flag = text.find_first_not_of("01") == std::string_view::npos &&
+                    text.find('1') != std::string_view::npos;
         }
     }
     return true;
@@ -567,12 +575,25 @@ bool Reader::ResolveTypes() {
     for (Module& m : modules_) {
         for (Cell& cell : m.cells) {
             if (void* v = module_index_.Find(cell.type)) {
-                cell.sub = static_cast<int32_t>(FromValue(v));
-                modules_[cell.sub].instantiated = true;
+                Module& sub = modules_[FromValue(v)];
+                sub.instantiated = true;
+                if (!sub.box)
+                    cell.sub = static_cast<int32_t>(FromValue(v));
+                else
+                    BoxDirections(m, cell, sub);
             }
         }
     }
     return true;
+}
+
+// Connections of a library cell without port_directions take them from its module.
+void Reader::BoxDirections(Module& m, const Cell& cell, Module& box) {
+    for (uint32_t k = 0; k < cell.num_conns; ++k) {
+        Conn& conn = m.conns[cell.first_conn + k];
+        if (conn.dir != Ndm_Dir::None) continue;
+        if (const Port* port = FindPort(box, conn.name)) conn.dir = port->dir;
+    }
 }
 
 std::string NameList(const std::vector<const char*>& names) {
@@ -602,7 +623,7 @@ bool Reader::ChooseTop(const char* top_module, uint32_t& top) {
             marked.push_back(modules_[i].name);
             marked_index = i;
         }
-        if (!modules_[i].instantiated) {
+        if (!modules_[i].instantiated && !modules_[i].box) {
             free.push_back(modules_[i].name);
             free_index = i;
         }
@@ -780,23 +801,11 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
 void Reader::Networks(Ndm_View* view) {
     constexpr uint32_t kNone = UINT32_MAX;
     std::vector<uint32_t> network_of_root(parent_.size(), kNone);
-    std::vector<uint32_t> order;
     for (const Instance& inst : instances_) {
         Module& m = modules_[inst.module];
+        if (m.signal_order.size() != m.num_signals) SignalOrder(m);
         std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
-        order.clear();
-        Ndm_PtrMap ports;
-        for (const Port& port : m.ports) ports.InsertIfAbsent(port.name, const_cast<char*>(port.name));
-        for (int rank = 0; rank < 3; ++rank) {
-            for (size_t n = 0; n < m.nets.size(); ++n) {
-                const Net& net = m.nets[n];
-                int r = ports.Find(net.name) ? 0 : (net.name[0] == '$' ? 2 : 1);
-                if (r != rank) continue;
-                for (uint32_t i = 0; i < net.bits.count; ++i) order.push_back(m.net_first_signal[n] + i);
-            }
-        }
-        for (uint32_t s : order) {
-            if (s >= signals.size()) continue;
+        for (uint32_t s : m.signal_order) {
             int32_t bit = m.signal_bit[s];
             if (bit < 0) continue;
             uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
@@ -806,6 +815,23 @@ void Reader::Networks(Ndm_View* view) {
                 view->CreateNetwork();
             }
             view->GetNetworkItr()[index]->AddSignal(signals[s]);
+        }
+    }
+}
+
+// Signals of a module in the order they join networks: port names, other public names,
+// generated names, each group in stored order.
+void Reader::SignalOrder(Module& m) {
+    Ndm_PtrMap ports;
+    for (const Port& port : m.ports) ports.InsertIfAbsent(port.name, const_cast<char*>(port.name));
+    m.signal_order.clear();
+    m.signal_order.reserve(m.num_signals);
+    for (int rank = 0; rank < 3; ++rank) {
+        for (size_t n = 0; n < m.nets.size(); ++n) {
+            const Net& net = m.nets[n];
+            int r = ports.Find(net.name) ? 0 : (net.name[0] == '$' ? 2 : 1);
+            if (r != rank) continue;
+            for (uint32_t i = 0; i < net.bits.count; ++i) m.signal_order.push_back(m.net_first_signal[n] + i);
         }
     }
 }

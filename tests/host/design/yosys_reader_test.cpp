@@ -254,6 +254,23 @@ TEST(YosysReader, ChoosesTheTopModule) {
     ASSERT_TRUE(a);
     EXPECT_STREQ(a->GetName(), "a");
 
+    // Library cells (blackbox, whitebox) stay leaves and are never the top.
+    std::string boxes = dir.Write("boxes.json", R"({"modules": {
+      "BB": {"attributes": {"blackbox": "00000000000000000000000000000001"},
+             "ports": {"a": {"direction": "input", "bits": [2]}, "y": {"direction": "output", "bits": [3]}},
+             "netnames": {"a": {"bits": [2]}, "y": {"bits": [3]}}},
+      "LIB": {"attributes": {"whitebox": 1}, "ports": {}},
+      "top": {"cells": {"u": {"type": "BB", "connections": {"a": [5], "y": [6]}}},
+              "netnames": {"n": {"bits": [5]}, "m": {"bits": [6]}}}}})");
+    auto boxed = Ndm_ReadYosysJson(boxes.c_str(), nullptr);
+    ASSERT_TRUE(boxed);
+    EXPECT_STREQ(boxed->GetName(), "top");
+    Ndm_Block* u = boxed->GetViewByName("EXPANDED")->GetBlock()->GetBlockByName("u");
+    EXPECT_EQ(u->GetNumSignals(), 0);
+    EXPECT_EQ(u->GetPinByName("a")->GetDirection(), Ndm_Dir::Input);
+    EXPECT_EQ(u->GetPinByName("y")->GetDirection(), Ndm_Dir::Output);
+    EXPECT_STREQ(u->GetPinByName("y")->GetSignal()->GetName(), "m");
+
     std::string marked = dir.Write("marked.json", R"({"modules": {
       "a": {"attributes": {"top": 1}}, "b": {"attributes": {"top": 1}}}})");
     capture.Clear();
