@@ -179,7 +179,11 @@ void Ta_LunMgr::find_qual_sigs(std::vector<Ndm_Signal*>* results, char* pattern,
                                unsigned char exact_case, const Pr_Logical_ConstraintHandle* handle) {
     if (!results || !pattern || !view) return;
     const bool fold = !exact_case;
-    for (Ndm_Network* net : view->GetNetworkItr()) {
+    // Only networks whose name starts with the literal prefix can match; the view hands them
+    // out in network order.
+    std::vector<Ndm_Network*> nets;
+    view->GetNetworksByPrefix(LiteralPrefix(pattern), fold, nets);
+    for (Ndm_Network* net : nets) {
         const char* name = net->GetName();
         if (!Matches(name, pattern, fold)) continue;
         if (fold) {

@@ -144,6 +144,33 @@ TEST_P(Wildcards, NetworksOncePerMatchInNetworkOrder) {
                           "Line 3 in 't.ucf': Found case insensitive match for NET name 'BUS_?'. NET is 'bus_a'.\n"}));
 }
 
+TEST_P(Wildcards, NetworkNamesFollowRenamesAndNewNetworks) {
+    std::vector<Ndm_Signal*> sigs;
+    Ndm_Signal* inner = u1a->CreateSignal("n");
+    Ndm_Network* net = d.view->CreateNetwork();
+    net->AddSignal(inner);
+    probe.find_qual_sigs(&sigs, Buf("core/u1/u1a/?").data(), 1, &kLine3);
+    EXPECT_EQ(sigs, (std::vector<Ndm_Signal*>{inner}));
+    // A higher signal renames the network; a new network joins in network order.
+    Ndm_Signal* outer = core->CreateSignal("n");
+    net->AddSignal(outer);
+    Ndm_Signal* later = core->CreateSignal("m");
+    Ndm_Network* first = d.view->CreateNetwork();
+    first->AddSignal(later);
+    for (int i = 0; i < GetParam(); ++i) {
+        std::string name = "core" + std::to_string(i);
+        d.view->CreateNetwork()->AddSignal(d.top->CreateSignal(name.c_str()));
+    }
+    sigs.clear();
+    probe.find_qual_sigs(&sigs, Buf("core/u1/u1a/?").data(), 1, &kLine3);
+    EXPECT_TRUE(sigs.empty());
+    probe.find_qual_sigs(&sigs, Buf("core/?").data(), 1, &kLine3);
+    EXPECT_EQ(sigs, (std::vector<Ndm_Signal*>{outer, later}));
+    sigs.clear();
+    probe.find_qual_sigs(&sigs, Buf("CORE/*").data(), 0, &kLine3);
+    EXPECT_EQ(sigs, (std::vector<Ndm_Signal*>{outer, later}));
+}
+
 TEST_P(Wildcards, RamBlocksBySimprimType) {
     u1->CreatePropertyString("SIMPRIMTYPE", "Q_RAMB4_X1");
     u1a->CreatePropertyString("SIMPRIMTYPE", "Q_RAMB4");
