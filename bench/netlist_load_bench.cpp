@@ -45,8 +45,10 @@ int64_t HeapInUse() {
     return static_cast<int64_t>(info.uordblks + info.hblkhd);
 }
 
-// Restarts the peak resident size count (VmHWM) from the current size.
+// Restarts the peak resident size count (VmHWM) from the current size, after handing freed
+// heap memory back so that it does not count.
 void ResetPeak() {
+    malloc_trim(0);
     if (FILE* f = std::fopen("/proc/self/clear_refs", "w")) {
         std::fputs("5", f);
         std::fclose(f);
