@@ -22,7 +22,9 @@ public:
     Probe() : Ta_LunMgr("bench.ucf", CP_UCF, nullptr) {}
     using Ta_LunMgr::find_blk_hier;
     using Ta_LunMgr::find_qual_blocks;
+    using Ta_LunMgr::find_qual_sigs;
     using Ta_LunMgr::find_sig_hier;
+    void SetView(Ndm_View* v) { view = v; }
 };
 
 struct Flat {
@@ -33,7 +35,8 @@ struct Flat {
     std::vector<std::string> sig_paths;  // "u<i>/q" for random i
 };
 
-// One flat design per size: a top block with n children u0..u<n-1>, each with a signal q.
+// One flat design per size: a top block with n children u0..u<n-1>, each with a signal q
+// in a network of its own.
 Flat& Design(int n) {
     static std::map<int, std::unique_ptr<Flat>> designs;
     auto& slot = designs[n];
@@ -41,7 +44,10 @@ Flat& Design(int n) {
     slot = std::make_unique<Flat>();
     Flat& f = *slot;
     f.top->Reserve(static_cast<size_t>(n), 0, 0);
-    for (int i = 0; i < n; ++i) f.top->CreateBlock(("u" + std::to_string(i)).c_str())->CreateSignal("q");
+    for (int i = 0; i < n; ++i) {
+        Ndm_Signal* q = f.top->CreateBlock(("u" + std::to_string(i)).c_str())->CreateSignal("q");
+        f.view->CreateNetwork()->AddSignal(q);
+    }
     std::mt19937 rng(42);
     for (int k = 0; k < 4096; ++k) {
         int i = static_cast<int>(rng() % static_cast<unsigned>(n));
@@ -110,6 +116,24 @@ void BM_PrefixedWildcard(benchmark::State& state, const char* pattern) {
 BENCHMARK_CAPTURE(BM_PrefixedWildcard, u12345_star, "u12345*")->Arg(100000)->Arg(1000000);
 BENCHMARK_CAPTURE(BM_PrefixedWildcard, u9999_q, "u9999?")->Arg(100000)->Arg(1000000);
 BENCHMARK_CAPTURE(BM_PrefixedWildcard, u4242_q_star, "u4242?*")->Arg(100000)->Arg(1000000);
+
+// Networks of the view by name.
+void BM_NetworkWildcard(benchmark::State& state, const char* pattern) {
+    Flat& f = Design(static_cast<int>(state.range(0)));
+    Probe probe;
+    probe.SetView(f.view);
+    std::vector<char> buf(pattern, pattern + std::strlen(pattern) + 1);
+    std::vector<Ndm_Signal*> out;
+    size_t matched = 0;
+    for (auto _ : state) {
+        out.clear();
+        probe.find_qual_sigs(&out, buf.data(), 1, nullptr);
+        matched = out.size();
+    }
+    state.counters["matches"] = static_cast<double>(matched);
+    state.SetItemsProcessed(state.iterations());
+}
+BENCHMARK_CAPTURE(BM_NetworkWildcard, u4242_q_slash_q, "u4242?/q")->Arg(100000)->Arg(1000000);
 
 // A pattern starting with "*" has to look at every instance.
 BENCHMARK_CAPTURE(BM_PrefixedWildcard, star_77777, "*77777")->Arg(100000)->Arg(1000000)
