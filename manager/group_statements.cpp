@@ -6,10 +6,13 @@
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 #include "manager/lunmgr.h"
+#include "manager/statement_messages.h"
+
+using lunmgr::LineOf;
+using lunmgr::Msg;
+using lunmgr::TextOf;
 
 namespace {
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "lunmgr", line, "1.0"); }
-int LineOf(const Pr_Logical_ConstraintHandle* handle) { return handle ? handle->getline() : 0; }
 bool Is(const char* a, const char* b) { return UT_STR::Compare(a, b) == 0; }
 
 std::string Join(const char* const* begin, const char* const* end, const char* separator) {

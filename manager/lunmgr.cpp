@@ -1,6 +1,7 @@
 // Ta_LunMgr: options, the unmatched-line trace, global settings (CONFIG, voltage,
 // temperature), model statements and unreadable values.
 #include "manager/lunmgr.h"
+#include "manager/statement_messages.h"
 
 #include <string>
 
@@ -8,12 +9,9 @@
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 
-namespace {
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "lunmgr", line, "1.0"); }
-
-int LineOf(const Pr_Logical_ConstraintHandle* handle) { return handle ? handle->getline() : 0; }
-const char* TextOf(const Pr_Logical_ConstraintHandle* handle) { return handle ? handle->return_ascii() : ""; }
-}  // namespace
+using lunmgr::LineOf;
+using lunmgr::Msg;
+using lunmgr::TextOf;
 
 Ta_LunMgr::Ta_LunMgr(const char* filename, CP_FILE_TYPE type, const char* filter_file)
     : Ta_LunBase(filename, type, filter_file),
@@ -50,7 +48,7 @@ void Ta_LunMgr::store_unmatched(const Pr_Logical_ConstraintHandle* handle) {
 }
 
 bool Ta_LunMgr::cb_config(const char* name, const char* value, const Pr_Logical_ConstraintHandle* handle) {
-    if (debug_callbacks) Port_MsgManData::debugStub("MGR::config: Line: %I: %s", LineOf(handle), TextOf(handle));
+    Trace("MGR::config: Line: %I: %s", handle);
     if (second_pass) return true;
     bool is_part = UT_STR::ICompare(name, "PART") == 0;
     // A UCF's part is read by the part reader, not here.
@@ -100,7 +98,7 @@ unsigned char Ta_LunMgr::DCI_Cascade_Hack(Ndm_Block* block, const char* value,
 }
 
 bool Ta_LunMgr::cb_voltage(double volts, const Pr_Logical_ConstraintHandle* handle) {
-    if (debug_callbacks) Port_MsgManData::debugStub("MGR::Voltage: Line %I: %s", LineOf(handle), TextOf(handle));
+    Trace("MGR::Voltage: Line %I: %s", handle);
     if (second_pass) return true;
     Ndm_Block* block = GetConstraintBlock("CONFIG");
     char* text = zepform("%0.3fV", volts);
@@ -110,8 +108,7 @@ bool Ta_LunMgr::cb_voltage(double volts, const Pr_Logical_ConstraintHandle* hand
 }
 
 bool Ta_LunMgr::cb_temperature(double celsius, const Pr_Logical_ConstraintHandle* handle) {
-    if (debug_callbacks)
-        Port_MsgManData::debugStub("MGR::temperature: Line %I: %s", LineOf(handle), TextOf(handle));
+    Trace("MGR::temperature: Line %I: %s", handle);
     if (second_pass) return true;
     Ndm_Block* block = GetConstraintBlock("CONFIG");
     char* text = zepform("%0.3fC", celsius);

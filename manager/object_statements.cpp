@@ -8,12 +8,14 @@
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 #include "manager/lunmgr.h"
+#include "manager/statement_messages.h"
+
+using lunmgr::LineOf;
+using lunmgr::Msg;
+using lunmgr::TextOf;
 
 namespace {
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "lunmgr", line, "1.0"); }
 
-int LineOf(const Pr_Logical_ConstraintHandle* handle) { return handle ? handle->getline() : 0; }
-const char* TextOf(const Pr_Logical_ConstraintHandle* handle) { return handle ? handle->return_ascii() : ""; }
 
 bool IsWildcard(const char* name) { return std::strchr(name, '*') || std::strchr(name, '?'); }
 
@@ -78,7 +80,7 @@ bool Ta_LunMgr::ApplyUnmatchedPolicy(ObjectKind kind, const Pr_Logical_Constrain
 }
 
 bool Ta_LunMgr::cb_comp(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) {
-    if (debug_callbacks) Port_MsgManData::debugStub("MGR::comp: Line %I: %s", LineOf(handle), TextOf(handle));
+    Trace("MGR::comp: Line %I: %s", handle);
     if (defn.num_constraints() == 0) return true;
     Ndm_Block* top = view->GetBlock();
     const std::string top_name = top->GetName();
@@ -148,7 +150,7 @@ bool Ta_LunMgr::cb_comp(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_
 }
 
 bool Ta_LunMgr::cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) {
-    if (debug_callbacks) Port_MsgManData::debugStub("MGR::net: Line %I: %s", LineOf(handle), TextOf(handle));
+    Trace("MGR::net: Line %I: %s", handle);
     if (defn.num_constraints() == 0) return true;
     Ndm_Block* top = view->GetBlock();
     std::vector<char> working = Buffer(defn.get_object_name());
@@ -201,7 +203,7 @@ bool Ta_LunMgr::cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
 }
 
 bool Ta_LunMgr::cb_pin(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) {
-    if (debug_callbacks) Port_MsgManData::debugStub("MGR::pin: Line %I: %s", LineOf(handle), TextOf(handle));
+    Trace("MGR::pin: Line %I: %s", handle);
     if (defn.num_constraints() == 0) return true;
     Ndm_Block* top = view->GetBlock();
     std::vector<char> working = Buffer(defn.get_object_name());

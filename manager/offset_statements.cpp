@@ -3,9 +3,13 @@
 
 #include "host/port/msgman.h"
 #include "manager/lunmgr.h"
+#include "manager/statement_messages.h"
+
+using lunmgr::LineOf;
+using lunmgr::Msg;
+using lunmgr::TextOf;
 
 namespace {
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "lunmgr", line, "1.0"); }
 
 std::string ValidPart(const double* valid) {
     return valid ? Port_Format(" %s %f %s", "VALID", *valid, "pS") : std::string();

@@ -5,9 +5,13 @@
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 #include "manager/lunmgr.h"
+#include "manager/statement_messages.h"
+
+using lunmgr::LineOf;
+using lunmgr::Msg;
+using lunmgr::TextOf;
 
 namespace {
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "lunmgr", line, "1.0"); }
 
 bool Is(const char* keyword, const char* name) { return UT_STR::Compare(keyword, name) == 0; }
 

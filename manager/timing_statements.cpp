@@ -4,6 +4,7 @@
 
 #include "host/port/msgman.h"
 #include "manager/lunmgr.h"
+#include "manager/statement_messages.h"
 
 namespace {
 constexpr int kNoPriority = 2147483647;
@@ -29,8 +30,7 @@ void AppendPriority(std::string& text, int priority) {
 }  // namespace
 
 void Ta_LunMgr::Trace(const char* format, const Pr_Logical_ConstraintHandle* handle) const {
-    if (debug_callbacks)
-        Port_MsgManData::debugStub(format, handle ? handle->getline() : 0, handle ? handle->return_ascii() : "");
+    if (debug_callbacks) Port_MsgManData::debugStub(format, lunmgr::LineOf(handle), lunmgr::TextOf(handle));
 }
 
 bool Ta_LunMgr::cb_tspec_period(const char* name, const char* group, const char* reference, bool multiply,
@@ -66,8 +66,7 @@ bool Ta_LunMgr::cb_tspec_maxdelay(const char* name, bool has_from, bool has_to,
     Trace("MGR::maxdelay: Line %I: %s", handle);
     if (second_pass) return true;
     if (points.empty()) {
-        Port_MsgManData::createObject("Quillmap", "lunmgr", __LINE__, "1.0")
-            .issueInternal("No paths defined for timespec '%s'\n", name);
+        lunmgr::Msg(__LINE__).issueInternal("No paths defined for timespec '%s'\n", name);
         return false;
     }
     Ndm_Block* block = GetConstraintBlock("TIMESPEC");
