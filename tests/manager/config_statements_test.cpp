@@ -100,6 +100,22 @@ TEST_F(ManagerTest, ModelStatementsAndUnreadableValues) {
                           "column 26 is invalid.\n"}));
 }
 
+TEST_F(ManagerTest, UnreadableTimingValuesAreReportedAndSkipped) {
+    Port_MsgCapture capture;
+    EXPECT_EQ(Run("TIMESPEC TS_z = PERIOD g 0 MHz;\nTIMESPEC TS_p = FROM a TO b 5 ns PRIORITY 9999999999;\n"
+                  "TIMESPEC TS_ok = PERIOD g 10 ns;\n"),
+              1);
+    EXPECT_EQ(capture.Texts(Port_Severity::Error),
+              (std::vector<std::string>{
+                  At(1) + "A parsing error occured while reading the constraint file.  The value '0 MHz' at  "
+                          "column 26 is invalid.\n",
+                  At(2) + "A parsing error occured while reading the constraint file.  The value '9999999999' at  "
+                          "column 43 is invalid.\n"}));
+    Ndm_Block* ts = top->GetBlockByName("top_TIMESPEC_UCF");
+    ASSERT_NE(ts, nullptr);
+    EXPECT_EQ(ts->GetPropertyByName("TIMESPEC")->GetNumEntries(), 1);  // only TS_ok
+}
+
 TEST_F(ManagerTest, TraceLinesWhenDebugging) {
     configure = [](TestMgr& m) { m.set_debug_callbacks(); };
     Port_MsgCapture capture(/*debug=*/true);
