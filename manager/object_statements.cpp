@@ -1,5 +1,6 @@
 // Ta_LunMgr: INST, NET and PIN statements (name lookup with its retries, one property per
 // constraint and object) and the policy for names that match nothing.
+#include <algorithm>
 #include <cstring>
 #include <string>
 #include <vector>
@@ -27,6 +28,21 @@ const char* FirstKeyword(const Pr_Logical_ConstraintDefn& defn) {
     if (defn.num_constraints() == 0) return nullptr;
     const char* key = (*defn.begin_constraint())->get_name();
     return key && *key ? key : nullptr;
+}
+
+// The children of top that a hierarchical search for path can start from: those whose name
+// is the text of path before one of its "/" (ignoring case when asked), in stored order. No
+// other child can lead to a match, so trying only these gives the same first match as trying
+// every child in order.
+std::vector<Ndm_Block*> ChildrenNamedByPathPrefix(const Ndm_Block* top, const char* path, bool ignore_case) {
+    std::vector<Ndm_Block*> children;
+    std::string_view text(path);
+    for (size_t slash = text.find('/'); slash != std::string_view::npos; slash = text.find('/', slash + 1))
+        top->GetBlocksByName(text.substr(0, slash), ignore_case, children);
+    std::sort(children.begin(), children.end(),
+              [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
+    children.erase(std::unique(children.begin(), children.end()), children.end());
+    return children;
 }
 
 const char* Keyword(const Pr_Logical_Constraint* c) {
@@ -164,7 +180,7 @@ bool Ta_LunMgr::cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
             if (!wild) {
                 Ndm_Signal* sig = find_sig(top, w, exact, handle);
                 if (!sig && hier) {
-                    for (Ndm_Block* child : top->GetBlockItr())
+                    for (Ndm_Block* child : ChildrenNamedByPathPrefix(top, w, !exact))
                         if ((sig = find_sig_hier(child, w, exact, handle))) break;
                 }
                 if (sig) found.push_back(sig);

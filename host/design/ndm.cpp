@@ -91,6 +91,7 @@ public:
     bool built[3] = {false, false, false};
     bool dup_exact[3] = {false, false, false};   // some name occurs twice
     bool dup_folded[3] = {false, false, false};  // some name occurs twice ignoring case
+    bool folded_built[3] = {false, false, false};  // the folded map is made on first need
     uint32_t max_len[3] = {0, 0, 0};             // longest member name
     std::vector<uint32_t> block_lengths;         // distinct child block name lengths, ascending
     std::unique_ptr<std::vector<void*>> sorted[3][2];  // [category][fold]
@@ -105,8 +106,7 @@ public:
 
     void Add(Ndm_Design* design, int category, const char* name, void* member) {
         if (exact[category].InsertIfAbsent(name, member) != member) dup_exact[category] = true;
-        if (folded[category].InsertIfAbsent(design->Intern(FoldName(name)), member) != member)
-            dup_folded[category] = true;
+        if (folded_built[category]) AddFolded(design, category, name, member);
         size_t len = std::strlen(name);
         if (len > max_len[category]) max_len[category] = static_cast<uint32_t>(len);
         if (category == kBlocks) {
@@ -124,6 +124,18 @@ public:
                                        });
             list->insert(at, member);
         }
+    }
+    void AddFolded(Ndm_Design* design, int category, const char* name, void* member) {
+        if (folded[category].InsertIfAbsent(design->Intern(FoldName(name)), member) != member)
+            dup_folded[category] = true;
+    }
+    // The case-folded map costs an interned folded copy of every name, so it is built only
+    // for the first lookup that ignores case.
+    template <class T>
+    void EnsureFolded(Ndm_Design* design, int category, const std::vector<T*>& members) {
+        if (folded_built[category]) return;
+        for (T* m : members) AddFolded(design, category, m->GetName(), m);
+        folded_built[category] = true;
     }
     template <class T>
     void Build(Ndm_Design* design, int category, const std::vector<T*>& members) {
@@ -146,6 +158,7 @@ public:
         exact[category].Clear();
         folded[category].Clear();
         built[category] = false;
+        folded_built[category] = false;
         dup_exact[category] = dup_folded[category] = false;
         max_len[category] = 0;
         if (category == kBlocks) block_lengths.clear();
@@ -307,6 +320,7 @@ T* Ndm_Block::Lookup(const std::vector<T*>& members, int category, const char* n
     Ndm_Design* design = view_->GetDesign();
     Ndm_MemberIndex& idx = Index();
     if (!idx.built[category]) idx.Build(design, category, members);
+    if (ignore_case) idx.EnsureFolded(design, category, members);
     const char* key = design->FindInterned(ignore_case ? std::string_view(folded) : name);
     if (!key) return nullptr;
     return static_cast<T*>((ignore_case ? idx.folded : idx.exact)[category].Find(key));
@@ -338,6 +352,7 @@ void Ndm_Block::GetBlocksByName(std::string_view name, bool ignore_case,
     Ndm_MemberIndex& idx = Index();
     if (!idx.built[kBlocks]) idx.Build(design, kBlocks, blocks_);
     if (!std::binary_search(idx.block_lengths.begin(), idx.block_lengths.end(), name.size())) return;
+    if (ignore_case) idx.EnsureFolded(design, kBlocks, blocks_);
     std::string folded;
     if (ignore_case) {
         folded.assign(name);
