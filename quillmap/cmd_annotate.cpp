@@ -20,7 +20,7 @@ struct AnnotateArgs {
     bool case_sensitive = false;
     bool case_insensitive = false;
     bool second_pass = false;
-    std::vector<std::string> best_effort;
+    std::string best_effort;
     bool allow_unmatched_locs = false;
     std::string output;
     CLI::Option* ucf_opt = nullptr;
@@ -62,9 +62,7 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
         if (args.second_pass) mgr.set_second_pass(true);
         if (options.debug) mgr.set_debug_callbacks();
         if (args.best_effort_opt->count() > 0)
-            mgr.set_best_effort(1, args.best_effort.empty() || args.best_effort.front().empty()
-                                       ? "DEFAULT"
-                                       : args.best_effort.front().c_str());
+            mgr.set_best_effort(1, args.best_effort.empty() ? "DEFAULT" : args.best_effort.c_str());
         if (args.allow_unmatched_locs) mgr.AllowUnmatchedLocs();
         mgr.annotate(view);
     }
@@ -98,11 +96,9 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
     cmd->add_flag("--second-pass", args.second_pass,
                   "Second pass over a UCF: objects annotated by the first pass are left alone and no\n"
                   "timing, group or CONFIG statement is recorded");
-    args.best_effort_opt =
-        cmd->add_option("--best-effort", args.best_effort,
-                        "Pass over INST and NET names that match nothing without a message; the\n"
-                        "optional value labels the run (default DEFAULT)")
-            ->expected(0, 1);
+    args.best_effort_opt = cmd->add_flag("--best-effort{DEFAULT}", args.best_effort,
+                                         "Pass over INST and NET names that match nothing without a\n"
+                                         "message; --best-effort=ID labels the run (default DEFAULT)");
     cmd->add_flag("--allow-unmatched-locs,--aul", args.allow_unmatched_locs,
                   "Location constraints (LOC, IOSTANDARD, DRIVE, SLEW) on names that match nothing\n"
                   "give an information message instead of an error");

@@ -37,6 +37,10 @@ TEST(Cli, AnnotateExampleStatusFollowsMessages) {
         << err;
     EXPECT_NE(err.find("'dbg_probe' in the design.  Since the -aul switch is set"), std::string::npos) << err;
 
+    EXPECT_EQ(Quillmap("annotate --best-effort " + kExample + "blinky.json --ucf " + kExample + "blinky.ucf", &out, &err),
+              0);
+    EXPECT_EQ(err, "");  // best effort passes over the missing net without a message
+
     // the saved design can be dumped and extracted
     EXPECT_EQ(Quillmap("dump " + saved, &out, &err), 0);
     EXPECT_NE(out.find("\"TNM\" string \"cnt_regs\""), std::string::npos);
