@@ -39,6 +39,17 @@ int QuillmapMain(int argc, char** argv) {
     AddDesignCommands(app, run);
     AddExtractCommand(app, run);
 
+    // The top-level list shows the first line of each description; the rest belongs to the
+    // subcommand's own help.
+    for (CLI::App* sub : app.get_subcommands({})) {
+        std::string text = sub->get_description();
+        size_t cut = text.find('\n');
+        if (cut == std::string::npos) continue;
+        std::string footer = sub->get_footer();
+        sub->description(text.substr(0, cut));
+        sub->footer("\n" + text.substr(cut + 1) + (footer.empty() ? "" : "\n" + footer));
+    }
+
     try {
         app.parse(argc, argv);
     } catch (const CLI::ParseError& e) {

@@ -69,8 +69,9 @@ static void AddConvertCommand(CLI::App& app, QuillmapAction& run) {
     static DesignArgs args;
     CLI::App* cmd = app.add_subcommand(
         "convert",
-        "Read a design (Yosys JSON netlist or native design file) and save it as a native\n"
-        "design file, which keeps every property and constraint block.");
+        "Save a design as a native design file.\n"
+        "Reads a Yosys JSON netlist or a native design file and writes the native form, which keeps\n"
+        "every property and constraint block (see docs/design-format.md).");
     AddDesignArgs(cmd, args);
     cmd->add_option("-o,--output", args.output, "Native design file to write")->required();
     cmd->callback([&run] {

@@ -59,8 +59,8 @@ void AddExtractCommand(CLI::App& app, QuillmapAction& run) {
     static ExtractArgs args;
     CLI::App* cmd = app.add_subcommand(
         "extract",
-        "Write the constraint blocks of a design (view EXPANDED, else the first view) as\n"
-        "constraint-file text, to stdout or to the -o file.\n"
+        "Write the constraint blocks of a design as constraint-file text.\n"
+        "The blocks of the view EXPANDED (else the first view) are written to stdout or to the -o file.\n"
         "Blocks are visited depth first, the children of a block (in stored order) before the\n"
         "block itself; each CONFIG, TIMEGRP and TIMESPEC block gives one section: a header line\n"
         "(\"// Global Constraints\", \"// Timing Groups\" or \"// Timing Constraints\"), one\n"
