@@ -1,4 +1,5 @@
 #include "host/design/dump.h"
+#include "host/port/json_text.h"
 
 #include <cstdio>
 #include <string>
@@ -138,28 +139,7 @@ private:
 
     void Quoted(const char* text) { Quoted(text ? text : "", text ? std::char_traits<char>::length(text) : 0); }
 
-    void Quoted(const char* text, size_t size) {
-        buf_ += '"';
-        for (size_t i = 0; i < size; ++i) {
-            unsigned char c = static_cast<unsigned char>(text[i]);
-            switch (c) {
-                case '"': buf_ += "\\\""; break;
-                case '\\': buf_ += "\\\\"; break;
-                case '\n': buf_ += "\\n"; break;
-                case '\t': buf_ += "\\t"; break;
-                case '\r': buf_ += "\\r"; break;
-                default:
-                    if (c < 0x20 || c == 0x7f) {
-                        char hex[8];
-                        std::snprintf(hex, sizeof hex, "\\u%04x", c);
-                        buf_ += hex;
-                    } else {
-                        buf_ += static_cast<char>(c);
-                    }
-            }
-        }
-        buf_ += '"';
-    }
+    void Quoted(const char* text, size_t size) { Port_AppendJsonString(buf_, std::string_view(text, size)); }
 
     std::ostream& out_;
     std::string buf_;

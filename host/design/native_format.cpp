@@ -11,6 +11,7 @@
 #include "host/design/json_input.h"
 #include "host/design/name_pool.h"
 #include "host/port/file.h"
+#include "host/port/json_text.h"
 #include "host/port/msgman.h"
 
 namespace {
@@ -240,30 +241,7 @@ private:
 
     void Str(const char* text) { Str(text ? text : "", text ? std::strlen(text) : 0); }
 
-    void Str(const char* text, size_t size) {
-        buf_ += '"';
-        size_t run = 0;  // start of the current run of plain bytes
-        for (size_t i = 0; i < size; ++i) {
-            unsigned char c = static_cast<unsigned char>(text[i]);
-            if (c >= 0x20 && c != '"' && c != '\\' && c != 0x7f) continue;
-            buf_.append(text + run, i - run);
-            run = i + 1;
-            switch (c) {
-                case '"': buf_ += "\\\""; break;
-                case '\\': buf_ += "\\\\"; break;
-                case '\n': buf_ += "\\n"; break;
-                case '\t': buf_ += "\\t"; break;
-                case '\r': buf_ += "\\r"; break;
-                default: {
-                    char hex[8];
-                    std::snprintf(hex, sizeof hex, "\\u%04x", c);
-                    buf_ += hex;
-                }
-            }
-        }
-        buf_.append(text + run, size - run);
-        buf_ += '"';
-    }
+    void Str(const char* text, size_t size) { Port_AppendJsonString(buf_, std::string_view(text, size)); }
 
     void Check() {
         if (buf_.size() >= kFlush) Flush();

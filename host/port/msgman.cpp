@@ -1,5 +1,7 @@
 #include "host/port/msgman.h"
 
+#include "host/port/json_text.h"
+
 #include <array>
 #include <cstring>
 
@@ -41,28 +43,6 @@ const char* TextWord(Port_Severity severity) {
     return "?";
 }
 
-void JsonString(std::string& out, const std::string& text) {
-    out += '"';
-    for (unsigned char c : text) {
-        switch (c) {
-            case '"': out += "\\\""; break;
-            case '\\': out += "\\\\"; break;
-            case '\n': out += "\\n"; break;
-            case '\r': out += "\\r"; break;
-            case '\t': out += "\\t"; break;
-            default:
-                if (c < 0x20 || c == 0x7f) {
-                    char buf[8];
-                    std::snprintf(buf, sizeof buf, "\\u%04x", c);
-                    out += buf;
-                } else {
-                    out += static_cast<char>(c);
-                }
-        }
-    }
-    out += '"';
-}
-
 }  // namespace
 
 const char* Port_SeverityKey(Port_Severity severity) {
@@ -93,14 +73,14 @@ void Port_TextSink::Emit(const Port_Message& message) {
 
 void Port_JsonSink::Emit(const Port_Message& message) {
     std::string line = "{\"severity\":";
-    JsonString(line, Port_SeverityKey(message.severity));
+    Port_AppendJsonString(line, Port_SeverityKey(message.severity));
     line += ",\"program\":";
-    JsonString(line, message.program);
+    Port_AppendJsonString(line, message.program);
     line += ",\"module\":";
-    JsonString(line, message.module);
+    Port_AppendJsonString(line, message.module);
     if (message.has_code) line += ",\"code\":" + std::to_string(message.code);
     line += ",\"text\":";
-    JsonString(line, message.text);
+    Port_AppendJsonString(line, message.text);
     line += "}\n";
     std::fwrite(line.data(), 1, line.size(), out_);
     std::fflush(out_);
