@@ -16,6 +16,14 @@ const char* Ndm_PropTypeName(int type) {
     }
 }
 
+namespace {
+// Sets the value of a property just made (null when it could not be made) and passes it on.
+Ndm_Property* Set(Ndm_Property* p, bool v) { return p ? (p->SetBool(v), p) : p; }
+Ndm_Property* Set(Ndm_Property* p, int32_t v) { return p ? (p->SetInt32(v), p) : p; }
+Ndm_Property* Set(Ndm_Property* p, double v) { return p ? (p->SetFloat64(v), p) : p; }
+Ndm_Property* Set(Ndm_Property* p, const char* v) { return p ? (p->SetValueString(v), p) : p; }
+}  // namespace
+
 Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name)
     : owner_(owner), type_(type), name_(name ? name : "") {}
 
@@ -36,24 +44,16 @@ Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
 }
 
 Ndm_Property* Ndm_Property::CreatePropertyString(const char* name, const char* value) {
-    Ndm_Property* p = AddEntry(NDM_PROP_STRING, name);
-    if (p) p->SetValueString(value);
-    return p;
+    return Set(AddEntry(NDM_PROP_STRING, name), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyBool(const char* name, bool value) {
-    Ndm_Property* p = AddEntry(NDM_PROP_BOOL, name);
-    if (p) p->SetBool(value);
-    return p;
+    return Set(AddEntry(NDM_PROP_BOOL, name), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyInt32(const char* name, int32_t value) {
-    Ndm_Property* p = AddEntry(NDM_PROP_INT32, name);
-    if (p) p->SetInt32(value);
-    return p;
+    return Set(AddEntry(NDM_PROP_INT32, name), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyFloat64(const char* name, double value) {
-    Ndm_Property* p = AddEntry(NDM_PROP_FLOAT64, name);
-    if (p) p->SetFloat64(value);
-    return p;
+    return Set(AddEntry(NDM_PROP_FLOAT64, name), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyList(const char* name) { return AddEntry(NDM_PROP_LIST, name); }
 Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
@@ -137,24 +137,16 @@ Ndm_Property* Ndm_PropertyHolder::Create(int type, const char* name) {
 }
 
 Ndm_Property* Ndm_PropertyHolder::CreatePropertyBool(const char* name, bool value) {
-    Ndm_Property* p = Create(NDM_PROP_BOOL, name);
-    if (p) p->SetBool(value);
-    return p;
+    return Set(Create(NDM_PROP_BOOL, name), value);
 }
 Ndm_Property* Ndm_PropertyHolder::CreatePropertyInt32(const char* name, int32_t value) {
-    Ndm_Property* p = Create(NDM_PROP_INT32, name);
-    if (p) p->SetInt32(value);
-    return p;
+    return Set(Create(NDM_PROP_INT32, name), value);
 }
 Ndm_Property* Ndm_PropertyHolder::CreatePropertyFloat64(const char* name, double value) {
-    Ndm_Property* p = Create(NDM_PROP_FLOAT64, name);
-    if (p) p->SetFloat64(value);
-    return p;
+    return Set(Create(NDM_PROP_FLOAT64, name), value);
 }
 Ndm_Property* Ndm_PropertyHolder::CreatePropertyString(const char* name, const char* value) {
-    Ndm_Property* p = Create(NDM_PROP_STRING, name);
-    if (p) p->SetValueString(value);
-    return p;
+    return Set(Create(NDM_PROP_STRING, name), value);
 }
 Ndm_Property* Ndm_PropertyHolder::CreatePropertyList(const char* name) { return Create(NDM_PROP_LIST, name); }
 Ndm_Property* Ndm_PropertyHolder::CreatePropertyStringList(const char* name) {
