@@ -5,7 +5,9 @@
 // that match nothing through the unmatched-object policy.
 #pragma once
 
+#include <memory>
 #include <string>
+#include <unordered_set>
 #include <utility>
 #include <vector>
 
@@ -121,9 +123,21 @@ protected:
     bool ApplyUnmatchedPolicy(ObjectKind kind, const Pr_Logical_ConstraintDefn& defn, const char* name,
                               const Pr_Logical_ConstraintHandle* handle);
 
+    // The children of the top block that a PIN path can be found below, in stored order.
+    std::vector<Ndm_Block*> PinSearchChildren(const char* path, bool ignore_case);
+
     bool config_seen;
     bool allow_unmatched_locs;
     std::vector<Port::StringBase<char>> tried_names;
     unsigned char best_effort;
     Port::StringBase<char> identifier;
+
+private:
+    // Distinct pin names (exact and case-folded) of the top block's children, made on the first
+    // PIN statement that needs them; empty sets with `pins_unbounded` mean "too many to keep".
+    struct PinNames {
+        std::unordered_set<std::string> exact, folded;
+        bool unbounded = false;
+    };
+    std::shared_ptr<PinNames> pin_names_;
 };

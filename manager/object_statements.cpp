@@ -51,6 +51,46 @@ const char* Keyword(const Pr_Logical_Constraint* c) {
 }
 }  // namespace
 
+std::vector<Ndm_Block*> Ta_LunMgr::PinSearchChildren(const char* path, bool ignore_case) {
+    Ndm_Block* top = view->GetBlock();
+    auto all = [&] { return std::vector<Ndm_Block*>(top->GetBlockItr().begin(), top->GetBlockItr().end()); };
+    if (top->GetNumBlocks() <= 64) return all();
+    constexpr size_t kMaxNames = 100000;
+    if (!pin_names_) {
+        pin_names_ = std::make_shared<PinNames>();
+        for (Ndm_Block* child : top->GetBlockItr()) {
+            for (Ndm_Pin* pin : child->GetPinItr()) {
+                std::string name = pin->GetName();
+                pin_names_->exact.insert(name);
+                for (char& c : name)
+                    if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+                pin_names_->folded.insert(name);
+            }
+            if (pin_names_->exact.size() > kMaxNames) {
+                pin_names_->unbounded = true;
+                pin_names_->exact.clear();
+                pin_names_->folded.clear();
+                break;
+            }
+        }
+    }
+    // A child's pin named by the whole path can be on any child.
+    std::string key = path;
+    if (ignore_case)
+        for (char& c : key)
+            if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+    if (pin_names_->unbounded || (ignore_case ? pin_names_->folded : pin_names_->exact).count(key)) return all();
+    // Otherwise the search starts from a child named by the path up to a "/" or a ".".
+    std::vector<Ndm_Block*> children;
+    std::string_view text(path);
+    for (size_t i = 0; i < text.size(); ++i)
+        if (text[i] == '/' || text[i] == '.') top->GetBlocksByName(text.substr(0, i), ignore_case, children);
+    std::sort(children.begin(), children.end(),
+              [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
+    children.erase(std::unique(children.begin(), children.end()), children.end());
+    return children;
+}
+
 bool Ta_LunMgr::ApplyUnmatchedPolicy(ObjectKind kind, const Pr_Logical_ConstraintDefn& defn, const char* name,
                                      const Pr_Logical_ConstraintHandle* handle) {
     int line = LineOf(handle);
@@ -232,7 +272,7 @@ bool Ta_LunMgr::cb_pin(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
             if (!wild) {
                 Ndm_Pin* pin = top->GetPinByName(w);
                 if (!pin) {
-                    for (Ndm_Block* child : top->GetBlockItr())
+                    for (Ndm_Block* child : PinSearchChildren(w, !exact))
                         if ((pin = find_pin_hier(child, w, exact, handle))) break;
                 }
                 if (pin) found.push_back(pin);

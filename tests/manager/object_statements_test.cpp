@@ -84,6 +84,23 @@ TEST_F(ManagerTest, PinsByPathAndWildcard) {
     EXPECT_EQ(Value(u1->GetPinByName("B"), "IOSTANDARD"), "<none>");
 }
 
+TEST_F(ManagerTest, PinAndNetSearchesOnManyChildren) {
+    for (int i = 0; i < 80; ++i) {
+        Ndm_Block* cell = top->CreateBlock(("c" + std::to_string(i)).c_str());
+        cell->CreatePin("I");
+        view->CreateNetwork()->AddSignal(cell->CreateSignal("o"));
+    }
+    Ndm_Block* odd = top->GetBlockByName("c77");
+    odd->CreatePin("c3.I");  // a pin literally named like a path, on another child
+    ASSERT_EQ(Run("PIN c42.I LOC = S1;\nPIN c3.I IOSTANDARD = std;\nPIN C5.i LOC = S5;\nNET c9/o TNM_NET = g9;\n"), 0);
+    EXPECT_EQ(Value(top->GetBlockByName("c42")->GetPinByName("I"), "LOC"), "S1");
+    // the first child in stored order that yields a pin wins: c3 itself comes before c77
+    EXPECT_EQ(Value(top->GetBlockByName("c3")->GetPinByName("I"), "IOSTANDARD"), "std");
+    EXPECT_EQ(Value(odd->GetPinByName("c3.I"), "IOSTANDARD"), "<none>");
+    EXPECT_EQ(Value(top->GetBlockByName("c5")->GetPinByName("I"), "LOC"), "S5");  // case fallback
+    EXPECT_EQ(Value(top->GetBlockByName("c9")->GetSignalByName("o")->GetNetwork(), "TNM_NET"), "g9");
+}
+
 TEST_F(ManagerTest, UnmatchedPolicy) {
     struct Case {
         const char* text;
