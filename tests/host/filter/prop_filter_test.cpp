@@ -3,12 +3,10 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <functional>
-#include <string>
-#include <vector>
+#include <sstream>
+#include <tuple>
 
 #include "host/design/ndm.h"
 #include "host/port/msgman.h"
@@ -16,69 +14,95 @@
 namespace {
 
 namespace fs = std::filesystem;
+using R = Ndh_PropFiltResult;
 
 // A fresh directory per test, removed afterwards.
-class FilterDir {
-public:
-    FilterDir() {
-        const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
-        dir_ = fs::path(::testing::TempDir()) /
-               ("lun_filter_" + std::to_string(::getpid()) + "_" + info->test_suite_name() + "_" +
-                info->name());
-        fs::remove_all(dir_);
-        fs::create_directories(dir_);
-    }
-    ~FilterDir() {
-        std::error_code ec;
-        fs::remove_all(dir_, ec);
-    }
+struct FilterDir {
+    fs::path dir = fs::path(::testing::TempDir()) /
+                   ("lun_filter_" + std::to_string(::getpid()) + "_" +
+                    ::testing::UnitTest::GetInstance()->current_test_info()->name());
+    FilterDir() { fs::remove_all(dir), fs::create_directories(dir); }
+    ~FilterDir() { std::error_code ec; fs::remove_all(dir, ec); }
     std::string Write(const std::string& name, const std::string& text) const {
-        std::string path = (dir_ / name).string();
-        std::ofstream(path, std::ios::binary) << text;
-        return path;
+        std::ofstream((dir / name).string(), std::ios::binary) << text;
+        return (dir / name).string();
     }
-    std::string path() const { return dir_.string(); }
-
-private:
-    fs::path dir_;
 };
 
-// A small design: an instance with a pin, a signal in a network, a CONFIG block.
+enum Where { NET, INST, CFG, PIN, SIG, TSPEC, DESIGN };
+enum Kind { S, F, I, D };  // string, bool flag ("0" false), int32, float64 property
+
+// A small design: an instance with a pin, a signal in a network, CONFIG and TIMESPEC blocks.
 struct Objects {
     Ndm_Design design{"d"};
-    Ndm_Block* top;
-    Ndm_Block* inst;
-    Ndm_Block* config;
-    Ndm_Pin* pin;
-    Ndm_Signal* sig;
-    Ndm_Network* net;
+    Ndm_PropertyHolder* at[7];
     Objects() {
         Ndm_View* view = design.CreateView("v");
-        top = view->CreateTopBlock("top");
-        inst = top->CreateBlock("u1");
-        pin = inst->CreatePin("D");
-        config = top->CreateBlock("cfg");
-        config->CreatePropertyString("TYPE", "CONFIG");
-        sig = top->CreateSignal("clk");
-        net = view->CreateNetwork();
+        Ndm_Block *top = view->CreateTopBlock("top"), *inst = top->CreateBlock("u1");
+        Ndm_Block *cfg = top->CreateBlock("cfg"), *ts = top->CreateBlock("ts");
+        cfg->CreatePropertyString("TYPE", "CONFIG");
+        ts->CreatePropertyString("TYPE", "TIMESPEC");
+        Ndm_Signal* sig = top->CreateSignal("clk");
+        Ndm_Network* net = view->CreateNetwork();
         net->AddSignal(sig);
+        at[NET] = net;
+        at[INST] = inst, at[CFG] = cfg, at[PIN] = inst->CreatePin("D"), at[SIG] = sig;
+        at[TSPEC] = ts, at[DESIGN] = &design;
     }
 };
 
+// Every property but TYPE, e.g. "LOC='P1' DRIVE=i8 PULLUP=T CLKDV=f2.5 TIG=[a|b]".
+std::string Props(const Ndm_PropertyHolder* o) {
+    std::ostringstream out;
+    for (const Ndm_Property* p : o->GetPropertyItr()) {
+        if (std::string(p->GetName()) == "TYPE") continue;
+        out << (out.tellp() ? " " : "") << p->GetName() << '=';
+        int t = p->GetType();
+        if (t == NDM_PROP_BOOL) out << (p->GetBool() ? "T" : "F");
+        if (t == NDM_PROP_INT32) out << 'i' << p->GetInt32();
+        if (t == NDM_PROP_FLOAT64) out << 'f' << p->GetFloat64();
+        if (t == NDM_PROP_STRING) out << '\'' << p->GetValueString() << '\'';
+        if (t == NDM_PROP_STRING_LIST) {
+            std::string sep = "[";
+            for (const std::string& e : p->GetStrings()) out << sep << e, sep = "|";
+            out << (sep == "[" ? "[]" : "]");
+        }
+    }
+    return out.str();
+}
+
 // Filters one property the way the annotators do: inside a temporary list on the object.
-Ndh_PropFiltResult Filter(Ndh_PropInFilter& filter, Ndm_PropertyHolder* object,
-                       const std::function<void(Ndm_Property*)>& make) {
-    Ndm_Property* list = object->CreatePropertyList("_TempPropList");
-    make(list);
-    Ndh_PropFiltResult r = filter.FilterProp(list, object);
-    object->DeleteProperty(list);
+R Run(Ndh_PropInFilter& f, Ndm_PropertyHolder* o, const char* name, Kind k, const char* v) {
+    Ndm_Property* l = o->CreatePropertyList("_TempPropList");
+    if (k == S) l->CreatePropertyString(name, v);
+    if (k == F) l->CreatePropertyBool(name, std::string(v) != "0");
+    if (k == I) l->CreatePropertyInt32(name, std::atoi(v));
+    if (k == D) l->CreatePropertyFloat64(name, std::atof(v));
+    R r = f.FilterProp(l, o);
+    o->DeleteProperty(l);
     return r;
 }
-Ndh_PropFiltResult RunStr(Ndh_PropInFilter& f, Ndm_PropertyHolder* o, const char* n, const char* v) {
-    return Filter(f, o, [&](Ndm_Property* l) { l->CreatePropertyString(n, v); });
-}
-Ndh_PropFiltResult RunFlag(Ndh_PropInFilter& f, Ndm_PropertyHolder* o, const char* n, bool v = true) {
-    return Filter(f, o, [&](Ndm_Property* l) { l->CreatePropertyBool(n, v); });
+
+// Each "name=value" gives the verdict `flags` and leaves Props() == props (null: not checked).
+struct Row { Where where; Kind kind; std::vector<std::string> props_in; unsigned flags;
+             const char* props; };
+constexpr unsigned OK = R::kSucceed, NAME = R::kBadPropName, TYPE = R::kBadDataType,
+                   INH = R::kInhibitedFalseBool, DEL = R::kInhibitedFalseBool | R::kDeletedTrueBool;
+
+// Rows run on fresh objects each, or (`shared`) one after another on the same objects.
+void Check(Ndh_PropInFilter& f, std::initializer_list<Row> rows, Objects* shared = nullptr) {
+    for (const Row& r : rows)
+        for (const std::string& in : r.props_in) {
+            Objects fresh;
+            Ndm_PropertyHolder* o = (shared ? shared : &fresh)->at[r.where];
+            SCOPED_TRACE("'" + in + "' kind " + std::to_string(r.kind));
+            size_t eq = in.find('=');
+            R got = Run(f, o, in.substr(0, eq).c_str(), r.kind, in.substr(eq + 1).c_str());
+            EXPECT_EQ(got.GetFlags(), r.flags);
+            if (r.props) {
+                EXPECT_EQ(Props(o), r.props);
+            }
+        }
 }
 
 const char* kDefs =
@@ -95,353 +119,194 @@ const char* kDefs =
     "VREF_BANK* string      config\r\n"
     "INIT_[00-3F] string    inst   # comment after the fields\n";
 
-class FilterTest : public ::testing::Test {
-protected:
+struct FilterTest : ::testing::Test {
     FilterDir dir;
-    Objects obj;
     Port_MsgCapture capture;
     std::string path = dir.Write("t.pfd", kDefs);
     Ndh_PropInFilter filter{path.c_str(), nullptr};
 };
 
-TEST_F(FilterTest, FiveVerdicts) {
+TEST_F(FilterTest, VerdictsConversionsAndStoredNames) {
     ASSERT_TRUE(filter.IsValid());
     EXPECT_TRUE(capture.messages().empty());
-    auto ok = RunStr(filter, obj.net, "LOC", "P10");
-    EXPECT_TRUE(ok.Succeed());
-    EXPECT_EQ(ok.GetFlags(), unsigned(Ndh_PropFiltResult::kSucceed));
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.net, "LOC"), "P10");
-
-    auto bad_name = RunStr(filter, obj.net, "NOT_A_CONSTRAINT", "x");
-    EXPECT_TRUE(bad_name.BadPropName());
-    EXPECT_FALSE(bad_name.Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("NOT_A_CONSTRAINT"), nullptr);
-
-    auto bad_type = RunStr(filter, obj.net, "DRIVE", "strong");
-    EXPECT_TRUE(bad_type.BadDataType());
-    EXPECT_FALSE(bad_type.Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("DRIVE"), nullptr);
-
-    // False boolean with nothing to remove, then after a true one.
-    auto inhibited = RunStr(filter, obj.net, "PULLUP", "false");
-    EXPECT_TRUE(inhibited.InhibitedFalseBool());
-    EXPECT_FALSE(inhibited.DeletedTrueBool());
-    EXPECT_FALSE(inhibited.Succeed());
-    ASSERT_TRUE(RunFlag(filter, obj.net, "PULLUP").Succeed());
-    EXPECT_TRUE(obj.net->GetPropertyByName("PULLUP")->GetBool());
-    auto deleted = RunFlag(filter, obj.net, "PULLUP", false);
-    EXPECT_TRUE(deleted.InhibitedFalseBool());
-    EXPECT_TRUE(deleted.DeletedTrueBool());
-    EXPECT_EQ(obj.net->GetPropertyByName("PULLUP"), nullptr);
-}
-
-TEST_F(FilterTest, MalformedCallsSetNoFlag) {
-    EXPECT_EQ(filter.FilterProp(nullptr, obj.net).GetFlags(), 0u);
-    Ndm_Property* list = obj.net->CreatePropertyList("_TempPropList");
-    EXPECT_EQ(filter.FilterProp(list, obj.net).GetFlags(), 0u);  // empty list
-    list->CreatePropertyString("LOC", "P1");
-    EXPECT_EQ(filter.FilterProp(list, nullptr).GetFlags(), 0u);
-    list->CreatePropertyString("LOC", "P2");
-    EXPECT_EQ(filter.FilterProp(list, obj.net).GetFlags(), 0u);  // two entries
-    EXPECT_EQ(obj.net->GetPropertyByName("LOC"), nullptr);
-}
-
-TEST_F(FilterTest, NamesIgnoreCaseAndAreStoredCanonically) {
-    EXPECT_TRUE(RunStr(filter, obj.net, "loc", "a9").Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("loc"), nullptr);
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.net, "LOC"), "a9");
-    // Replaces in place rather than adding a second LOC.
-    EXPECT_TRUE(RunStr(filter, obj.net, "Loc", "B9").Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.net, "LOC"), "B9");
-    EXPECT_EQ(obj.net->GetNumProperties(), 1);
-
-    EXPECT_TRUE(RunFlag(filter, obj.net, "pullup").Succeed());
-    EXPECT_NE(obj.net->GetPropertyByName("PULLUP"), nullptr);
-
-    // Prefix and range families: the prefix as defined, the rest upper-cased.
-    EXPECT_TRUE(RunStr(filter, obj.config, "vref_bank2a", "0.9").Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.config, "VREF_BANK2A"), "0.9");
-    EXPECT_TRUE(RunStr(filter, obj.inst, "init_3f", "FF").Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.inst, "INIT_3F"), "FF");
+    Check(filter, {
+        {NET, S, {"LOC=P10"}, OK, "LOC='P10'"}, {NET, S, {"loc=a9"}, OK, "LOC='a9'"},
+        {NET, S, {"NOT_A_CONSTRAINT=x"}, NAME, ""},
+        // Prefix and range families: the prefix as defined, the rest upper-cased.
+        {CFG, S, {"vref_bank2a=0.9"}, OK, "VREF_BANK2A='0.9'"},
+        {INST, S, {"init_3f=FF"}, OK, "INIT_3F='FF'"}, {INST, S, {"INIT_00=0"}, OK, "INIT_00='0'"},
+        {INST, S, {"INIT_40=0", "INIT_0=0", "INIT_000=0", "INIT_0G=0"}, NAME, ""},
+        {CFG, S, {"VREF_BANK=0", "VREF_BANK 1=0"}, NAME, ""},
+        {NET, S, {"PULLUP=TRUE", "PULLUP=yes", "PULLUP=On", "PULLUP=1", "PULLUP= true ", "PULLUP="},
+         OK, "PULLUP=T"},
+        {NET, S, {"PULLUP=FALSE", "PULLUP=no", "PULLUP=off", "PULLUP=0", "PULLUP=false"}, INH, ""},
+        {NET, S, {"PULLUP=maybe", "PULLUP=2", "PULLUP=truex", "DRIVE=strong", "DRIVE=2147483648",
+                  "DRIVE=8mA", "DRIVE=1.5", "DRIVE=", "DRIVE=0x10"}, TYPE, ""},
+        {NET, F, {"pullup=1"}, OK, "PULLUP=T"}, {NET, I, {"PULLUP=0"}, INH, ""},
+        {NET, D, {"PULLUP=1"}, TYPE, ""}, {NET, F, {"DRIVE=1", "LOC=1"}, TYPE, ""},
+        {NET, S, {"DRIVE=12"}, OK, "DRIVE=i12"}, {NET, I, {"DRIVE=24"}, OK, "DRIVE=i24"},
+        {NET, S, {"DRIVE=-2147483648"}, OK, "DRIVE=i-2147483648"},
+        {INST, S, {"CLKDV=2.5"}, OK, "CLKDV=f2.5"}, {INST, I, {"CLKDV=3"}, OK, "CLKDV=f3"},
+        {INST, S, {"CLKDV=2.5ns", "CLKDV=nan", "CLKDV=inf", "CLKDV=0x1p3", "CLKDV=abc", "CLKDV="},
+         TYPE, ""},
+        // A number becomes text; flagstring takes a flag or text.
+        {NET, I, {"LOC=7"}, OK, "LOC='7'"}, {INST, F, {"lock_pins=1"}, OK, "LOCK_PINS=T"},
+        {INST, S, {"LOCK_PINS=I0:A1,I1:A2"}, OK, "LOCK_PINS='I0:A1,I1:A2'"},
+        {CFG, F, {"RANGE=1"}, TYPE, ""}, {CFG, S, {"range=a = S0"}, OK, "RANGE=[a = S0]"},
+        // The object kind picks the definition; kinds not allowed are refused as wrong type.
+        {INST, S, {"RLOC_ORIGIN=X0Y0"}, OK, "RLOC_ORIGIN='X0Y0'"},
+        {CFG, S, {"RLOC_ORIGIN=s = X0Y0"}, OK, "RLOC_ORIGIN=[s = X0Y0]"},
+        {CFG, S, {"LOC=P1"}, TYPE, ""}, {INST, S, {"RANGE=x"}, TYPE, ""},
+        {PIN, S, {"DRIVE=8"}, TYPE, ""}, {SIG, S, {"TIG=TS_a"}, TYPE, ""},
+        {TSPEC, S, {"LOC=P1"}, TYPE, ""}, {DESIGN, S, {"LOC=P1"}, TYPE, ""},
+        {PIN, S, {"LOC=P1"}, OK, "LOC='P1'"}, {SIG, S, {"LOC=P1"}, OK, "LOC='P1'"},
+    });
     EXPECT_EQ(filter.CanonicalName("Init_0a"), "INIT_0A");
 }
 
-TEST_F(FilterTest, PatternBounds) {
-    EXPECT_TRUE(RunStr(filter, obj.inst, "INIT_00", "0").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.inst, "INIT_40", "0").BadPropName());   // above the range
-    EXPECT_TRUE(RunStr(filter, obj.inst, "INIT_0", "0").BadPropName());    // too narrow
-    EXPECT_TRUE(RunStr(filter, obj.inst, "INIT_000", "0").BadPropName());  // too wide
-    EXPECT_TRUE(RunStr(filter, obj.inst, "INIT_0G", "0").BadPropName());
-    EXPECT_TRUE(RunStr(filter, obj.config, "VREF_BANK", "0").BadPropName());  // empty suffix
-    EXPECT_TRUE(RunStr(filter, obj.config, "VREF_BANK 1", "0").BadPropName());
+TEST_F(FilterTest, RepeatedValuesReplaceAppendOrDelete) {
+    Objects o;
+    o.at[NET]->CreatePropertyStringList("TIG")->AddString("");  // written around the filter
+    o.at[INST]->CreatePropertyString("RLOC_ORIGIN", "old");
+    o.at[CFG]->CreatePropertyString("RLOC_ORIGIN", "set0 = X0Y0");
+    Check(filter, {
+        {NET, S, {"LOC=a9"}, OK, "TIG=[] LOC='a9'"}, {NET, S, {"Loc=B9"}, OK, "TIG=[] LOC='B9'"},
+        {NET, S, {"tig=TS_a"}, OK, "TIG=[|TS_a] LOC='B9'"},
+        {NET, F, {"PULLUP=1"}, OK, "TIG=[|TS_a] LOC='B9' PULLUP=T"},
+        {NET, F, {"PULLUP=0"}, DEL, "TIG=[|TS_a] LOC='B9'"},
+        {NET, S, {"PULLUP=false"}, INH, "TIG=[|TS_a] LOC='B9'"},
+        {INST, F, {"LOCK_PINS=1"}, OK, "RLOC_ORIGIN='old' LOCK_PINS=T"},
+        {INST, S, {"LOCK_PINS=I0:A1"}, OK, "RLOC_ORIGIN='old' LOCK_PINS='I0:A1'"},
+        {INST, F, {"LOCK_PINS=0"}, DEL, "RLOC_ORIGIN='old'"},
+        {CFG, S, {"RANGE=ag1 = S0:S7", "range=ag2 = S8:S9", "RANGE=ag1 = S0:S7"}, OK, nullptr},
+        {CFG, S, {"RLOC_ORIGIN=set1 = X1Y1"}, OK,
+         "RLOC_ORIGIN=[set0 = X0Y0|set1 = X1Y1] RANGE=[ag1 = S0:S7|ag2 = S8:S9|ag1 = S0:S7]"},
+    }, &o);
 }
 
-TEST_F(FilterTest, BooleanConversions) {
-    for (const char* t : {"TRUE", "yes", "On", "1", " true ", ""}) {
-        obj.net->DeleteAllProperties();
-        EXPECT_TRUE(RunStr(filter, obj.net, "PULLUP", t).Succeed()) << '"' << t << '"';
-        ASSERT_NE(obj.net->GetPropertyByName("PULLUP"), nullptr);
-        EXPECT_EQ(obj.net->GetPropertyByName("PULLUP")->GetType(), NDM_PROP_BOOL);
-    }
-    for (const char* t : {"FALSE", "no", "off", "0"})
-        EXPECT_TRUE(RunStr(filter, obj.net, "PULLUP", t).InhibitedFalseBool()) << t;
-    for (const char* t : {"maybe", "2", "truex"})
-        EXPECT_TRUE(RunStr(filter, obj.net, "PULLUP", t).BadDataType()) << t;
-    EXPECT_TRUE(Filter(filter, obj.net, [](Ndm_Property* l) { l->CreatePropertyInt32("PULLUP", 0); })
-                    .InhibitedFalseBool());
-    EXPECT_TRUE(Filter(filter, obj.net, [](Ndm_Property* l) { l->CreatePropertyFloat64("PULLUP", 1); })
-                    .BadDataType());
-}
-
-TEST_F(FilterTest, NumericConversions) {
-    EXPECT_TRUE(RunStr(filter, obj.net, "DRIVE", "12").Succeed());
-    const Ndm_Property* p = obj.net->GetPropertyByName("DRIVE");
-    ASSERT_NE(p, nullptr);
-    EXPECT_EQ(p->GetType(), NDM_PROP_INT32);
-    EXPECT_EQ(p->GetInt32(), 12);
-    EXPECT_TRUE(RunStr(filter, obj.net, "DRIVE", "-2147483648").Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("DRIVE")->GetInt32(), INT32_MIN);
-    for (const char* t : {"2147483648", "8mA", "1.5", "", "0x10"})
-        EXPECT_TRUE(RunStr(filter, obj.net, "DRIVE", t).BadDataType()) << t;
-    EXPECT_TRUE(Filter(filter, obj.net, [](Ndm_Property* l) { l->CreatePropertyInt32("DRIVE", 24); })
-                    .Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("DRIVE")->GetInt32(), 24);
-    EXPECT_TRUE(RunFlag(filter, obj.net, "DRIVE").BadDataType());
-
-    EXPECT_TRUE(RunStr(filter, obj.inst, "CLKDV", "2.5").Succeed());
-    EXPECT_EQ(obj.inst->GetPropertyByName("CLKDV")->GetType(), NDM_PROP_FLOAT64);
-    EXPECT_DOUBLE_EQ(obj.inst->GetPropertyByName("CLKDV")->GetFloat64(), 2.5);
-    EXPECT_TRUE(Filter(filter, obj.inst, [](Ndm_Property* l) { l->CreatePropertyInt32("CLKDV", 3); })
-                    .Succeed());
-    EXPECT_DOUBLE_EQ(obj.inst->GetPropertyByName("CLKDV")->GetFloat64(), 3.0);
-    for (const char* t : {"2.5ns", "nan", "inf", "0x1p3", "abc", ""})
-        EXPECT_TRUE(RunStr(filter, obj.inst, "CLKDV", t).BadDataType()) << t;
-}
-
-TEST_F(FilterTest, StringsAndFlags) {
-    // A flag for a string constraint is a wrong type; a number becomes its text.
-    EXPECT_TRUE(RunFlag(filter, obj.net, "LOC").BadDataType());
-    EXPECT_EQ(obj.net->GetPropertyByName("LOC"), nullptr);
-    EXPECT_TRUE(Filter(filter, obj.net, [](Ndm_Property* l) { l->CreatePropertyInt32("LOC", 7); })
-                    .Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.net, "LOC"), "7");
-
-    // flagstring takes both forms.
-    EXPECT_TRUE(RunFlag(filter, obj.inst, "lock_pins").Succeed());
-    EXPECT_EQ(obj.inst->GetPropertyByName("LOCK_PINS")->GetType(), NDM_PROP_BOOL);
-    EXPECT_TRUE(RunStr(filter, obj.inst, "LOCK_PINS", "I0:A1,I1:A2").Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.inst, "LOCK_PINS"), "I0:A1,I1:A2");
-    auto off = RunFlag(filter, obj.inst, "LOCK_PINS", false);
-    EXPECT_TRUE(off.InhibitedFalseBool());
-    EXPECT_TRUE(off.DeletedTrueBool());
-}
-
-TEST_F(FilterTest, StringListAppendsAcrossValues) {
-    EXPECT_TRUE(RunStr(filter, obj.config, "RANGE", "ag1 = S0:S7").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.config, "range", "ag2 = S8:S9").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.config, "RANGE", "ag1 = S0:S7").Succeed());
-    const Ndm_Property* p = obj.config->GetPropertyByName("RANGE");
-    ASSERT_NE(p, nullptr);
-    EXPECT_EQ(p->GetType(), NDM_PROP_STRING_LIST);
-    EXPECT_EQ(p->GetStrings(), (std::vector<std::string>{"ag1 = S0:S7", "ag2 = S8:S9", "ag1 = S0:S7"}));
-
-    // A TIG list written around the filter (valueless TIG) is extended, not replaced.
-    obj.net->CreatePropertyStringList("TIG")->AddString("");
-    EXPECT_TRUE(RunStr(filter, obj.net, "tig", "TS_a").Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("TIG")->GetStrings(), (std::vector<std::string>{"", "TS_a"}));
-    // A plain string of the same name is kept as the first entry.
-    obj.inst->CreatePropertyString("RLOC_ORIGIN", "old");
-    obj.config->CreatePropertyString("RLOC_ORIGIN", "set0 = X0Y0");
-    EXPECT_TRUE(RunStr(filter, obj.config, "RLOC_ORIGIN", "set1 = X1Y1").Succeed());
-    EXPECT_EQ(obj.config->GetPropertyByName("RLOC_ORIGIN")->GetStrings(),
-              (std::vector<std::string>{"set0 = X0Y0", "set1 = X1Y1"}));
-    EXPECT_TRUE(RunFlag(filter, obj.config, "RANGE").BadDataType());
-}
-
-TEST_F(FilterTest, ObjectKindDecidesTypeAndRefusal) {
-    // Same name, different type per kind.
-    EXPECT_TRUE(RunStr(filter, obj.inst, "RLOC_ORIGIN", "X0Y0").Succeed());
-    EXPECT_EQ(obj.inst->GetPropertyByName("RLOC_ORIGIN")->GetType(), NDM_PROP_STRING);
-    EXPECT_TRUE(RunStr(filter, obj.config, "RLOC_ORIGIN", "s = X0Y0").Succeed());
-    EXPECT_EQ(obj.config->GetPropertyByName("RLOC_ORIGIN")->GetType(), NDM_PROP_STRING_LIST);
-
-    // Known names on kinds they do not allow: wrong type, nothing attached.
-    EXPECT_TRUE(RunStr(filter, obj.config, "LOC", "P1").BadDataType());
-    EXPECT_TRUE(RunStr(filter, obj.inst, "RANGE", "x").BadDataType());
-    EXPECT_TRUE(RunStr(filter, obj.pin, "DRIVE", "8").BadDataType());
-    EXPECT_TRUE(RunStr(filter, obj.sig, "TIG", "TS_a").BadDataType());
-    EXPECT_EQ(obj.config->GetPropertyByName("LOC"), nullptr);
-    EXPECT_EQ(obj.pin->GetPropertyByName("DRIVE"), nullptr);
-    // The CONFIG block is recognised by its TYPE; without it a block is an instance.
-    EXPECT_TRUE(RunStr(filter, obj.pin, "LOC", "P1").Succeed());
-    Ndm_Block* timespec = obj.top->CreateBlock("ts");
-    timespec->CreatePropertyString("TYPE", "TIMESPEC");
-    EXPECT_TRUE(RunStr(filter, timespec, "LOC", "P1").BadDataType());
-    EXPECT_TRUE(RunStr(filter, &obj.design, "LOC", "P1").BadDataType());
+TEST_F(FilterTest, MalformedCallsSetNoFlag) {
+    Objects o;
+    Ndm_PropertyHolder* net = o.at[NET];
+    EXPECT_EQ(filter.FilterProp(nullptr, net).GetFlags(), 0u);
+    Ndm_Property* list = net->CreatePropertyList("_TempPropList");
+    EXPECT_EQ(filter.FilterProp(list, net).GetFlags(), 0u);  // empty list
+    list->CreatePropertyString("LOC", "P1");
+    EXPECT_EQ(filter.FilterProp(list, nullptr).GetFlags(), 0u);
+    list->CreatePropertyString("LOC", "P2");
+    EXPECT_EQ(filter.FilterProp(list, net).GetFlags(), 0u);  // two entries
+    EXPECT_EQ(net->GetPropertyByName("LOC"), nullptr);
 }
 
 TEST(FilterDefinitions, BadFilesNameFileAndLine) {
     FilterDir dir;
-    struct Case {
-        const char* text;
-        const char* expect;  // part of the message after "line N: "
-        int line;
-    };
-    const Case cases[] = {
-        {"LOC string net\nIOSTANDARD strng net\n", "unknown type word 'strng'.", 2},
-        {"# c\n\nLOC string net, wire\n", "unknown object kind 'wire'.", 3},
-        {"LOC string net\nloc string inst, net\n", "duplicate definition of 'loc'", 2},
-        {"INIT_[00-3F] string inst\nINIT_[20-7F] string inst\n", "duplicate definition", 2},
-        {"LOC string\n", "expected a name, a type word and at least one object kind.", 1},
-        {"LO-C string net\n", "invalid character", 1},
-        {"INIT_[3F-00] string inst\n", "reversed range", 1},
-        {"INIT_[0-FF] string inst\n", "equal width", 1},
-        {"INIT_[00-3F string inst\n", "malformed range", 1},
-        {"* string inst\n", "prefix name needs text", 1},
+    const std::tuple<const char*, int, const char*> cases[] = {  // text, line, part of message
+        {"LOC string net\nIOSTANDARD strng net\n", 2, "unknown type word 'strng'."},
+        {"# c\n\nLOC string net, wire\n", 3, "unknown object kind 'wire'."},
+        {"LOC string net\nloc string inst, net\n", 2, "duplicate definition of 'loc'"},
+        {"INIT_[00-3F] string inst\nINIT_[20-7F] string inst\n", 2, "duplicate definition"},
+        {"LOC string\n", 1, "expected a name, a type word and at least one object kind."},
+        {"LO-C string net\n", 1, "invalid character"},
+        {"INIT_[3F-00] string inst\n", 1, "reversed range"},
+        {"INIT_[0-FF] string inst\n", 1, "equal width"},
+        {"INIT_[00-3F string inst\n", 1, "malformed range"},
+        {"* string inst\n", 1, "prefix name needs text"},
     };
     int n = 0;
-    for (const Case& c : cases) {
-        std::string path = dir.Write("bad" + std::to_string(n++) + ".pfd", c.text);
+    for (const auto& [text, line, expect] : cases) {
+        std::string path = dir.Write("bad" + std::to_string(n++) + ".pfd", text);
         Port_MsgCapture capture;
         Ndh_PropInFilter filter(path.c_str(), nullptr);
-        EXPECT_FALSE(filter.IsValid()) << c.text;
-        std::string prefix = "Property definition file '" + path + "' line " + std::to_string(c.line) + ": ";
-        EXPECT_EQ(filter.GetError().rfind(prefix, 0), 0u) << filter.GetError();
-        EXPECT_NE(filter.GetError().find(c.expect), std::string::npos) << filter.GetError();
-        auto errors = capture.Texts(Port_Severity::Error);
-        ASSERT_EQ(errors.size(), 1u) << c.text;
-        EXPECT_EQ(errors[0], filter.GetError());
-        ASSERT_EQ(capture.messages().size(), 1u);
-        EXPECT_EQ(capture.messages()[0].module, "filter");
-        EXPECT_EQ(capture.messages()[0].program, "Quillmap");
+        EXPECT_FALSE(filter.IsValid()) << text;
+        std::string head = "Property definition file '" + path + "' line " + std::to_string(line);
+        EXPECT_EQ(filter.GetError().rfind(head + ": ", 0), 0u) << filter.GetError();
+        EXPECT_NE(filter.GetError().find(expect), std::string::npos) << filter.GetError();
+        ASSERT_EQ(capture.messages().size(), 1u) << text;
+        EXPECT_EQ(capture.Texts(Port_Severity::Error), std::vector{filter.GetError()});
+        EXPECT_EQ(capture.messages()[0].module + capture.messages()[0].program, "filterQuillmap");
     }
-    // Disjoint kinds for one name and overlapping-free ranges are fine.
-    std::string ok = dir.Write("ok.pfd", "X string inst\nx stringlist config\nI_[00-0F] string inst\nI_[10-1F] int inst\n");
+    // Disjoint kinds for one name and non-overlapping ranges are fine.
+    std::string ok = dir.Write(
+        "ok.pfd", "X string inst\nx stringlist config\nI_[00-0F] string inst\nI_[10-1F] int inst\n");
     Port_MsgCapture capture;
     EXPECT_TRUE(Ndh_PropInFilter(ok.c_str(), nullptr).IsValid());
     EXPECT_TRUE(capture.messages().empty());
 }
 
-TEST(FilterDefinitions, InvalidFilterRefusesEveryName) {
-    FilterDir dir;
-    Objects obj;
+TEST(FilterDefinitions, MissingFileRefusesEveryName) {
     Port_MsgCapture capture;
-    Ndh_PropInFilter filter((dir.path() + "/missing.pfd").c_str(), nullptr);
+    Ndh_PropInFilter filter((FilterDir().dir / "missing.pfd").c_str(), nullptr);
     EXPECT_FALSE(filter.IsValid());
     EXPECT_NE(filter.GetError().find("missing.pfd"), std::string::npos);
     EXPECT_EQ(capture.Texts(Port_Severity::Error).size(), 1u);
-    EXPECT_TRUE(RunStr(filter, obj.net, "LOC", "P1").BadPropName());
-    EXPECT_EQ(obj.net->GetPropertyByName("LOC"), nullptr);
+    Check(filter, {{NET, S, {"LOC=P1"}, NAME, ""}});
     EXPECT_EQ(filter.CanonicalName("LOC"), "");
 }
 
-TEST(FilterDefinitions, BareNamesResolveThroughDataDir) {
+TEST(FilterDefinitions, BareNamesResolveThroughDataDirAndParseOnce) {
     FilterDir dir;
     dir.Write("mine.pfd", "ONLY_HERE string net\n");
     const char* saved = std::getenv("LUN_DATA_DIR");
     std::string saved_value = saved ? saved : "";
-    ::setenv("LUN_DATA_DIR", dir.path().c_str(), 1);
-    {
-        Port_MsgCapture capture;
-        Ndh_PropInFilter filter("mine.pfd", nullptr);
-        EXPECT_TRUE(filter.IsValid()) << filter.GetError();
-        EXPECT_EQ(filter.CanonicalName("only_here"), "ONLY_HERE");
-        // The environment directory replaces the shipped folder.
-        Ndh_PropInFilter shipped("ucf.pfd", nullptr);
-        EXPECT_FALSE(shipped.IsValid());
-        EXPECT_NE(shipped.GetError().find(dir.path()), std::string::npos);
-    }
-    ::unsetenv("LUN_DATA_DIR");
-    {
-        Ndh_PropInFilter shipped("ucf.pfd", nullptr);
-        EXPECT_TRUE(shipped.IsValid()) << shipped.GetError();
-        EXPECT_EQ(shipped.GetPath(), std::string(LUN_SOURCE_DIR) + "/data/ucf.pfd");
-    }
-    if (saved) ::setenv("LUN_DATA_DIR", saved_value.c_str(), 1);
-}
-
-TEST(FilterDefinitions, ParsedOncePerFile) {
-    FilterDir dir;
-    std::string path = dir.Write("once.pfd", "FIRST string net\n");
-    Ndh_PropInFilter a(path.c_str(), nullptr);
-    ASSERT_TRUE(a.IsValid());
-    dir.Write("once.pfd", "SECOND string net\n");
-    Ndh_PropInFilter b(path.c_str(), nullptr);
-    EXPECT_EQ(b.CanonicalName("FIRST"), "FIRST");
-    EXPECT_EQ(b.CanonicalName("SECOND"), "");
-}
-
-class ShippedFilter : public ::testing::TestWithParam<const char*> {
-protected:
-    std::string Path() const { return std::string(LUN_SOURCE_DIR) + "/data/" + GetParam(); }
-};
-
-TEST_P(ShippedFilter, LoadsCleanly) {
+    ::setenv("LUN_DATA_DIR", dir.dir.c_str(), 1);
     Port_MsgCapture capture;
-    Ndh_PropInFilter filter(Path().c_str(), nullptr);
-    EXPECT_TRUE(filter.IsValid()) << filter.GetError();
-    EXPECT_TRUE(capture.messages().empty());
+    EXPECT_EQ(Ndh_PropInFilter("mine.pfd", nullptr).CanonicalName("only_here"), "ONLY_HERE");
+    // The environment directory replaces the shipped folder.
+    EXPECT_NE(Ndh_PropInFilter("ucf.pfd", nullptr).GetError().find(dir.dir.string()),
+              std::string::npos);
+    ::unsetenv("LUN_DATA_DIR");
+    Ndh_PropInFilter shipped("ucf.pfd", nullptr);
+    EXPECT_TRUE(shipped.IsValid()) << shipped.GetError();
+    EXPECT_EQ(shipped.GetPath(), std::string(LUN_SOURCE_DIR) + "/data/ucf.pfd");
+    if (saved) ::setenv("LUN_DATA_DIR", saved_value.c_str(), 1);
+
+    // A file changed after its first use is not read again.
+    std::string path = dir.Write("once.pfd", "FIRST string net\n");
+    ASSERT_TRUE(Ndh_PropInFilter(path.c_str(), nullptr).IsValid());
+    dir.Write("once.pfd", "SECOND string net\n");
+    EXPECT_EQ(Ndh_PropInFilter(path.c_str(), nullptr).CanonicalName("FIRST"), "FIRST");
+    EXPECT_EQ(Ndh_PropInFilter(path.c_str(), nullptr).CanonicalName("SECOND"), "");
 }
 
-TEST_P(ShippedFilter, KnowsKeywordsOfRealFiles) {
-    Ndh_PropInFilter filter(Path().c_str(), nullptr);
-    const char* keys[] = {
-        "LOC", "IOSTANDARD", "SLEW", "DRIVE", "PULLUP", "PULLDOWN", "KEEPER", "KEEP", "TNM",
-        "TNM_NET", "PERIOD", "OFFSET", "MAXDELAY", "MAXSKEW", "TIG", "CLOCK_DEDICATED_ROUTE",
-        "IN_TERM", "OUT_TERM", "DIFF_TERM", "RLOC", "RLOC_ORIGIN", "U_SET", "H_SET", "HU_SET",
-        "BEL", "AREA_GROUP", "PART", "STEPPING", "VCCAUX", "PROHIBIT", "VREF", "DCI_CASCADE",
-        "INTERNAL_VREF_BANK0", "INTERNAL_VREF_BANK12", "SYSTEM_JITTER",
-        // further vocabulary
-        "IOB", "IOBDELAY", "FAST", "NODELAY", "IFD_DELAY_VALUE", "RLOC_RANGE", "LOCK_PINS", "S",
-        "SAVE", "MAP", "BLKNM", "HBLKNM", "LUTNM", "XBLKNM", "KEEP_HIERARCHY", "CLKIN_PERIOD",
-        "CLKFX_MULTIPLY", "CLKFX_DIVIDE", "CLKDV_DIVIDE", "DUTY_CYCLE_CORRECTION", "FEEDBACK",
-        "DIVIDE1_BY", "DIVIDE2_BY", "PHASE_SHIFT", "CLKOUT_PHASE_SHIFT", "DESKEW_ADJUST",
-        "STARTUP_WAIT", "DFS_FREQUENCY_MODE", "DLL_FREQUENCY_MODE", "INIT", "INIT_00", "INIT_7F",
-        "INITP_00", "INITP_0F", "INIT_A", "INIT_B", "SRVAL", "WRITE_MODE", "VOLTAGE",
-        "TEMPERATURE", "RANGE", "COMPRESSION", "PLACE", "GROUP", "MODE", "IMPLEMENT"};
-    for (const char* key : keys) {
-        EXPECT_EQ(filter.CanonicalName(key), key) << key;
-        std::string lower(key);
-        for (char& c : lower) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+struct ShippedFilter : ::testing::TestWithParam<const char*> {};
+
+TEST_P(ShippedFilter, LoadsCleanlyAndKnowsTheVocabulary) {
+    Port_MsgCapture capture;
+    Ndh_PropInFilter filter((std::string(LUN_SOURCE_DIR) + "/data/" + GetParam()).c_str(), nullptr);
+    ASSERT_TRUE(filter.IsValid()) << filter.GetError();
+    EXPECT_TRUE(capture.messages().empty());
+    std::istringstream keys(
+        "LOC IOSTANDARD SLEW DRIVE PULLUP KEEP TNM TNM_NET PERIOD OFFSET MAXDELAY MAXSKEW TIG "
+        "CLOCK_DEDICATED_ROUTE DIFF_TERM RLOC RLOC_ORIGIN U_SET HU_SET BEL AREA_GROUP PART VCCAUX "
+        "PROHIBIT VREF DCI_CASCADE INTERNAL_VREF_BANK0 INTERNAL_VREF_BANK12 SYSTEM_JITTER IOB "
+        "RLOC_RANGE LOCK_PINS S KEEP_HIERARCHY CLKDV_DIVIDE FEEDBACK PHASE_SHIFT INIT INIT_00 "
+        "INIT_7F INITP_00 INITP_0F INIT_A SRVAL VOLTAGE TEMPERATURE RANGE COMPRESSION PLACE MODE");
+    for (std::string key; keys >> key;) {
+        std::string lower;
+        for (char c : key) lower += static_cast<char>(std::tolower(c));
+        EXPECT_EQ(filter.CanonicalName(key.c_str()), key);
         EXPECT_EQ(filter.CanonicalName(lower.c_str()), key) << lower;
     }
     for (const char* key : {"FROM_UCF", "FROM_NCF", "_TempPropList", "INIT_80", "INITP_10"})
         EXPECT_EQ(filter.CanonicalName(key), "") << key;
-}
 
-TEST_P(ShippedFilter, ValueShapesOfRealFiles) {
-    Objects obj;
-    Ndh_PropInFilter filter(Path().c_str(), nullptr);
-    EXPECT_TRUE(RunStr(filter, obj.net, "loc", "P1,P2,P3").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.inst, "LOC", "SITE_X0Y58").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.net, "DRIVE", "8").Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("DRIVE")->GetInt32(), 8);
-    EXPECT_TRUE(RunFlag(filter, obj.net, "pullup").Succeed());
-    EXPECT_TRUE(RunFlag(filter, obj.net, "KEEP").Succeed());
-    // FALSE is the meaningful value here: kept as text, not dropped as a false flag.
-    EXPECT_TRUE(RunStr(filter, obj.net, "CLOCK_DEDICATED_ROUTE", "FALSE").Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.net, "CLOCK_DEDICATED_ROUTE"), "FALSE");
-    EXPECT_TRUE(RunStr(filter, obj.net, "PERIOD", "10000.000000 pS HIGH 50.000000 %").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.net, "TIG", "TS_a").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.net, "TIG", "TS_b").Succeed());
-    EXPECT_EQ(obj.net->GetPropertyByName("TIG")->GetStrings().size(), 2u);
-    EXPECT_TRUE(RunStr(filter, obj.inst, "INIT_3F", "0F0F").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.inst, "CLKDV_DIVIDE", "2.5").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.config, "VCCAUX", "3.3").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.config, "PROHIBIT", "P1, L3").Succeed());
-    EXPECT_TRUE(RunStr(filter, obj.config, "internal_vref_bank0", "0.75").Succeed());
-    EXPECT_STREQ(Ndh_PropUtil::GetStringProp(obj.config, "INTERNAL_VREF_BANK0"), "0.75");
-    for (const char* ag : {"ag1 = CLOSED", "ag2 = OPEN"})
-        EXPECT_TRUE(RunStr(filter, obj.config, "PLACE", ag).Succeed());
-    EXPECT_EQ(obj.config->GetPropertyByName("PLACE")->GetStrings().size(), 2u);
-    EXPECT_TRUE(RunStr(filter, obj.config, "RLOC_RANGE", "set1 = X0Y0:X3Y3").Succeed());
-    EXPECT_EQ(obj.config->GetPropertyByName("RLOC_RANGE")->GetType(), NDM_PROP_STRING);
-    EXPECT_TRUE(RunStr(filter, obj.config, "LOC", "P1").BadDataType());
+    Check(filter, {
+        {NET, S, {"loc=P1,P2,P3", "PERIOD=10000.000000 pS HIGH 50.000000 %"}, OK, nullptr},
+        {INST, S, {"LOC=SITE_X0Y58", "INIT_3F=0F0F", "CLKDV_DIVIDE=2.5"}, OK, nullptr},
+        {CFG, S, {"VCCAUX=3.3", "PROHIBIT=P1, L3"}, OK, nullptr}, {CFG, S, {"LOC=P1"}, TYPE, ""},
+        {NET, S, {"DRIVE=8"}, OK, "DRIVE=i8"}, {NET, F, {"pullup=1"}, OK, "PULLUP=T"},
+        {NET, F, {"KEEP=1"}, OK, nullptr},
+        // FALSE is the meaningful value here: kept as text, not dropped as a false flag.
+        {NET, S, {"CLOCK_DEDICATED_ROUTE=FALSE"}, OK, "CLOCK_DEDICATED_ROUTE='FALSE'"},
+        {CFG, S, {"internal_vref_bank0=0.75"}, OK, "INTERNAL_VREF_BANK0='0.75'"},
+        {CFG, S, {"RLOC_RANGE=set1 = X0Y0:X3Y3"}, OK, "RLOC_RANGE='set1 = X0Y0:X3Y3'"},
+    });
+    Objects o;
+    Check(filter, {{NET, S, {"TIG=TS_a", "TIG=TS_b"}, OK, nullptr},
+                   {CFG, S, {"PLACE=ag1 = CLOSED", "PLACE=ag2 = OPEN"}, OK, nullptr}}, &o);
+    EXPECT_EQ(Props(o.at[NET]) + " " + Props(o.at[CFG]), "TIG=[TS_a|TS_b] PLACE=[ag1 = CLOSED|ag2 = OPEN]");
 }
 
 INSTANTIATE_TEST_SUITE_P(Files, ShippedFilter, ::testing::Values("ucf.pfd", "ucf.prp"),
-                         [](const auto& info) {
-                             return std::string(info.param).replace(3, 1, "_");
-                         });
+                         [](const auto& info) { return std::string(info.param).replace(3, 1, "_"); });
 
 }  // namespace
