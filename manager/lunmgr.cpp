@@ -97,24 +97,23 @@ unsigned char Ta_LunMgr::DCI_Cascade_Hack(Ndm_Block* block, const char* value,
     return 1;
 }
 
-bool Ta_LunMgr::cb_voltage(double volts, const Pr_Logical_ConstraintHandle* handle) {
-    Trace("MGR::Voltage: Line %I: %s", handle);
+// Voltage and temperature settings: the value with three decimals and its unit letter on the
+// CONFIG block, whatever the filter says of it.
+bool Ta_LunMgr::AttachOperatingCondition(const char* trace, const char* name, const char* format, double value,
+                                         const Pr_Logical_ConstraintHandle* handle) {
+    Trace(trace, handle);
     if (second_pass) return true;
     Ndm_Block* block = GetConstraintBlock("CONFIG");
-    char* text = zepform("%0.3fV", volts);
-    AttachConstraint("VOLTAGE", text, block, handle);
-    delete[] text;
+    AttachConstraint(name, Port_Format(format, value).c_str(), block, handle);
     return true;
 }
 
+bool Ta_LunMgr::cb_voltage(double volts, const Pr_Logical_ConstraintHandle* handle) {
+    return AttachOperatingCondition("MGR::Voltage: Line %I: %s", "VOLTAGE", "%0.3fV", volts, handle);
+}
+
 bool Ta_LunMgr::cb_temperature(double celsius, const Pr_Logical_ConstraintHandle* handle) {
-    Trace("MGR::temperature: Line %I: %s", handle);
-    if (second_pass) return true;
-    Ndm_Block* block = GetConstraintBlock("CONFIG");
-    char* text = zepform("%0.3fC", celsius);
-    AttachConstraint("TEMPERATURE", text, block, handle);
-    delete[] text;
-    return true;
+    return AttachOperatingCondition("MGR::temperature: Line %I: %s", "TEMPERATURE", "%0.3fC", celsius, handle);
 }
 
 bool Ta_LunMgr::cb_model(const Pr_Logical_ConstraintDefn&, const Pr_Logical_ConstraintHandle* handle) {

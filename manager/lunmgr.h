@@ -111,6 +111,8 @@ protected:
     // is none or every style was tried.
     bool change_bus_delimiters(char* name);
 
+    bool AttachOperatingCondition(const char* trace, const char* name, const char* format, double value,
+                                  const Pr_Logical_ConstraintHandle* handle);
     // Writes the trace line of a statement when tracing is on.
     void Trace(const char* format, const Pr_Logical_ConstraintHandle* handle) const;
     // Records one global or group offset entry, reporting a second entry of a generated name.
