@@ -8,36 +8,48 @@
 #include <filesystem>
 #include <fstream>
 #include <string>
+#include <type_traits>
 #include <vector>
 
 #include "host/parser/pr_logical.h"
 
 namespace parser_test {
 
+// One callback argument as text; null pointers read "null".
+template <class T>
+std::string str(const T& v) {
+    using std::is_same_v;
+    if constexpr (is_same_v<T, bool>) return v ? "true" : "false";
+    if constexpr (is_same_v<T, int>) return std::to_string(v);
+    if constexpr (is_same_v<T, const char*>) return v ? v : "null";
+    if constexpr (is_same_v<T, std::string>) return v;
+    if constexpr (is_same_v<T, const double*>) return v ? ">" + str(*v) : "null";
+    if constexpr (is_same_v<T, double>) {
+        char buf[64];
+        return std::string(buf, std::to_chars(buf, buf + sizeof buf, v).ptr);
+    }
+    if constexpr (is_same_v<T, std::vector<const char*>>) {
+        std::string out;
+        for (std::size_t i = 0; i < v.size(); ++i) out += (i ? "," : "") + str(v[i]);
+        return "(" + out + ")";
+    }
+}
 inline std::string num(double v) {
-    char buf[64];
-    auto r = std::to_chars(buf, buf + sizeof buf, v);
-    return std::string(buf, r.ptr);
-}
-inline std::string b(bool v) {
-    return v ? "true" : "false";
-}
-inline std::string s(const char* t) {
-    return t ? t : "null";
-}
-inline std::string p(const double* v) {
-    return v ? ">" + num(*v) : "null";
-}
-inline std::string prio(int v) {
-    return v == PR_NO_PRIORITY ? "NONE" : std::to_string(v);
-}
-inline std::string list(const std::vector<const char*>& v) {
-    std::string out = "(";
-    for (std::size_t i = 0; i < v.size(); ++i) out += (i ? "," : "") + s(v[i]);
-    return out + ")";
+    return str(v);
 }
 inline std::string list(const char* const* b, const char* const* e) {
-    return list(std::vector<const char*>(b, e));
+    return str(std::vector<const char*>(b, e));
+}
+inline std::string prio(int v) {
+    return v == PR_NO_PRIORITY ? "NONE" : str(v);
+}
+// The arguments, formatted and separated by commas.
+template <class... A>
+std::string join(const A&... a) {
+    std::string out;
+    bool first = true;
+    ((out += (first ? "" : ",") + str(a), first = false), ...);
+    return out;
 }
 
 // Writes `text` to a fresh file that is removed again at the end of the scope.
@@ -45,10 +57,9 @@ class TempFile {
   public:
     explicit TempFile(const std::string& text) {
         static int counter = 0;
-        path_ =
-            (std::filesystem::temp_directory_path() / ("lun_parser_" + std::to_string(::getpid()) +
-                                                       "_" + std::to_string(counter++) + ".ucf"))
-                .string();
+        path_ = (std::filesystem::temp_directory_path() /
+                 ("lun_parser_" + join(::getpid(), counter++) + ".ucf"))
+                    .string();
         std::ofstream(path_, std::ios::binary) << text;
     }
     ~TempFile() { std::filesystem::remove(path_); }
@@ -73,6 +84,11 @@ class Recorder : public Pr_Logical_Parser {
 
     std::vector<Call> calls;
     bool answer = true;
+    using S = const char*;
+    using H = const Handle*;
+    using D = const Defn&;
+    using P = const double*;
+    using V = const std::vector<const char*>&;
 
     std::vector<std::string> whats() const {
         std::vector<std::string> out;
@@ -80,169 +96,94 @@ class Recorder : public Pr_Logical_Parser {
         return out;
     }
 
+    // Each constraint class adds its own fields after the name and type.
     static std::string record(const Pr_Logical_Constraint* c) {
-        std::string out = "(" + s(c->get_name()) + "," + std::to_string(c->get_type());
-        switch (c->get_type()) {
-            case Pr_Logical_Constraint::STRING:
-                out += "," + s(dynamic_cast<const Pr_Logical_StringConstraint*>(c)->get_value());
-                break;
-            case Pr_Logical_Constraint::STRING_LIST_TYPE: {
-                auto* l = dynamic_cast<const Pr_Logical_StringListConstraint*>(c);
-                out += "," + list(l->begin_value(), l->end_value());
-                break;
-            }
-            case Pr_Logical_Constraint::INIT_: {
-                auto* i = dynamic_cast<const Pr_Logical_InitRangeConstraint*>(c);
-                out +=
-                    "," + list(i->begin_name(), i->end_name()) + "," + s(i->get_constraint_value());
-                break;
-            }
-            case Pr_Logical_Constraint::OFFSET: {
-                auto* o = dynamic_cast<const Pr_Logical_OffsetConstraint*>(c);
-                out += "," + b(o->isin()) + "," + num(o->gettime()) + "," +
-                       p(o->get_valid_field()) + "," + b(o->isbefore()) + "," + s(o->getname()) +
-                       "," + s(o->gettgname()) + "," + b(o->has_high_low()) + "," +
-                       s(o->get_high_or_low());
-                break;
-            }
-            case Pr_Logical_Constraint::PERIOD: {
-                auto* q = dynamic_cast<const Pr_Logical_PeriodConstraint*>(c);
-                out += "," + num(q->getperiod()) + "," + b(q->gethigh()) + "," +
-                       num(q->gethightime()) + "," + num(q->gethighpercent()) + "," +
-                       p(q->get_input_jitter());
-                break;
-            }
-            default:
-                break;
-        }
-        return out + ")";
+        std::string out = join(c->get_name(), static_cast<int>(c->get_type()));
+        if (auto* v = dynamic_cast<const Pr_Logical_StringConstraint*>(c))
+            out += "," + str(v->get_value());
+        if (auto* l = dynamic_cast<const Pr_Logical_StringListConstraint*>(c))
+            out += "," + list(l->begin_value(), l->end_value());
+        if (auto* i = dynamic_cast<const Pr_Logical_InitRangeConstraint*>(c))
+            out += "," + join(list(i->begin_name(), i->end_name()), i->get_constraint_value());
+        if (auto* o = dynamic_cast<const Pr_Logical_OffsetConstraint*>(c))
+            out +=
+                "," + join(o->isin(), o->gettime(), o->get_valid_field(), o->isbefore(),
+                           o->getname(), o->gettgname(), o->has_high_low(), o->get_high_or_low());
+        if (auto* q = dynamic_cast<const Pr_Logical_PeriodConstraint*>(c))
+            out += "," + join(q->getperiod(), q->gethigh(), q->gethightime(), q->gethighpercent(),
+                              q->get_input_jitter());
+        return "(" + out + ")";
     }
-
     static std::string defn(const Pr_Logical_ConstraintDefn& d) {
-        std::string out = s(d.get_object_name()) + ";";
+        std::string out = str(d.get_object_name()) + ";";
         EXPECT_EQ(d.end_constraint() - d.begin_constraint(), d.num_constraints());
         for (auto it = d.begin_constraint(); it != d.end_constraint(); ++it)
             out += (it == d.begin_constraint() ? "" : ",") + record(*it);
         return out;
     }
 
-    bool add(const std::string& what, const Handle* h) {
-        calls.push_back({what, h ? h->getline() : 0, h ? h->return_ascii() : ""});
-        return answer;
-    }
-
-    bool cb_error(int line, int column, const char* value) override {
+    template <class... A>
+    bool add(H h, S name, const A&... a) {
         calls.push_back(
-            {"error(" + std::to_string(line) + "," + std::to_string(column) + "," + s(value) + ")",
-             line, ""});
+            {name + ("(" + join(a...) + ")"), h ? h->getline() : 0, h ? h->return_ascii() : ""});
         return answer;
     }
-    bool cb_syntax_error(int line, int column, const char* text, const Handle* h) override {
-        return add(
-            "syntax(" + std::to_string(line) + "," + std::to_string(column) + "," + s(text) + ")",
-            h);
+    bool cb_error(int line, int column, S value) override {
+        calls.push_back({"error(" + join(line, column, value) + ")", line, ""});
+        return answer;
     }
-    bool cb_comment(const char* text, const Handle* h) override {
-        return add("comment(" + s(text) + ")", h);
+    bool cb_syntax_error(int l, int c, S t, H h) override { return add(h, "syntax", l, c, t); }
+    bool cb_comment(S t, H h) override { return add(h, "comment", t); }
+    bool cb_enable(bool on, S name, H h) override { return add(h, "enable", on, name); }
+    bool cb_areagroup(D d, H h) override { return add(h, "areagroup", defn(d)); }
+    bool cb_net(D d, H h) override { return add(h, "net", defn(d)); }
+    bool cb_comp(D d, H h) override { return add(h, "comp", defn(d)); }
+    bool cb_pin(D d, H h) override { return add(h, "pin", defn(d)); }
+    bool cb_model(D d, H h) override { return add(h, "model", defn(d)); }
+    bool cb_set(D d, H h) override { return add(h, "set", defn(d)); }
+    bool cb_config(S name, S value, H h) override { return add(h, "config", name, value); }
+    bool cb_begin_model(S name, H h) override { return add(h, "begin_model", name); }
+    bool cb_end_model(H h) override { return add(h, "end_model"); }
+    bool cb_prohibit(V v, H h) override { return add(h, "prohibit", v); }
+    bool cb_vref(V v, H h) override { return add(h, "vref", v); }
+    bool cb_offset(bool in, double t, P valid, bool before, S clk, S lvl, H h) override {
+        return add(h, "offset", in, t, valid, before, clk, lvl);
     }
-    bool cb_enable(bool on, const char* name, const Handle* h) override {
-        return add("enable(" + b(on) + "," + s(name) + ")", h);
+    bool cb_toffset(S g, bool in, double t, P valid, bool before, S clk, S lvl, H h) override {
+        return add(h, "toffset", g, in, t, valid, before, clk, lvl);
     }
-    bool cb_areagroup(const Defn& d, const Handle* h) override {
-        return add("areagroup(" + defn(d) + ")", h);
+    bool cb_roffset(bool in, double t, P valid, bool before, S clk, S regs, S lvl, H h) override {
+        return add(h, "roffset", in, t, valid, before, clk, regs, lvl);
     }
-    bool cb_net(const Defn& d, const Handle* h) override { return add("net(" + defn(d) + ")", h); }
-    bool cb_comp(const Defn& d, const Handle* h) override {
-        return add("comp(" + defn(d) + ")", h);
+    bool cb_troffset(S g, bool in, double t, P valid, bool before, S clk, S regs, S lvl,
+                     H h) override {
+        return add(h, "troffset", g, in, t, valid, before, clk, regs, lvl);
     }
-    bool cb_pin(const Defn& d, const Handle* h) override { return add("pin(" + defn(d) + ")", h); }
-    bool cb_model(const Defn& d, const Handle* h) override {
-        return add("model(" + defn(d) + ")", h);
+    bool cb_tspec_maxdelay(S name, bool from, bool to, V points, S ref, bool mul, double value,
+                           bool is_time, int pr, bool dpo, H h) override {
+        return add(h, "maxdelay", name, from, to, points, ref, mul, value, is_time, prio(pr), dpo);
     }
-    bool cb_set(const Defn& d, const Handle* h) override { return add("set(" + defn(d) + ")", h); }
-    bool cb_config(const char* name, const char* value, const Handle* h) override {
-        return add("config(" + s(name) + "," + s(value) + ")", h);
+    bool cb_tspec_period(S name, S group, S ref, bool mul, double value, bool is_time,
+                         bool phase_plus, double phase, bool low, double duration, double percent,
+                         P jitter, int pr, H h) override {
+        return add(h, "period", name, group, ref, mul, value, is_time, phase_plus, phase, low,
+                   duration, percent, jitter, prio(pr));
     }
-    bool cb_begin_model(const char* name, const Handle* h) override {
-        return add("begin_model(" + s(name) + ")", h);
+    bool cb_tspec_tig(S name, bool from, bool to, V points, int pr, H h) override {
+        return add(h, "tig", name, from, to, points, prio(pr));
     }
-    bool cb_end_model(const Handle* h) override { return add("end_model()", h); }
-    bool cb_prohibit(const std::vector<const char*>& v, const Handle* h) override {
-        return add("prohibit(" + list(v) + ")", h);
+    bool cb_tspec_drop_spec(S name, H h) override { return add(h, "drop_spec", name); }
+    bool cb_timegrp(S g, const std::vector<std::pair<S, PR_EDGE>>& members, V excluded,
+                    H h) override {
+        std::string m;
+        for (const auto& [name, edge] : members)
+            m += (m.empty() ? "(" : ",(") + join(name, static_cast<int>(edge)) + ")";
+        return add(h, "timegrp", g, "(" + m + ")", excluded);
     }
-    bool cb_vref(const std::vector<const char*>& v, const Handle* h) override {
-        return add("vref(" + list(v) + ")", h);
-    }
-    bool cb_offset(bool in, double t, const double* valid, bool before, const char* clock,
-                   const char* level, const Handle* h) override {
-        return add("offset(" + b(in) + "," + num(t) + "," + p(valid) + "," + b(before) + "," +
-                       s(clock) + "," + s(level) + ")",
-                   h);
-    }
-    bool cb_toffset(const char* g, bool in, double t, const double* valid, bool before,
-                    const char* clock, const char* level, const Handle* h) override {
-        return add("toffset(" + s(g) + "," + b(in) + "," + num(t) + "," + p(valid) + "," +
-                       b(before) + "," + s(clock) + "," + s(level) + ")",
-                   h);
-    }
-    bool cb_roffset(bool in, double t, const double* valid, bool before, const char* clock,
-                    const char* regs, const char* level, const Handle* h) override {
-        return add("roffset(" + b(in) + "," + num(t) + "," + p(valid) + "," + b(before) + "," +
-                       s(clock) + "," + s(regs) + "," + s(level) + ")",
-                   h);
-    }
-    bool cb_troffset(const char* g, bool in, double t, const double* valid, bool before,
-                     const char* clock, const char* regs, const char* level,
-                     const Handle* h) override {
-        return add("troffset(" + s(g) + "," + b(in) + "," + num(t) + "," + p(valid) + "," +
-                       b(before) + "," + s(clock) + "," + s(regs) + "," + s(level) + ")",
-                   h);
-    }
-    bool cb_tspec_maxdelay(const char* name, bool from, bool to,
-                           const std::vector<const char*>& points, const char* ref, bool mul,
-                           double value, bool is_time, int pr, bool dpo, const Handle* h) override {
-        return add("maxdelay(" + s(name) + "," + b(from) + "," + b(to) + "," + list(points) + "," +
-                       s(ref) + "," + b(mul) + "," + num(value) + "," + b(is_time) + "," +
-                       prio(pr) + "," + b(dpo) + ")",
-                   h);
-    }
-    bool cb_tspec_period(const char* name, const char* group, const char* ref, bool mul,
-                         double value, bool is_time, bool phase_plus, double phase, bool low,
-                         double duration, double percent, const double* jitter, int pr,
-                         const Handle* h) override {
-        return add("period(" + s(name) + "," + s(group) + "," + s(ref) + "," + b(mul) + "," +
-                       num(value) + "," + b(is_time) + "," + b(phase_plus) + "," + num(phase) +
-                       "," + b(low) + "," + num(duration) + "," + num(percent) + "," + p(jitter) +
-                       "," + prio(pr) + ")",
-                   h);
-    }
-    bool cb_tspec_tig(const char* name, bool from, bool to, const std::vector<const char*>& points,
-                      int pr, const Handle* h) override {
-        return add("tig(" + s(name) + "," + b(from) + "," + b(to) + "," + list(points) + "," +
-                       prio(pr) + ")",
-                   h);
-    }
-    bool cb_tspec_drop_spec(const char* name, const Handle* h) override {
-        return add("drop_spec(" + s(name) + ")", h);
-    }
-    bool cb_timegrp(const char* g, const std::vector<std::pair<const char*, PR_EDGE>>& members,
-                    const std::vector<const char*>& excluded, const Handle* h) override {
-        std::string m = "(";
-        for (std::size_t i = 0; i < members.size(); ++i)
-            m += (i ? "," : "") + std::string("(") + s(members[i].first) + "," +
-                 std::to_string(members[i].second) + ")";
-        return add("timegrp(" + s(g) + "," + m + ")," + list(excluded) + ")", h);
-    }
-    bool cb_timegrp_areagroup(const char* g, const char* a, const Handle* h) override {
-        return add("timegrp_areagroup(" + s(g) + "," + s(a) + ")", h);
-    }
-    bool cb_temperature(double c, const Handle* h) override {
-        return add("temperature(" + num(c) + ")", h);
-    }
-    bool cb_voltage(double v, const Handle* h) override {
-        return add("voltage(" + num(v) + ")", h);
-    }
-    bool cb_default(const Handle* h) override { return add("default()", h); }
+    bool cb_timegrp_areagroup(S g, S a, H h) override { return add(h, "timegrp_areagroup", g, a); }
+    bool cb_temperature(double c, H h) override { return add(h, "temperature", c); }
+    bool cb_voltage(double v, H h) override { return add(h, "voltage", v); }
+    bool cb_default(H h) override { return add(h, "default"); }
 };
 
 // Parses `text` and returns what was recorded; `result` gets parse()'s answer.
@@ -257,8 +198,7 @@ inline std::vector<Call> parse_text(const std::string& text, bool* result = null
 // The single callback of a one-statement file.
 inline std::string one(const std::string& statement) {
     const auto calls = parse_text(statement + "\n");
-    if (calls.size() != 1) return "calls: " + std::to_string(calls.size());
-    return calls[0].what;
+    return calls.size() == 1 ? calls[0].what : "calls: " + str(int(calls.size()));
 }
 
 }  // namespace parser_test
