@@ -90,12 +90,6 @@ class Recorder : public Pr_Logical_Parser {
     using P = const double*;
     using V = const std::vector<const char*>&;
 
-    std::vector<std::string> whats() const {
-        std::vector<std::string> out;
-        for (const Call& c : calls) out.push_back(c.what);
-        return out;
-    }
-
     // Each constraint class adds its own fields after the name and type.
     static std::string record(const Pr_Logical_Constraint* c) {
         std::string out = join(c->get_name(), static_cast<int>(c->get_type()));
