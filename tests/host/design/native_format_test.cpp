@@ -73,27 +73,15 @@ TEST(NativeDesignFile, RoundTripIsLosslessAndByteStable) {
     EXPECT_EQ(ReadAll(first), ReadAll(second));
     EXPECT_EQ(DumpText(*design), DumpText(*again));
 
-    // Spot checks of what the dump cannot show bit for bit.
-    EXPECT_STREQ(again->GetName(), "chip \"A\"");
-    Ndm_View* v = again->GetViewByName("EXPANDED");
-    ASSERT_NE(v, nullptr);
-    ASSERT_NE(again->GetViewByName("EMPTY"), nullptr);
-    EXPECT_EQ(again->GetViewItr()[1]->GetBlock(), nullptr);
-    Ndm_Block* a = v->GetBlock()->GetBlockByName("a/b");
+    // The dump shows every object, link and value (floats to 17 digits); these read the values
+    // it can only print as text.
+    Ndm_Block* a = again->GetViewByName("EXPANDED")->GetBlock()->GetBlockByName("a/b");
     Ndm_Property* nested = a->GetPropertyByName("TIMING")->GetEntryByName("nested");
     EXPECT_TRUE(std::signbit(nested->GetEntryByName("neg0")->GetFloat64()));
     EXPECT_EQ(nested->GetEntryByName("tiny")->GetFloat64(), 4.9406564584124654e-324);
     EXPECT_EQ(nested->GetEntryByName("inf")->GetFloat64(), -HUGE_VAL);
     EXPECT_TRUE(std::isnan(nested->GetEntryByName("nan")->GetFloat64()));
-    Ndm_Signal* lonely = a->GetBlockByName("inner")->GetSignalByName("lonely");
-    EXPECT_EQ(lonely->GetPropertyByName("third")->GetFloat64(), 1.0 / 3.0);
-    EXPECT_EQ(lonely->GetNetwork(), nullptr);
-    EXPECT_EQ(a->GetPinByName("IO")->GetSignal(), a->GetBlockByName("inner")->GetSignalByName("clk"));
-    EXPECT_EQ(a->GetPinByName("O")->GetSignal(), nullptr);
-    ASSERT_EQ(v->GetNumNetworks(), 2);
-    EXPECT_STREQ(v->GetNetworkItr()[0]->GetName(), "clk");
-    EXPECT_EQ(v->GetNetworkItr()[0]->GetFirstSignal()->GetFullName(), "a/b/inner/clk");
-    EXPECT_EQ(v->GetNetworkItr()[1]->GetNumSignals(), 0);
+    EXPECT_EQ(a->GetBlockByName("inner")->GetSignalByName("lonely")->GetPropertyByName("third")->GetFloat64(), 1.0 / 3.0);
 
     // Loading by content picks the native reader; a stated top must match.
     Port_MsgCapture capture;
