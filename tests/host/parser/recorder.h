@@ -34,9 +34,6 @@ std::string str(const T& v) {
         return "(" + out + ")";
     }
 }
-inline std::string num(double v) {
-    return str(v);
-}
 inline std::string list(const char* const* b, const char* const* e) {
     return str(std::vector<const char*>(b, e));
 }
