@@ -55,7 +55,7 @@ class TempFile {
     explicit TempFile(const std::string& text) {
         static int counter = 0;
         path_ = (std::filesystem::temp_directory_path() /
-                 ("lun_parser_" + join(::getpid(), counter++) + ".ucf"))
+                 ("lun_parser_" + str(int(::getpid())) + "_" + str(counter++) + ".ucf"))
                     .string();
         std::ofstream(path_, std::ios::binary) << text;
     }
