@@ -9,22 +9,13 @@
 
 using namespace parser_test;
 
-namespace {
-struct Want {
-    Want(std::string w, int l = 0, std::string a = {}) : what(w), line(l), ascii(a) {}
-    std::string what;
-    int line;           // checked unless 0
-    std::string ascii;  // checked unless empty
-};
-}  // namespace
-
 // Each file gives exactly `calls`; the parse fails exactly when a syntax error was reported.
 TEST(ParserInput, FilesGiveTheseCallsLinesAndSourceTexts) {
     const std::string name(100000, 'n');
     const std::string binary = "\x80\xff\x01\x02\xfe;";
     const struct {
         std::string input;
-        std::vector<Want> calls;
+        std::vector<Call> calls;  // a line of 0 or an empty text is not checked
     } cases[] = {
         {"", {}},
         {" \t\r\n\n;;  ;\n", {}},
@@ -89,7 +80,7 @@ TEST(ParserInput, FilesGiveTheseCallsLinesAndSourceTexts) {
         bool syntax = false;
         for (std::size_t i = 0; i < got.size(); ++i) {
             EXPECT_EQ(got[i].what, c.calls[i].what);
-            const Want& w = c.calls[i];
+            const Call& w = c.calls[i];
             EXPECT_EQ(w.line ? got[i].line : 0, w.line) << w.what;
             EXPECT_EQ(w.ascii.empty() ? "" : got[i].ascii, w.ascii) << w.what;
             syntax = syntax || got[i].what.rfind("syntax(", 0) == 0;

@@ -69,8 +69,9 @@ class TempFile {
 };
 
 struct Call {
+    Call(std::string w, int l = 0, std::string a = {}) : what(w), line(l), ascii(a) {}
     std::string what;   // callback and arguments
-    int line = 0;       // handle line (cb_error: its line argument)
+    int line;           // handle line (cb_error: its line argument)
     std::string ascii;  // handle text (empty for cb_error)
 };
 
