@@ -1,5 +1,7 @@
 #include "host/design/design_io.h"
 
+#include "host/design/json_input.h"
+
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -11,11 +13,7 @@
 
 namespace {
 
-const Port_MsgManData& Msg() {
-    static const Port_MsgManData msg =
-        Port_MsgManData::createObject("Quillmap", "netlist", __LINE__, "1.0");
-    return msg;
-}
+using Ndm_JsonInput::Msg;
 
 }  // namespace
 

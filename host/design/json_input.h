@@ -6,7 +6,15 @@
 #include <string>
 #include <string_view>
 
+#include "host/port/msgman.h"
+
 namespace Ndm_JsonInput {
+
+// The message object of the design readers and writers (module "netlist").
+inline const Port_MsgManData& Msg() {
+    static const Port_MsgManData msg = Port_MsgManData::createObject("Quillmap", "netlist", __LINE__, "1.0");
+    return msg;
+}
 
 // A whole input file with the padding the parser needs after its end. Large files are mapped
 // (no copy, pages read in bulk); small ones are read into a padded buffer.

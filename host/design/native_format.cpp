@@ -19,11 +19,7 @@ namespace {
 namespace od = simdjson::ondemand;
 using simdjson::error_code;
 
-const Port_MsgManData& Msg() {
-    static const Port_MsgManData msg =
-        Port_MsgManData::createObject("Quillmap", "netlist", __LINE__, "1.0");
-    return msg;
-}
+using Ndm_JsonInput::Msg;
 
 constexpr const char kMarker[] = "lun-design";
 constexpr int kVersion = 1;
@@ -496,13 +492,7 @@ private:
                     if (pin) return Shape("a pin's \"dir\" must come right after its name");
                     std::string_view text;
                     if (!String(field.value(), text, "pin \"dir\"")) return false;
-                    if (text == "input")
-                        dir = Ndm_Dir::Input;
-                    else if (text == "output")
-                        dir = Ndm_Dir::Output;
-                    else if (text == "inout")
-                        dir = Ndm_Dir::Inout;
-                    else
+                    if (!Ndm_DirFromName(text, dir))
                         return Shape("pin \"dir\" must be \"input\", \"output\" or \"inout\"");
                 } else if (key == "signal") {
                     uint64_t n;

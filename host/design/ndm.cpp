@@ -176,6 +176,16 @@ const char* Ndm_DirName(Ndm_Dir dir) {
     }
 }
 
+bool Ndm_DirFromName(std::string_view name, Ndm_Dir& dir) {
+    for (Ndm_Dir d : {Ndm_Dir::Input, Ndm_Dir::Output, Ndm_Dir::Inout}) {
+        if (name == Ndm_DirName(d)) {
+            dir = d;
+            return true;
+        }
+    }
+    return false;
+}
+
 // ---- names ----
 
 void Ndm_Block::AppendFullName(std::string& out) const {

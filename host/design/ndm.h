@@ -39,6 +39,8 @@ class Ndm_Token {
 // Pin and port directions.
 enum class Ndm_Dir : uint8_t { None, Input, Output, Inout };
 const char* Ndm_DirName(Ndm_Dir dir);  // "", "input", "output", "inout"
+// The direction of "input", "output" or "inout"; false for any other word.
+bool Ndm_DirFromName(std::string_view name, Ndm_Dir& dir);
 
 class Ndm_Signal : public Ndm_PropertyHolder {
 public:

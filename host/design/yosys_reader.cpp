@@ -19,11 +19,7 @@ namespace {
 namespace od = simdjson::ondemand;
 using simdjson::error_code;
 
-const Port_MsgManData& Msg() {
-    static const Port_MsgManData msg =
-        Port_MsgManData::createObject("Quillmap", "netlist", __LINE__, "1.0");
-    return msg;
-}
+using Ndm_JsonInput::Msg;
 
 // Constant bits are stored as negative numbers.
 constexpr int32_t kConst0 = -1;
@@ -219,14 +215,7 @@ bool Reader::Int(od::value value, int64_t& out, const What& what) {
 bool Reader::Direction(od::value value, Ndm_Dir& dir, const What& what) {
     std::string_view text;
     if (!String(value, text, what)) return false;
-    if (text == "input")
-        dir = Ndm_Dir::Input;
-    else if (text == "output")
-        dir = Ndm_Dir::Output;
-    else if (text == "inout")
-        dir = Ndm_Dir::Inout;
-    else
-        return ShapeError(what() + " must be \"input\", \"output\" or \"inout\"");
+    if (!Ndm_DirFromName(text, dir)) return ShapeError(what() + " must be \"input\", \"output\" or \"inout\"");
     return true;
 }
 
