@@ -135,9 +135,10 @@ protected:
     Port::StringBase<char> identifier;
 
 private:
-    // Distinct pin names (exact and case-folded) of the top block's children, made on the first
-    // PIN statement that needs them; empty sets with `pins_unbounded` mean "too many to keep".
+    // Distinct pin names (exact and case-folded) of the children of the top block `top`, made on
+    // the first PIN statement that needs them; empty sets with `unbounded` mean "too many to keep".
     struct PinNames {
+        const Ndm_Block* top = nullptr;
         std::unordered_set<std::string> exact, folded;
         bool unbounded = false;
     };

@@ -30,15 +30,22 @@ const char* FirstKeyword(const Pr_Logical_ConstraintDefn& defn) {
     return key && *key ? key : nullptr;
 }
 
-// The children of top that a hierarchical search for path can start from: those whose name
-// is the text of path before one of its "/" (ignoring case when asked), in stored order. No
-// other child can lead to a match, so trying only these gives the same first match as trying
-// every child in order.
-std::vector<Ndm_Block*> ChildrenNamedByPathPrefix(const Ndm_Block* top, const char* path, bool ignore_case) {
+// ASCII letters in lower case.
+std::string Folded(std::string text) {
+    for (char& c : text)
+        if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+    return text;
+}
+
+// The children of top named by the text of path before one of the separator characters
+// (ignoring case when asked), in stored order. A hierarchical search for path can only start
+// from one of these, so trying them alone gives the same first match as trying every child.
+std::vector<Ndm_Block*> ChildrenNamedByPathPrefix(const Ndm_Block* top, std::string_view path,
+                                                  const char* separators, bool ignore_case) {
     std::vector<Ndm_Block*> children;
-    std::string_view text(path);
-    for (size_t slash = text.find('/'); slash != std::string_view::npos; slash = text.find('/', slash + 1))
-        top->GetBlocksByName(text.substr(0, slash), ignore_case, children);
+    for (size_t cut = path.find_first_of(separators); cut != std::string_view::npos;
+         cut = path.find_first_of(separators, cut + 1))
+        top->GetBlocksByName(path.substr(0, cut), ignore_case, children);
     std::sort(children.begin(), children.end(),
               [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
     children.erase(std::unique(children.begin(), children.end()), children.end());
@@ -56,15 +63,13 @@ std::vector<Ndm_Block*> Ta_LunMgr::PinSearchChildren(const char* path, bool igno
     auto all = [&] { return std::vector<Ndm_Block*>(top->GetBlockItr().begin(), top->GetBlockItr().end()); };
     if (top->GetNumBlocks() <= 64) return all();
     constexpr size_t kMaxNames = 100000;
-    if (!pin_names_) {
+    if (!pin_names_ || pin_names_->top != top) {
         pin_names_ = std::make_shared<PinNames>();
+        pin_names_->top = top;
         for (Ndm_Block* child : top->GetBlockItr()) {
             for (Ndm_Pin* pin : child->GetPinItr()) {
-                std::string name = pin->GetName();
-                pin_names_->exact.insert(name);
-                for (char& c : name)
-                    if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
-                pin_names_->folded.insert(name);
+                pin_names_->exact.insert(pin->GetName());
+                pin_names_->folded.insert(Folded(pin->GetName()));
             }
             if (pin_names_->exact.size() > kMaxNames) {
                 pin_names_->unbounded = true;
@@ -75,20 +80,10 @@ std::vector<Ndm_Block*> Ta_LunMgr::PinSearchChildren(const char* path, bool igno
         }
     }
     // A child's pin named by the whole path can be on any child.
-    std::string key = path;
-    if (ignore_case)
-        for (char& c : key)
-            if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
+    std::string key = ignore_case ? Folded(path) : std::string(path);
     if (pin_names_->unbounded || (ignore_case ? pin_names_->folded : pin_names_->exact).count(key)) return all();
     // Otherwise the search starts from a child named by the path up to a "/" or a ".".
-    std::vector<Ndm_Block*> children;
-    std::string_view text(path);
-    for (size_t i = 0; i < text.size(); ++i)
-        if (text[i] == '/' || text[i] == '.') top->GetBlocksByName(text.substr(0, i), ignore_case, children);
-    std::sort(children.begin(), children.end(),
-              [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
-    children.erase(std::unique(children.begin(), children.end()), children.end());
-    return children;
+    return ChildrenNamedByPathPrefix(top, path, "/.", ignore_case);
 }
 
 bool Ta_LunMgr::ApplyUnmatchedPolicy(ObjectKind kind, const Pr_Logical_ConstraintDefn& defn, const char* name,
@@ -220,7 +215,7 @@ bool Ta_LunMgr::cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
             if (!wild) {
                 Ndm_Signal* sig = find_sig(top, w, exact, handle);
                 if (!sig && hier) {
-                    for (Ndm_Block* child : ChildrenNamedByPathPrefix(top, w, !exact))
+                    for (Ndm_Block* child : ChildrenNamedByPathPrefix(top, w, "/", !exact))
                         if ((sig = find_sig_hier(child, w, exact, handle))) break;
                 }
                 if (sig) found.push_back(sig);

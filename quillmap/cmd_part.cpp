@@ -4,6 +4,7 @@
 #include <string>
 #include <vector>
 
+#include "extract/cst_extractor.h"
 #include "host/design/ndm.h"
 #include "host/port/msgman.h"
 #include "part/lunpart.h"
@@ -16,12 +17,6 @@ struct PartArgs {
     std::string filter;
     bool ncf = false;
 };
-
-bool IsBookkeeping(const std::string& name) {
-    for (const char* b : {"TYPE", "UCF", "NCF", "TERMINAL", "FROM_UCF", "FROM_NCF", "TA_LUN_NEW_OBJ"})
-        if (name == b) return true;
-    return false;
-}
 
 CP_FILE_TYPE KindOf(const std::string& path, bool force_ncf) {
     if (force_ncf) return CP_NCF;
@@ -56,7 +51,7 @@ int RunPart(const PartArgs& args, const QuillmapOptions& options) {
         if (part && part->GetValueString()) std::cout << "PART = " << part->GetValueString() << "\n";
         for (const Ndm_Property* p : config->GetPropertyItr()) {
             std::string name = p->GetName();
-            if (p == part || IsBookkeeping(name)) continue;
+            if (p == part || CstExtractor::IsBookkeepingProperty(name.c_str())) continue;
             if (p->GetType() == NDM_PROP_STRING_LIST) {
                 for (const std::string& text : p->GetStrings()) std::cout << name << " = " << text << "\n";
             } else if (p->GetValueString()) {
