@@ -49,12 +49,9 @@ public:
 
 // Design "d" with view EXPANDED: top block "top" with children u1 (holding u2) and u3, and
 // top-level signals clk and rst, each in its own network.
-class FrameTest : public ::testing::Test {
+class FrameTest : public ::testing::Test, public lun_test::TopDesign {
 protected:
     void SetUp() override {
-        design = std::make_unique<Ndm_Design>("d");
-        view = design->CreateView("EXPANDED");
-        top = view->CreateTopBlock("top");
         u1 = top->CreateBlock("u1");
         u2 = u1->CreateBlock("u2");
         u3 = top->CreateBlock("u3");
@@ -67,9 +64,6 @@ protected:
     }
 
     lun_test::ScratchDir dir;
-    std::unique_ptr<Ndm_Design> design;
-    Ndm_View* view = nullptr;
-    Ndm_Block* top = nullptr;
     Ndm_Block* u1 = nullptr;
     Ndm_Block* u2 = nullptr;
     Ndm_Block* u3 = nullptr;

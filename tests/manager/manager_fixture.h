@@ -25,15 +25,12 @@ public:
 //   u1 (pins A, B)        u1/u2 (pins D, Q)       u3       "data<3>"      pad1
 // signals of top: clk, rst, din, "bus[0]", "bus[1]"; u1 holds signal n1 in clk's network
 // and signal q in its own network "u1/q".
-class ManagerTest : public ::testing::Test {
+class ManagerTest : public ::testing::Test, public lun_test::TopDesign {
 protected:
     void SetUp() override {
         ::unsetenv("ZEP_QUILLMAP_ALLOWUNMATCHEDUCF");
         ::unsetenv("ZEP_QUILLMAP_BEST_EFFORT_UCF");
         ::unsetenv("ZEP_QUILLMAP_SECOND_UCF_PASS");
-        design = std::make_unique<Ndm_Design>("d");
-        view = design->CreateView("EXPANDED");
-        top = view->CreateTopBlock("top");
         u1 = top->CreateBlock("u1");
         u2 = u1->CreateBlock("u2");
         u3 = top->CreateBlock("u3");
@@ -75,7 +72,5 @@ protected:
     lun_test::ScratchDir dir;
     std::string file;
     std::function<void(TestMgr&)> configure;
-    std::unique_ptr<Ndm_Design> design;
-    Ndm_View* view = nullptr;
-    Ndm_Block *top = nullptr, *u1 = nullptr, *u2 = nullptr, *u3 = nullptr, *data3 = nullptr, *pad1 = nullptr;
+    Ndm_Block *u1 = nullptr, *u2 = nullptr, *u3 = nullptr, *data3 = nullptr, *pad1 = nullptr;
 };

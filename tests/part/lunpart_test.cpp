@@ -10,14 +10,9 @@
 
 namespace {
 
-class PartTest : public ::testing::Test {
+class PartTest : public ::testing::Test, public lun_test::TopDesign {
 protected:
-    void SetUp() override {
-        design = std::make_unique<Ndm_Design>("d");
-        view = design->CreateView("EXPANDED");
-        top = view->CreateTopBlock("top");
-        u1 = top->CreateBlock("u1");
-    }
+    void SetUp() override { u1 = top->CreateBlock("u1"); }
     int Run(const std::string& text, CP_FILE_TYPE kind = CP_UCF, const char* filter = nullptr) {
         file = dir.Write("p.ucf", text);
         Ta_LunPart reader(file.c_str(), kind, filter);
@@ -32,9 +27,6 @@ protected:
     lun_test::ScratchDir dir;
     std::string file;
     bool kind_ncf = false;
-    std::unique_ptr<Ndm_Design> design;
-    Ndm_View* view = nullptr;
-    Ndm_Block* top = nullptr;
     Ndm_Block* u1 = nullptr;
 };
 

@@ -37,11 +37,7 @@ std::vector<std::string> BlockContents(Ndm_View* view) {
     return out;
 }
 
-std::unique_ptr<Ndm_Design> EmptyDesign() {
-    auto design = std::make_unique<Ndm_Design>("d");
-    design->CreateView("EXPANDED")->CreateTopBlock("top");
-    return design;
-}
+std::unique_ptr<Ndm_Design> EmptyDesign() { return std::move(lun_test::TopDesign().design); }
 
 const char* kEveryForm =
     "CONFIG STEPPING = ES;\n"

@@ -1,9 +1,23 @@
 // Shared helpers of the test programs: scratch directories and small files.
 #pragma once
 
+#include <memory>
 #include <string>
 
+#include "host/design/ndm.h"
+
 namespace lun_test {
+
+// Design "d" with the view EXPANDED and its top block "top", the scaffold of most tests.
+struct TopDesign {
+    TopDesign()
+        : design(std::make_unique<Ndm_Design>("d")),
+          view(design->CreateView("EXPANDED")),
+          top(view->CreateTopBlock("top")) {}
+    std::unique_ptr<Ndm_Design> design;
+    Ndm_View* view;
+    Ndm_Block* top;
+};
 
 // A fresh directory under the system temporary directory, removed with the object.
 class ScratchDir {
