@@ -9,9 +9,17 @@
 #include <cstring>
 #include <memory>
 
+#include "host/port/json_text.h"
+
 namespace Ndm_JsonInput {
 
 namespace {
+
+// The UTF-8 form of a code point that stands for one byte (U+F780..U+F7FF: EF 9E xx, EF 9F xx).
+bool IsLiteralByteEscape(const char* p) {
+    return static_cast<unsigned char>(p[0]) == 0xEF &&
+           (static_cast<unsigned char>(p[1]) == 0x9E || static_cast<unsigned char>(p[1]) == 0x9F);
+}
 
 // Files at least this large are mapped rather than read.
 constexpr size_t kMapAtLeast = 1 << 20;
@@ -168,10 +176,11 @@ void Input::Release() {
     size_ = 0;
 }
 
-bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out) {
+bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out, bool bytes) {
     const char* begin = raw.raw();
     const char* p = begin;
-    // Stage 1 has validated string boundaries: an unescaped quote ends the string.
+    // Stage 1 has validated string boundaries: an unescaped quote ends the string. With byte
+    // escapes, a literal U+F780..U+F7FF (EF 9E xx, EF 9F xx) needs decoding too.
     const char* escape = nullptr;
     for (;; ++p) {
         char c = *p;
@@ -179,6 +188,8 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
         if (c == '\\') {
             if (!escape) escape = p;
             ++p;
+        } else if (bytes && !escape && IsLiteralByteEscape(p)) {
+            escape = p;
         }
     }
     if (!escape) {
@@ -189,6 +200,12 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
     scratch.assign(begin, static_cast<size_t>(escape - begin));
     for (p = escape; p < end; ++p) {
         if (*p != '\\') {
+            if (bytes && end - p >= 3 && IsLiteralByteEscape(p)) {
+                scratch += static_cast<char>(0x80 + ((static_cast<unsigned char>(p[1]) - 0x9E) << 6) +
+                                             (static_cast<unsigned char>(p[2]) - 0x80));
+                p += 2;
+                continue;
+            }
             scratch += *p;
             continue;
         }
@@ -216,7 +233,10 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
                 } else if (cp >= 0xDC00 && cp <= 0xDFFF) {
                     return false;
                 }
-                AppendUtf8(scratch, cp);
+                if (bytes && cp >= kPort_ByteEscapeFirst && cp <= kPort_ByteEscapeLast)
+                    scratch += static_cast<char>(cp - 0xF700);
+                else
+                    AppendUtf8(scratch, cp);
                 break;
             }
             default: return false;

@@ -42,8 +42,11 @@ private:
 };
 
 // Text of a JSON string from its raw form. Texts without escapes are views into the input;
-// others are decoded into scratch. False for a malformed escape.
-bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out);
+// others are decoded into scratch. With bytes set, code points U+F780..U+F7FF, escaped or
+// literal, are the bytes 0x80..0xFF they stand for (host/port/json_text.h). False for a
+// malformed escape.
+bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::string_view& out,
+          bool bytes = false);
 
 // Byte offset of the parse position in the input (its size when the parser has finished).
 size_t Offset(simdjson::ondemand::document& doc, const Input& input);

@@ -48,7 +48,7 @@ public:
         }
         buf_ += "]}\n";
         Flush();
-        if (!ok_) return Fail(file_.error());
+        if (!ok_) return Fail(why_.empty() ? file_.error() : why_);
         if (!file_.Commit()) return Fail(file_.error());
         return true;
     }
@@ -243,8 +243,14 @@ private:
         if (buf_.size() >= kFlush) Flush();
     }
 
+    // Buffers hold whole objects, so each is valid UTF-8 on its own; one that is not would give
+    // a file no reader accepts, and the file is then not written.
     void Flush() {
-        if (!file_.Write(buf_.data(), buf_.size())) ok_ = false;
+        if (ok_ && !simdjson::validate_utf8(buf_.data(), buf_.size())) {
+            ok_ = false;
+            why_ = "internal error: the text written is not valid UTF-8";
+        }
+        if (ok_ && !file_.Write(buf_.data(), buf_.size())) ok_ = false;
         buf_.clear();
     }
 
@@ -254,6 +260,7 @@ private:
     std::string buf_;
     Ndm_PtrMap ordinal_;  // signal -> 1 + its number
     bool ok_ = true;
+    std::string why_;
 };
 
 // ---------------------------------------------------------------------------------------
@@ -349,7 +356,7 @@ private:
         od::raw_json_string raw;
         if (error_code e = value.get_raw_json_string().get(raw))
             return JsonError(e, std::string(what) + " must be a string");
-        if (!Ndm_JsonInput::Text(raw, scratch_, out)) return SyntaxError(simdjson::STRING_ERROR, Where());
+        if (!Ndm_JsonInput::Text(raw, scratch_, out, true)) return SyntaxError(simdjson::STRING_ERROR, Where());
         return true;
     }
 

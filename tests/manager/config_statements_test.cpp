@@ -67,8 +67,8 @@ TEST_F(ManagerTest, BankVoltagesBypassTheFilter) {
 TEST_F(ManagerTest, DciCascadeWordsAreJoined) {
     ASSERT_EQ(Run("CONFIG dci_cascade = \"1 3  5\";\n", CP_NCF), 0);
     EXPECT_EQ(Value(Config(), "DCI_CASCADE"), "1,3,5");
-    ASSERT_EQ(Run("CONFIG DCI_CASCADE = 7;\n", CP_NCF), 0);
-    EXPECT_EQ(Value(Config(), "DCI_CASCADE"), "7");
+    ASSERT_EQ(Run("CONFIG DCI_CASCADE = 7;\n", CP_NCF), 0);  // one chain per statement, all kept
+    EXPECT_EQ(Value(Config(), "DCI_CASCADE"), "1,3,5 | 7");
 }
 
 TEST_F(ManagerTest, VoltageAndTemperatureTexts) {

@@ -54,10 +54,7 @@ protected:
         return mgr.annotate(view);
     }
     Ndm_Property* Prop(Ndm_PropertyHolder* holder, const char* name) { return holder->GetPropertyByName(name); }
-    std::string Value(Ndm_PropertyHolder* holder, const char* name) {
-        Ndm_Property* p = holder->GetPropertyByName(name);
-        return p && p->GetValueString() ? p->GetValueString() : std::string("<none>");
-    }
+    std::string Value(Ndm_PropertyHolder* holder, const char* name) { return lun_test::PropText(holder, name); }
     Ndm_Network* Net(const char* name) { return top->GetSignalByName(name)->GetNetwork(); }
     Ndm_Block* Config() {
         for (Ndm_Block* b : top->GetBlockItr()) {

@@ -19,10 +19,7 @@ protected:
         return reader.annotate(view);
     }
     Ndm_Block* Config() { return top->GetBlockByName(kind_ncf ? "top_CONFIG_NCF" : "top_CONFIG_UCF"); }
-    std::string Value(const char* name) {
-        Ndm_Property* p = Config() ? Config()->GetPropertyByName(name) : nullptr;
-        return p && p->GetValueString() ? p->GetValueString() : "<none>";
-    }
+    std::string Value(const char* name) { return lun_test::PropText(Config(), name); }
 
     lun_test::ScratchDir dir;
     std::string file;

@@ -43,7 +43,7 @@ TEST(Cli, AnnotateExampleStatusFollowsMessages) {
 
     // the saved design can be dumped and extracted
     EXPECT_EQ(Quillmap("dump " + saved, &out, &err), 0);
-    EXPECT_NE(out.find("\"TNM\" string \"cnt_regs\""), std::string::npos);
+    EXPECT_NE(out.find("\"TNM\" string_list [\"cnt_regs\"]"), std::string::npos);
     EXPECT_EQ(Quillmap("extract " + saved, &out, &err), 0) << err;
     EXPECT_NE(out.find("TIMESPEC TS_clk = PERIOD \"clk_grp\" 20000.000000 pS HIGH 50.000000 % ;"), std::string::npos)
         << out;

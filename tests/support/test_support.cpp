@@ -26,6 +26,21 @@ ScratchDir::~ScratchDir() {
     std::filesystem::remove_all(path_, ec);
 }
 
+std::string PropText(const Ndm_PropertyHolder* holder, const char* name) {
+    const Ndm_Property* p = holder ? holder->GetPropertyByName(name) : nullptr;
+    if (!p) return "<none>";
+    switch (p->GetType()) {
+        case NDM_PROP_STRING: return p->GetValueString();
+        case NDM_PROP_INT32: return std::to_string(p->GetInt32());
+        case NDM_PROP_STRING_LIST: {
+            std::string text;
+            for (const std::string& s : p->GetStrings()) text += (text.empty() ? "" : " | ") + s;
+            return text;
+        }
+        default: return "<" + std::string(Ndm_PropTypeName(p->GetType())) + ">";
+    }
+}
+
 std::string ScratchDir::Write(const std::string& name, const std::string& content) const {
     std::string file = path_ + "/" + name;
     std::ofstream out(file, std::ios::binary);

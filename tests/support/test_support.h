@@ -34,6 +34,10 @@ private:
     std::string path_;
 };
 
+// Text of a property for comparisons: a string as it is, the texts of a string list joined
+// with " | ", a number in decimal; "<none>" for a missing property.
+std::string PropText(const Ndm_PropertyHolder* holder, const char* name);
+
 // Whole content of a file ("" when it cannot be read).
 std::string ReadFile(const std::string& path);
 
