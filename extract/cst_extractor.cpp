@@ -205,7 +205,8 @@ bool CstExtractor::IsGroupStatementEntry(const char* name, const char* text) {
 
 void CstExtractor::SplitAssignment(const char* name, const char* text, std::string& first,
                                    std::string& second) {
-    std::vector<PString> pieces = PString::Split(PString(text), "=", true, nullptr, nullptr);
+    // Every "=" divides, empty pieces included: "=s = v" and "ag = v=" are three pieces, not two.
+    std::vector<PString> pieces = PString::Split(PString(text), "=", false, nullptr, nullptr);
     if (pieces.size() != 2) Msg(__LINE__).issueFatal(2, "Unexpected Value for %s\n", name);
     first = pieces[0].Trim(" \t").str();
     second = pieces[1].Trim(" \t").str();

@@ -62,7 +62,10 @@ int QuillmapMain(int argc, char** argv) {
 
     try {
         int status = run ? run() : kStatusFatal;
-        if (status == kStatusOk && Port_MsgManData::Count(Port_Severity::Error) > 0) status = kStatusErrors;
+        // An internal error is an error the library found in its own state: it counts as one.
+        if (status == kStatusOk && (Port_MsgManData::Count(Port_Severity::Error) > 0 ||
+                                    Port_MsgManData::Count(Port_Severity::Internal) > 0))
+            status = kStatusErrors;
         return status;
     } catch (const Port_FatalError&) {
         return kStatusFatal;  // the message was delivered when it was issued

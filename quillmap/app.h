@@ -9,6 +9,7 @@ namespace CLI {
 class App;
 }
 class Ndm_Design;
+class Ndm_View;
 
 // Exit statuses of quillmap.
 enum QuillmapStatus { kStatusOk = 0, kStatusErrors = 1, kStatusFatal = 2 };
@@ -21,6 +22,11 @@ struct QuillmapOptions {
 
 // Reads a design file (Yosys JSON netlist or native design file); null after a message.
 std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top);
+
+// The view the subcommands work on: EXPANDED, else the first view; null, after an error
+// naming the file and what the view was wanted for ("annotate"), when there is none with a
+// top block.
+Ndm_View* QuillmapWorkView(Ndm_Design& design, const std::string& path, const char* purpose);
 
 // Each subcommand registers itself and sets run to its action, which returns an exit status.
 using QuillmapAction = std::function<int()>;

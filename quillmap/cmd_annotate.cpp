@@ -48,13 +48,8 @@ std::vector<ConstraintFile> FilesInOrder(const AnnotateArgs& args) {
 int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
     auto design = QuillmapLoadDesign(args.design, args.top);
     if (!design) return kStatusErrors;
-    Ndm_View* view = design->GetViewByName("EXPANDED");
-    if (!view && !design->GetViewItr().empty()) view = design->GetViewItr().front();
-    if (!view || !view->GetBlock()) {
-        Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
-            .issueError("Design '%s' has no view to annotate.\n", args.design.c_str());
-        return kStatusErrors;
-    }
+    Ndm_View* view = QuillmapWorkView(*design, args.design, "annotate");
+    if (!view) return kStatusErrors;
     for (const ConstraintFile& file : FilesInOrder(args)) {
         Ta_LunMgr mgr(file.path.c_str(), file.kind, args.filter.empty() ? nullptr : args.filter.c_str());
         if (args.case_sensitive) mgr.set_case_sensitive(true);

@@ -4,6 +4,7 @@
 #include <sstream>
 #include <iostream>
 
+#include "extract/cst_extractor.h"
 #include "host/design/design_io.h"
 #include "host/design/dump.h"
 #include "host/design/native_format.h"
@@ -18,6 +19,7 @@ struct DesignArgs {
     std::string design;
     std::string top;
     std::string output;
+    bool normalize = false;
 };
 
 void AddDesignArgs(CLI::App* cmd, DesignArgs& args) {
@@ -31,6 +33,15 @@ void AddDesignArgs(CLI::App* cmd, DesignArgs& args) {
 
 std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top) {
     return Ndm_LoadDesign(path.c_str(), top.empty() ? nullptr : top.c_str());
+}
+
+Ndm_View* QuillmapWorkView(Ndm_Design& design, const std::string& path, const char* purpose) {
+    Ndm_View* view = design.GetViewByName("EXPANDED");
+    if (!view && !design.GetViewItr().empty()) view = design.GetViewItr().front();
+    if (view && view->GetBlock()) return view;
+    Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+        .issueError("Design '%s' has no view to %s.\n", path.c_str(), purpose);
+    return nullptr;
 }
 
 static void AddDumpCommand(CLI::App& app, QuillmapAction& run) {
@@ -71,13 +82,26 @@ static void AddConvertCommand(CLI::App& app, QuillmapAction& run) {
         "convert",
         "Save a design as a native design file.\n"
         "Reads a Yosys JSON netlist or a native design file and writes the native form, which keeps\n"
-        "every property and constraint block (see docs/design-format.md).");
+        "every property and constraint block (see docs/design-format.md).\n"
+        "With --normalize, the properties of the blocks and networks of the view EXPANDED (else the\n"
+        "first view) are first rewritten from their netlist form into their constraint-file form:\n"
+        "an integer SLEW 80/20/10 becomes the text FAST/SLOW/QUIETIO, DELAYMODE 0 becomes the flag\n"
+        "NODELAY, the flag FIXED becomes P, and the texts LOG_PICSPEC, LOG_PICSPEED, LOG_VENDOR,\n"
+        "INITSTATE, VL_LEVEL are renamed PICSPEC, PICSPEED, VENDOR, INIT, LEVEL. Another SLEW value\n"
+        "is a fatal error (exit status 2) and nothing is written. `quillmap dump` shows the result.");
     AddDesignArgs(cmd, args);
     cmd->add_option("-o,--output", args.output, "Native design file to write")->required();
+    cmd->add_flag("--normalize", args.normalize,
+                  "Rewrite netlist-form properties into their constraint-file form before saving");
     cmd->callback([&run] {
         run = [] {
             auto design = QuillmapLoadDesign(args.design, args.top);
             if (!design) return static_cast<int>(kStatusErrors);
+            if (args.normalize) {
+                Ndm_View* view = QuillmapWorkView(*design, args.design, "normalize");
+                if (!view) return static_cast<int>(kStatusErrors);
+                CstExtractor().NormalizeProperties(view);
+            }
             return Ndm_WriteNative(*design, args.output.c_str()) ? static_cast<int>(kStatusOk)
                                                                  : static_cast<int>(kStatusErrors);
         };

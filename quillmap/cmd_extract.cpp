@@ -17,7 +17,6 @@ struct ExtractArgs {
     std::string design;
     std::string top;
     std::string output;
-    bool normalize = false;
 };
 
 Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
@@ -25,17 +24,12 @@ Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap",
 int RunExtract(const ExtractArgs& args) {
     auto design = QuillmapLoadDesign(args.design, args.top);
     if (!design) return kStatusErrors;
-    Ndm_View* view = design->GetViewByName("EXPANDED");
-    if (!view && !design->GetViewItr().empty()) view = design->GetViewItr().front();
-    if (!view || !view->GetBlock()) {
-        Msg(__LINE__).issueError("Design '%s' has no view to extract from.\n", args.design.c_str());
-        return kStatusErrors;
-    }
+    Ndm_View* view = QuillmapWorkView(*design, args.design, "extract from");
+    if (!view) return kStatusErrors;
 
     // The text is collected first so that a fatal error leaves neither a partial output file
     // nor partial output on stdout.
     CstExtractor extractor;
-    if (args.normalize) extractor.NormalizeProperties(view);
     std::ostringstream text;
     Port::Stream stream(text);
     extractor.Extract(view, stream);
@@ -67,16 +61,12 @@ void AddExtractCommand(CLI::App& app, QuillmapAction& run) {
         "statement per line ending in \" ;\", and an empty line. Constraints attached to\n"
         "instances, nets and pins are not written.\n"
         "The written blocks are then deleted from the design in memory only; the input file\n"
-        "is never modified. With --normalize, netlist-form properties are first rewritten\n"
-        "(integer SLEW 80/20/10 to FAST/SLOW/QUIETIO, DELAYMODE 0 to NODELAY, FIXED to P,\n"
-        "LOG_PICSPEC, LOG_PICSPEED, LOG_VENDOR, INITSTATE, VL_LEVEL to PICSPEC, PICSPEED,\n"
-        "VENDOR, INIT, LEVEL).\n"
+        "is never modified. To rewrite netlist-form properties (SLEW codes and the like) into\n"
+        "their constraint-file form, use `quillmap convert --normalize`.\n"
         "A fatal error (an unexpected property type or value) writes nothing and exits with\n"
         "status 2. See docs/extraction.md.");
     cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
     cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");
     cmd->add_option("-o,--output", args.output, "Write the constraint text to this file instead of stdout");
-    cmd->add_flag("--normalize", args.normalize,
-                  "Rewrite netlist-form properties into their constraint-file form first");
     cmd->callback([&run] { run = [] { return RunExtract(args); }; });
 }

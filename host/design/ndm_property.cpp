@@ -40,7 +40,9 @@ bool Ndm_Property::AddString(const char* text) {
 Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
     if (type_ != NDM_PROP_LIST) return nullptr;
     entries_.push_back(new Ndm_Property(owner_, type, name));
-    return entries_.back();
+    Ndm_Property* entry = entries_.back();
+    if (index_) index_->try_emplace(entry->name_, entry);
+    return entry;
 }
 
 Ndm_Property* Ndm_Property::CreatePropertyString(const char* name, const char* value) {
@@ -62,15 +64,26 @@ Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
 
 Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
     if (!name) return nullptr;
-    for (Ndm_Property* e : entries_)
-        if (e->name_ == name) return e;
-    return nullptr;
+    if (entries_.size() <= kIndexFrom) {
+        for (Ndm_Property* e : entries_)
+            if (e->name_ == name) return e;
+        return nullptr;
+    }
+    if (!index_) {
+        // Timing lists grow to tens of thousands of entries; look them up by hash.
+        index_ = std::make_unique<std::unordered_map<std::string_view, Ndm_Property*>>();
+        index_->reserve(entries_.size());
+        for (Ndm_Property* e : entries_) index_->try_emplace(e->name_, e);
+    }
+    auto it = index_->find(name);
+    return it == index_->end() ? nullptr : it->second;
 }
 
 bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
     auto it = std::find(entries_.begin(), entries_.end(), entry);
     if (it == entries_.end()) return false;
     entries_.erase(it);
+    index_.reset();  // rebuilt on the next lookup: the first entry of that name may have changed
     delete entry;
     return true;
 }

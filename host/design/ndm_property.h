@@ -5,8 +5,11 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <span>
 #include <string>
+#include <string_view>
+#include <unordered_map>
 #include <vector>
 
 class Ndm_PropertyHolder;
@@ -84,6 +87,10 @@ private:
     std::string text_;
     std::vector<std::string> strings_;
     std::vector<Ndm_Property*> entries_;  // owned
+    // First entry of each name, built by the first lookup in a list of more than kIndexFrom
+    // entries and kept up to date by additions.
+    static constexpr size_t kIndexFrom = 8;
+    mutable std::unique_ptr<std::unordered_map<std::string_view, Ndm_Property*>> index_;
 };
 
 // Kinds of design objects.

@@ -110,8 +110,10 @@ TEST_F(ExtractTest, FatalsNameThePropertyAndLeaveTheDesignWhole) {
          "Unexpected property type found on TIMESPEC block for property TIMESPEC.\n"},
         {[](Ndm_Block* t) { List(Block(t, "c", "CONFIG"), "MODE", {"a = b = c"}); },
          "Unexpected Value for MODE\n"},
-        {[](Ndm_Block* t) { List(Block(t, "c", "CONFIG"), "RLOC_ORIGIN", {"= x"}); },
+        // an empty piece before a leading or after a trailing "=" is a piece too
+        {[](Ndm_Block* t) { List(Block(t, "c", "CONFIG"), "RLOC_ORIGIN", {"=s = x"}); },
          "Unexpected Value for RLOC_ORIGIN\n"},
+        {[](Ndm_Block* t) { List(Block(t, "c", "CONFIG"), "RANGE", {"ag = A:B="}); }, "Unexpected Value for RANGE\n"},
         {[](Ndm_Block* t) { Block(t, "c", "CONFIG")->CreatePropertyString("RLOC_RANGE", "X0Y0"); },
          "Unexpected Value for RLOC_RANGE\n"},
     };

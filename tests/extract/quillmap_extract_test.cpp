@@ -24,10 +24,21 @@ TEST_F(ExtractTest, QuillmapExtractToStdoutAndFile) {
 
     ASSERT_EQ(RunCommand(exe + in, &out, &err), 0) << err;
     EXPECT_EQ(out, "// Global Constraints\nCONFIG PROHIBIT = P1 ;\nCONFIG SLEW = 80 ;\n" + tail);
-    ASSERT_EQ(RunCommand(exe + "--normalize -o " + file + " " + in, &out, &err), 0) << err;
+    EXPECT_EQ(ReadFile(in), before);  // blocks are deleted in memory only
+
+    // Normalization is part of saving a design: convert --normalize, then dump or extract.
+    Ndm_Network* q = view->CreateNetwork();
+    q->AddSignal(top->CreateSignal("q"));
+    q->CreatePropertyInt32("SLEW", 20);
+    ASSERT_TRUE(Ndm_WriteNative(design, in.c_str()));
+    std::string norm = dir.path() + "/norm.qdf";
+    ASSERT_EQ(RunCommand(std::string(QUILLMAP_EXE) + " convert --normalize " + in + " -o " + norm, &out, &err), 0)
+        << err;
+    ASSERT_EQ(RunCommand(std::string(QUILLMAP_EXE) + " dump " + norm, &out, &err), 0) << err;
+    EXPECT_NE(out.find("  network \"q\" signals 1\n    % \"SLEW\" string \"SLOW\"\n"), std::string::npos) << out;
+    ASSERT_EQ(RunCommand(exe + "-o " + file + " " + norm, &out, &err), 0) << err;
     EXPECT_EQ(out, "");
     EXPECT_EQ(ReadFile(file), "// Global Constraints\nCONFIG PROHIBIT = P1 ;\nCONFIG SLEW = FAST ;\n" + tail);
-    EXPECT_EQ(ReadFile(in), before);  // blocks are deleted in memory only
 
     // A fatal error: exit status 2, no output and no file.
     Block(top, "bad", "TIMEGRP")->CreatePropertyBool("ODD");
