@@ -1,6 +1,7 @@
 // Annotation speed: a flat design of N cells (each with four pins and one output net) and a
 // constraint file of 10,000 exact-name statements and 1,000 wildcard statements. Exact-name
-// statements should cost the same on 100,000 and 1,000,000 cells.
+// statements should cost the same on 100,000 and 1,000,000 cells. Group offsets: the cost of a
+// file of N "TIMEGRP gN OFFSET" statements must grow linearly with N.
 #include <benchmark/benchmark.h>
 
 #include <chrono>
@@ -77,6 +78,31 @@ void Annotate(benchmark::State& state, bool wildcards) {
     std::remove(file.c_str());
 }
 
+// N group offsets, each a new timing entry whose name is tested against the entries before
+// it: the test must use an index (target: 100,000 in well under a second).
+void BM_GroupOffsets(benchmark::State& state) {
+    const int count = static_cast<int>(state.range(0));
+    std::string file = "/tmp/lun_annotate_bench_offsets.ucf";
+    {
+        std::ofstream out(file);
+        for (int i = 0; i < count; ++i) out << "TIMEGRP g" << i << " OFFSET = IN 1 ns BEFORE clk;\n";
+    }
+    Port_MsgCapture quiet;
+    for (auto _ : state) {
+        state.PauseTiming();
+        auto design = MakeDesign(1);
+        state.ResumeTiming();
+        Ta_LunMgr mgr(file.c_str(), CP_UCF, nullptr);
+        mgr.annotate(design->GetViewByName("EXPANDED"));
+        state.PauseTiming();
+        design.reset();
+        state.ResumeTiming();
+    }
+    state.counters["statements_per_s"] =
+        benchmark::Counter(static_cast<double>(count), benchmark::Counter::kIsIterationInvariantRate);
+    std::remove(file.c_str());
+}
+
 void BM_ExactNames(benchmark::State& state) { Annotate(state, false); }
 void BM_WildcardNames(benchmark::State& state) { Annotate(state, true); }
 
@@ -84,4 +110,5 @@ void BM_WildcardNames(benchmark::State& state) { Annotate(state, true); }
 
 BENCHMARK(BM_ExactNames)->Arg(100000)->Arg(1000000)->Unit(benchmark::kMillisecond)->Iterations(3);
 BENCHMARK(BM_WildcardNames)->Arg(100000)->Arg(1000000)->Unit(benchmark::kMillisecond)->Iterations(3);
+BENCHMARK(BM_GroupOffsets)->Arg(20000)->Arg(100000)->Unit(benchmark::kMillisecond)->Iterations(3);
 BENCHMARK_MAIN();
