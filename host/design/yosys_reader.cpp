@@ -80,6 +80,7 @@ struct Module {
     std::vector<int32_t> signal_bit;         // per signal: local bit id, or -1 for a constant
     std::vector<int32_t> bit_signal;         // per local bit id: first signal carrying it, or -1
     std::vector<uint32_t> signal_order;      // signals in the order they join networks
+    std::vector<uint8_t> pad_only;           // top module: port bits that get a network of their own
     Ndm_PtrMap port_index;                   // port name -> index + 1
     int state = 0;                           // for the instantiation cycle check
     bool instantiated = false;
@@ -173,6 +174,7 @@ private:
     bool Expand(Ndm_Block* block, uint32_t module, uint32_t base);
     void TopPins(Ndm_Block* block, uint32_t module);
     void Networks(Ndm_View* view);
+    void PadBoundary(Module& m);
     void SignalOrder(Module& m);
 
     const char* path_;
@@ -787,6 +789,9 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
 // Within a block, the bits of port names join first, then other public names, then generated
 // ("$...") names: the first of the top-most signals to join names the network, so a net that
 // reaches a port is named after the port.
+//
+// Top-level port bits that share a local bit with another port bit get networks of their own
+// (see PadBoundary).
 void Reader::Networks(Ndm_View* view) {
     constexpr uint32_t kNone = UINT32_MAX;
     std::vector<uint32_t> network_of_root(parent_.size(), kNone);
@@ -794,9 +799,14 @@ void Reader::Networks(Ndm_View* view) {
         Module& m = modules_[inst.module];
         if (m.signal_order.size() != m.num_signals) SignalOrder(m);
         std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
+        const bool pads = &inst == &instances_.front() && !m.pad_only.empty();
         for (uint32_t s : m.signal_order) {
             int32_t bit = m.signal_bit[s];
             if (bit < 0) continue;
+            if (pads && m.pad_only[s]) {
+                view->CreateNetwork()->AddSignal(signals[s]);
+                continue;
+            }
             uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
             uint32_t& index = network_of_root[root];
             if (index == kNone) {
@@ -805,6 +815,39 @@ void Reader::Networks(Ndm_View* view) {
             }
             view->GetNetworkItr()[index]->AddSignal(signals[s]);
         }
+    }
+}
+
+// The pad boundary of the top module: each top-level port bit is a pad of its own. When one
+// local bit carries several port bits (assign y = x), one keeps the net: the first input (or
+// inout) port bit, else the first port bit, in stored order. The others are marked in
+// m.pad_only and will each get a network holding only their own signal, so that the pad
+// constraints given to each port (LOC, IOSTANDARD, ...) stay its own; cell pins on the bit
+// connect to the signal that keeps the net.
+void Reader::PadBoundary(Module& m) {
+    std::vector<uint8_t> kind(m.num_signals, 0);  // 1 port bit, 2 input or inout port bit
+    for (size_t n = 0; n < m.nets.size(); ++n) {
+        const Port* p = FindPort(m, m.nets[n].name);
+        if (!p) continue;
+        uint8_t k = p->dir == Ndm_Dir::Input || p->dir == Ndm_Dir::Inout ? 2 : 1;
+        for (uint32_t i = 0; i < m.nets[n].bits.count; ++i) kind[m.net_first_signal[n] + i] = k;
+    }
+    std::vector<int32_t> keeper(m.num_bits, -1);
+    bool shared = false;
+    for (uint32_t s = 0; s < m.num_signals; ++s) {
+        int32_t bit = m.signal_bit[s];
+        if (!kind[s] || bit < 0) continue;
+        int32_t& k = keeper[bit];
+        if (k >= 0) shared = true;
+        if (k < 0 || (kind[k] == 1 && kind[s] == 2)) k = static_cast<int32_t>(s);
+    }
+    if (!shared) return;
+    m.pad_only.assign(m.num_signals, 0);
+    for (uint32_t s = 0; s < m.num_signals; ++s) {
+        int32_t bit = m.signal_bit[s];
+        if (!kind[s] || bit < 0 || keeper[bit] == static_cast<int32_t>(s)) continue;
+        m.pad_only[s] = 1;
+        if (m.bit_signal[bit] == static_cast<int32_t>(s)) m.bit_signal[bit] = keeper[bit];
     }
 }
 
@@ -840,6 +883,7 @@ bool Reader::Build(const char* top_module) {
     Ndm_View* view = design_.CreateView("EXPANDED");
     Ndm_Block* block = view->CreateTopBlock(m.name);
     block->SetTypeName(m.name);
+    PadBoundary(modules_[top]);
     if (!Expand(block, top, Alloc(m.num_bits))) return false;
     TopPins(block, top);
     Networks(view);
