@@ -7,6 +7,7 @@
 #include <cstring>
 #include <numeric>
 #include <type_traits>
+#include <unordered_map>
 #include <string>
 #include <vector>
 
@@ -80,6 +81,7 @@ struct Module {
     std::vector<int32_t> signal_bit;         // per signal: local bit id, or -1 for a constant
     std::vector<int32_t> bit_signal;         // per local bit id: first signal carrying it, or -1
     std::vector<uint32_t> signal_order;      // signals in the order they join networks
+    std::vector<uint8_t> port_kind;          // top module, per signal: 1 port bit, 2 input/inout port bit
     std::vector<uint8_t> pad_only;           // top module: port bits that get a network of their own
     Ndm_PtrMap port_index;                   // port name -> index + 1
     int state = 0;                           // for the instantiation cycle check
@@ -791,23 +793,32 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
 // reaches a port is named after the port.
 //
 // Top-level port bits that share a local bit with another port bit get networks of their own
-// (see PadBoundary).
+// (see PadBoundary); so do port bits joined to another one only through a submodule (a wire
+// from an input port to an output port inside a cell), the first input bit keeping the net.
 void Reader::Networks(Ndm_View* view) {
     constexpr uint32_t kNone = UINT32_MAX;
     std::vector<uint32_t> network_of_root(parent_.size(), kNone);
+    std::unordered_map<uint32_t, uint32_t> keeper;  // net (root) -> the top port signal keeping it
     for (const Instance& inst : instances_) {
         Module& m = modules_[inst.module];
         if (m.signal_order.size() != m.num_signals) SignalOrder(m);
         std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
-        const bool pads = &inst == &instances_.front() && !m.pad_only.empty();
+        const bool top = &inst == &instances_.front() && !m.pad_only.empty();
+        if (top) {
+            for (uint32_t s : m.signal_order) {
+                if (!m.port_kind[s] || m.pad_only[s] || m.signal_bit[s] < 0) continue;
+                auto [it, fresh] = keeper.try_emplace(Find(inst.base + static_cast<uint32_t>(m.signal_bit[s])), s);
+                if (!fresh && m.port_kind[it->second] == 1 && m.port_kind[s] == 2) it->second = s;
+            }
+        }
         for (uint32_t s : m.signal_order) {
             int32_t bit = m.signal_bit[s];
             if (bit < 0) continue;
-            if (pads && m.pad_only[s]) {
+            uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
+            if (top && m.port_kind[s] && (m.pad_only[s] || keeper[root] != s)) {
                 view->CreateNetwork()->AddSignal(signals[s]);
                 continue;
             }
-            uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
             uint32_t& index = network_of_root[root];
             if (index == kNone) {
                 index = static_cast<uint32_t>(view->GetNumNetworks());
@@ -825,7 +836,8 @@ void Reader::Networks(Ndm_View* view) {
 // constraints given to each port (LOC, IOSTANDARD, ...) stay its own; cell pins on the bit
 // connect to the signal that keeps the net.
 void Reader::PadBoundary(Module& m) {
-    std::vector<uint8_t> kind(m.num_signals, 0);  // 1 port bit, 2 input or inout port bit
+    std::vector<uint8_t>& kind = m.port_kind;
+    kind.assign(m.num_signals, 0);
     for (size_t n = 0; n < m.nets.size(); ++n) {
         const Port* p = FindPort(m, m.nets[n].name);
         if (!p) continue;
@@ -841,8 +853,8 @@ void Reader::PadBoundary(Module& m) {
         if (k >= 0) shared = true;
         if (k < 0 || (kind[k] == 1 && kind[s] == 2)) k = static_cast<int32_t>(s);
     }
-    if (!shared) return;
     m.pad_only.assign(m.num_signals, 0);
+    if (!shared) return;
     for (uint32_t s = 0; s < m.num_signals; ++s) {
         int32_t bit = m.signal_bit[s];
         if (!kind[s] || bit < 0 || keeper[bit] == static_cast<int32_t>(s)) continue;
