@@ -4,10 +4,13 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace CLI {
 class App;
 }
+class Ndm_Block;
 class Ndm_Design;
 class Ndm_View;
 
@@ -34,5 +37,18 @@ void AddDesignCommands(CLI::App& app, QuillmapAction& run);
 void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
 void AddExtractCommand(CLI::App& app, QuillmapAction& run);
 void AddPartCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
+
+// Part reading, shared by annotate and part (cmd_part.cpp).
+// Runs the part reader over a UCF, keeping only its PART, as a host does before annotating.
+void QuillmapReadUcfPart(Ndm_View* view, const std::string& file, const std::string& filter, bool debug);
+// The PART texts of the view's CONFIG blocks, in preorder of the blocks.
+std::vector<std::pair<const Ndm_Block*, std::string>> QuillmapPartsOf(const Ndm_View* view);
+// Where a part was named: a file (or design) and the part.
+struct QuillmapPartSource {
+    std::string source;
+    std::string part;
+};
+// One warning naming every source when they name different parts.
+void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts);
 
 int QuillmapMain(int argc, char** argv);

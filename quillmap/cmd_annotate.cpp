@@ -1,5 +1,6 @@
 // The annotate subcommand: runs the constraint files over a design and saves the result.
 #include <CLI/CLI.hpp>
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -50,7 +51,14 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
     if (!design) return kStatusErrors;
     Ndm_View* view = QuillmapWorkView(*design, args.design, "annotate");
     if (!view) return kStatusErrors;
+    // Which file named which part: the parts already in the design, then each file's new one.
+    std::vector<QuillmapPartSource> parts;
+    auto before = QuillmapPartsOf(view);
+    for (const auto& [block, part] : before) parts.push_back({args.design, part});
     for (const ConstraintFile& file : FilesInOrder(args)) {
+        // A host learns the part of a UCF from the part reader (the manager passes over it);
+        // in a second pass the first pass has stored it already.
+        if (file.kind == CP_UCF && !args.second_pass) QuillmapReadUcfPart(view, file.path, args.filter, options.debug);
         Ta_LunMgr mgr(file.path.c_str(), file.kind, args.filter.empty() ? nullptr : args.filter.c_str());
         if (args.case_sensitive) mgr.set_case_sensitive(true);
         if (args.case_insensitive) mgr.set_case_sensitive(false);
@@ -60,7 +68,12 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
             mgr.set_best_effort(1, args.best_effort.empty() ? "DEFAULT" : args.best_effort.c_str());
         if (args.allow_unmatched_locs) mgr.AllowUnmatchedLocs();
         mgr.annotate(view);
+        auto after = QuillmapPartsOf(view);
+        for (const auto& entry : after)
+            if (std::find(before.begin(), before.end(), entry) == before.end()) parts.push_back({file.path, entry.second});
+        before = std::move(after);
     }
+    QuillmapWarnDifferentParts(parts);
     if (!args.output.empty() && !Ndm_WriteNative(*design, args.output.c_str())) return kStatusErrors;
     return kStatusOk;
 }
@@ -75,7 +88,13 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
         "The files are applied in the order given. Every INST, NET and PIN statement puts its\n"
         "constraints on the objects it names; timing specifications, groups and global\n"
         "settings go to constraint blocks. Unmatched names, illegal values and conflicts are\n"
-        "reported with the file name and line.");
+        "reported with the file name and line.\n"
+        "Before the annotator reads a UCF, the part reader takes its CONFIG PART (and the PART\n"
+        "constraints of its INST, NET and PIN statements) onto the UCF's CONFIG block, so that the\n"
+        "saved design carries the target part; an NCF's PART is stored by the annotator itself, on\n"
+        "the NCF's CONFIG block. When the files (or the design) name different parts, each is\n"
+        "kept on its own block and a warning names them all; a second PART for the same block is\n"
+        "a fatal error. --second-pass reads no part.");
     args.cmd = cmd;
     cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
     cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");
