@@ -34,6 +34,21 @@ bool IsByteEscapeCodePoint(const char* p) {
 
 }  // namespace
 
+std::string Port_DecodeByteEscapes(std::string_view utf8) {
+    std::string out;
+    out.reserve(utf8.size());
+    for (size_t i = 0; i < utf8.size(); ++i) {
+        if (i + 2 < utf8.size() && IsByteEscapeCodePoint(utf8.data() + i)) {
+            out += static_cast<char>(0x80 + ((static_cast<unsigned char>(utf8[i + 1]) - 0x9E) << 6) +
+                                     (static_cast<unsigned char>(utf8[i + 2]) - 0x80));
+            i += 2;
+        } else {
+            out += utf8[i];
+        }
+    }
+    return out;
+}
+
 void Port_AppendJsonString(std::string& out, std::string_view text) {
     out += '"';
     size_t run = 0;  // start of the current run of bytes copied as they are

@@ -1,6 +1,7 @@
 // The native design file: lossless round trips, detection by content, damaged files; and the
 // text dump.
 #include <gtest/gtest.h>
+#include <simdjson.h>
 
 #include <cmath>
 #include <cstring>
@@ -16,6 +17,13 @@ namespace {
 using design_test::DumpText;
 using design_test::ReadAll;
 using design_test::TempDir;
+
+// Every byte but NUL, then a real U+F7E9 (which stands for a byte in the file) and a euro sign.
+std::string AllBytes() {
+    std::string text;
+    for (int b = 1; b < 256; ++b) text += static_cast<char>(b);
+    return text + "\xef\x9f\xa9\xe2\x82\xac";
+}
 
 // A design using every kind of object and property, with awkward names and values.
 std::unique_ptr<Ndm_Design> Sample() {
@@ -59,6 +67,11 @@ std::unique_ptr<Ndm_Design> Sample() {
     texts->AddString("b\"q");
     a->GetPinByName("O")->CreatePropertyInt32("slack", -7);
     n->CreatePropertyFloat64("period", 2.5e-9);
+    // Constraint files are bytes: Latin-1 names and values must come back exactly.
+    Ndm_Block* latin = top->CreateBlock("r\xe9g\xff");
+    latin->CreateSignal(AllBytes().c_str());
+    latin->CreatePropertyString(("LOC\xe9" + AllBytes()).c_str(), AllBytes().c_str());
+    latin->CreatePropertyStringList("TNM")->AddString(AllBytes().c_str());
     return d;
 }
 
@@ -71,7 +84,14 @@ TEST(NativeDesignFile, RoundTripIsLosslessAndByteStable) {
     ASSERT_TRUE(again);
     ASSERT_TRUE(Ndm_WriteNative(*again, second.c_str()));
     EXPECT_EQ(ReadAll(first), ReadAll(second));
+    EXPECT_TRUE(simdjson::validate_utf8(ReadAll(first)));
     EXPECT_EQ(DumpText(*design), DumpText(*again));
+    Ndm_Block* latin = again->GetViewByName("EXPANDED")->GetBlock()->GetBlockByName("r\xe9g\xff");
+    ASSERT_NE(latin, nullptr);
+    EXPECT_NE(latin->GetSignalByName(AllBytes().c_str()), nullptr);
+    ASSERT_NE(latin->GetPropertyByName(("LOC\xe9" + AllBytes()).c_str()), nullptr);
+    EXPECT_EQ(latin->GetPropertyByName(("LOC\xe9" + AllBytes()).c_str())->GetValueString(), AllBytes());
+    EXPECT_EQ(latin->GetPropertyByName("TNM")->GetStrings().at(0), AllBytes());
 
     // The dump shows every object, link and value (floats to 17 digits); these read the values
     // it can only print as text.

@@ -124,6 +124,19 @@ TEST(DesignDatabase, PropertiesReplaceInPlaceAndListsKeepDuplicates) {
     EXPECT_STREQ(list->GetEntryByName("OFFSET")->GetValueString(), "OUT 3 ns");
     EXPECT_EQ(t.top->CreatePropertyInt32("x", 1)->CreatePropertyInt32("y", 2), nullptr);
 
+    // Long lists answer from a hash index, which must keep "first of that name" through
+    // additions and deletions.
+    Ndm_Property* big = t.top->CreatePropertyList("BIG");
+    std::vector<Ndm_Property*> firsts;
+    for (int i = 0; i < 40; ++i) firsts.push_back(big->CreatePropertyString(("e" + std::to_string(i % 20)).c_str(), "v"));
+    EXPECT_EQ(big->GetEntryByName("e7"), firsts[7]);
+    Ndm_Property* late = big->CreatePropertyString("late", "v");
+    EXPECT_EQ(big->GetEntryByName("late"), late);
+    EXPECT_TRUE(big->DeleteEntry(firsts[7]));
+    EXPECT_EQ(big->GetEntryByName("e7"), firsts[27]);
+    EXPECT_EQ(big->GetEntryByName("nosuch"), nullptr);
+    t.top->DeleteProperty("BIG");
+
     EXPECT_TRUE(t.top->DeleteProperty("a"));
     EXPECT_FALSE(t.top->DeleteProperty("a"));
     EXPECT_EQ(t.top->GetNumProperties(), 4);  // b, c, TIMING, x

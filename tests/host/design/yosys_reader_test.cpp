@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <map>
 #include <string>
 
 #include "design_test_util.h"
@@ -220,6 +221,43 @@ TEST(YosysReader, NamesBitOrderHiddenAndConstantNets) {
     EXPECT_EQ(order, (std::vector<std::string>{"d[4]", "d[5]", "u[1]", "u[0]", "alias[0]"}));
     EXPECT_EQ(NetworkMembers(top->GetSignalByName("d[4]")->GetNetwork()),
               (std::vector<std::string>{"d[4]", "alias[1]"}));
+}
+
+// Two outputs copying one input in the top module, and an input wired to an output through a
+// submodule: every top-level port bit keeps a network (a pad) of its own.
+constexpr const char* kSharedPorts = R"({"modules": {
+  "pass": {"ports": {"a": {"direction": "input", "bits": [2]}, "b": {"direction": "output", "bits": [2]}},
+           "cells": {}, "netnames": {"a": {"bits": [2]}, "b": {"bits": [2]}}},
+  "top": {"attributes": {"top": 1},
+    "ports": {"a_copy": {"direction": "output", "bits": [2]}, "sys_clk": {"direction": "input", "bits": [2]},
+              "b_copy": {"direction": "output", "bits": [2]}, "x": {"direction": "input", "bits": [3]},
+              "y": {"direction": "output", "bits": [4]}},
+    "cells": {"ff": {"type": "$_DFF_P_", "port_directions": {"C": "input", "D": "input"},
+                     "connections": {"C": [2], "D": [4]}},
+              "u": {"type": "pass", "connections": {"a": [3], "b": [4]}}},
+    "netnames": {"a_copy": {"bits": [2]}, "b_copy": {"bits": [2]}, "internal": {"bits": [2]},
+                 "sys_clk": {"bits": [2]}, "x": {"bits": [3]}, "y": {"bits": [4]}}}
+}})";
+
+TEST(YosysReader, EveryTopPortBitIsAPadOfItsOwn) {
+    TempDir dir;
+    auto design = Ndm_ReadYosysJson(dir.Write("pads.json", kSharedPorts).c_str(), nullptr);
+    ASSERT_TRUE(design);
+    Ndm_View* view = design->GetViewByName("EXPANDED");
+    std::map<std::string, std::vector<std::string>> nets;
+    for (const Ndm_Network* n : view->GetNetworkItr()) nets[n->GetFullName()] = NetworkMembers(n);
+    const std::map<std::string, std::vector<std::string>> expected = {
+        {"sys_clk", {"sys_clk", "internal"}},  // the input keeps the net
+        {"a_copy", {"a_copy"}},
+        {"b_copy", {"b_copy"}},
+        {"x", {"x", "u/a", "u/b"}},
+        {"y", {"y"}},  // joined to x only inside u
+    };
+    EXPECT_EQ(nets, expected);
+    Ndm_Block* top = view->GetBlock();
+    EXPECT_EQ(top->GetBlockByName("ff")->GetPinByName("C")->GetSignal(), top->GetSignalByName("sys_clk"));
+    EXPECT_EQ(top->GetPinByName("a_copy")->GetSignal(), top->GetSignalByName("a_copy"));
+    EXPECT_EQ(top->GetPinByName("y")->GetSignal(), top->GetSignalByName("y"));
 }
 
 constexpr const char* kTwoRoots = R"({"modules": {

@@ -1,5 +1,6 @@
 // Portability layer: string helpers, formatting, the host string, messages, atomic files.
 #include <gtest/gtest.h>
+#include <simdjson.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -9,6 +10,7 @@
 
 #include "host/port/env.h"
 #include "host/port/file.h"
+#include "host/port/json_text.h"
 #include "host/port/msgman.h"
 #include "host/port/string_base.h"
 #include "host/port/ut_str.h"
@@ -162,6 +164,40 @@ TEST(MessageTest, JsonLinesEscapeText) {
     EXPECT_EQ(line,
               "{\"severity\":\"internal_error\",\"program\":\"Quillmap\",\"module\":\"lunmgr\","
               "\"code\":2,\"text\":\"a \\\"q\\\"\\\\\\n\\u0001\"}\n");
+}
+
+// Any byte string becomes a valid UTF-8 JSON string that a strict parser accepts and that
+// decodes back to the same bytes through the byte escapes.
+TEST(JsonTextTest, AnyBytesGiveValidJson) {
+    struct Case {
+        std::string bytes, literal;
+    } cases[] = {
+        {"plain", "\"plain\""},
+        {"P\xe9" "1", "\"P\\uf7e91\""},                   // Latin-1 byte
+        {"caf\xc3\xa9", "\"caf\xc3\xa9\""},                // valid UTF-8 stays as it is
+        {"\xf0\x9f\x98\x80", "\"\xf0\x9f\x98\x80\""},  // four-byte sequence
+        {"\xc3", "\"\\uf7c3\""},                         // cut sequence
+        {"\xc0\xaf", "\"\\uf7c0\\uf7af\""},              // overlong form
+        {"\xed\xa0\x80", "\"\\uf7ed\\uf7a0\\uf780\""},  // surrogate
+        {"\xef\x9f\xa9", "\"\\uf7ef\\uf79f\\uf7a9\""},  // a real U+F7E9 is escaped bytewise
+        {"\xef\x9d\xbf", "\"\xef\x9d\xbf\""},            // U+F77F is outside the escape range
+        {std::string("a\0b\x7f", 4), "\"a\\u0000b\\u007f\""},
+    };
+    for (const Case& c : cases) {
+        std::string out;
+        Port_AppendJsonString(out, c.bytes);
+        EXPECT_EQ(out, c.literal);
+    }
+    std::string all;
+    for (int b = 0; b < 256; ++b) all += static_cast<char>(b);
+    all += "\xef\x9e\x80\xe2\x82\xac";
+    std::string literal;
+    Port_AppendJsonString(literal, all);
+    simdjson::dom::parser parser;
+    std::string_view decoded;
+    ASSERT_EQ(parser.parse(simdjson::padded_string(literal)).get(decoded), simdjson::SUCCESS);
+    std::string back = Port_DecodeByteEscapes(decoded);
+    EXPECT_EQ(back, all);
 }
 
 TEST(FileTest, AtomicFileLeavesNothingHalfWritten) {
