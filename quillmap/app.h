@@ -13,6 +13,7 @@ class App;
 class Ndm_Block;
 class Ndm_Design;
 class Ndm_View;
+class Pr_FileText;
 
 // Exit statuses of quillmap.
 enum QuillmapStatus { kStatusOk = 0, kStatusErrors = 1, kStatusFatal = 2 };
@@ -39,8 +40,10 @@ void AddExtractCommand(CLI::App& app, QuillmapAction& run);
 void AddPartCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
 
 // Part reading, shared by annotate and part (cmd_part.cpp).
-// Runs the part reader over a UCF, keeping only its PART, as a host does before annotating.
-void QuillmapReadUcfPart(Ndm_View* view, const std::string& file, const std::string& filter, bool debug);
+// Runs the part reader over a UCF (its text read beforehand), keeping only its PART, as a host
+// does before annotating.
+void QuillmapReadUcfPart(Ndm_View* view, const std::string& file, std::shared_ptr<const Pr_FileText> text,
+                         const std::string& filter, bool debug);
 // The PART texts of the view's CONFIG blocks, in preorder of the blocks.
 std::vector<std::pair<const Ndm_Block*, std::string>> QuillmapPartsOf(const Ndm_View* view);
 // Where a part was named: a file (or design) and the part.
@@ -48,7 +51,8 @@ struct QuillmapPartSource {
     std::string source;
     std::string part;
 };
-// One warning naming every source when they name different parts.
-void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts);
+// One warning naming every source when they name different parts, and the parts a design
+// keeps in the end (none given: files read on their own).
+void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts, const std::vector<std::string>& kept);
 
 int QuillmapMain(int argc, char** argv);

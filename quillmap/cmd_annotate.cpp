@@ -56,10 +56,15 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
     auto before = QuillmapPartsOf(view);
     for (const auto& [block, part] : before) parts.push_back({args.design, part});
     for (const ConstraintFile& file : FilesInOrder(args)) {
+        // The file is read once and both readers parse that text, so a pipe works too; when it
+        // cannot be read, the annotator reports it.
+        std::shared_ptr<const Pr_FileText> text = Pr_FileText::Read(file.path.c_str());
         // A host learns the part of a UCF from the part reader (the manager passes over it);
         // in a second pass the first pass has stored it already.
-        if (file.kind == CP_UCF && !args.second_pass) QuillmapReadUcfPart(view, file.path, args.filter, options.debug);
+        if (text && file.kind == CP_UCF && !args.second_pass)
+            QuillmapReadUcfPart(view, file.path, text, args.filter, options.debug);
         Ta_LunMgr mgr(file.path.c_str(), file.kind, args.filter.empty() ? nullptr : args.filter.c_str());
+        mgr.set_text(std::move(text));
         if (args.case_sensitive) mgr.set_case_sensitive(true);
         if (args.case_insensitive) mgr.set_case_sensitive(false);
         if (args.second_pass) mgr.set_second_pass(true);
@@ -73,7 +78,9 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
             if (std::find(before.begin(), before.end(), entry) == before.end()) parts.push_back({file.path, entry.second});
         before = std::move(after);
     }
-    QuillmapWarnDifferentParts(parts);
+    std::vector<std::string> kept;
+    for (const auto& entry : before) kept.push_back(entry.second);
+    QuillmapWarnDifferentParts(parts, kept);
     if (!args.output.empty() && !Ndm_WriteNative(*design, args.output.c_str())) return kStatusErrors;
     return kStatusOk;
 }
@@ -92,9 +99,10 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
         "Before the annotator reads a UCF, the part reader takes its CONFIG PART (and the PART\n"
         "constraints of its INST, NET and PIN statements) onto the UCF's CONFIG block, so that the\n"
         "saved design carries the target part; an NCF's PART is stored by the annotator itself, on\n"
-        "the NCF's CONFIG block. When the files (or the design) name different parts, each is\n"
-        "kept on its own block and a warning names them all; a second PART for the same block is\n"
-        "a fatal error. --second-pass reads no part.");
+        "the first CONFIG block it finds (the UCF's, when a UCF came first), replacing a part there.\n"
+        "When the files (or the design) name different parts, a warning names them all and the\n"
+        "parts the design keeps; a second CONFIG PART in one UCF, or in a UCF annotated onto a\n"
+        "design that holds a UCF part, is a fatal error. --second-pass reads no part.");
     args.cmd = cmd;
     cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
     cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");

@@ -6,7 +6,6 @@
 
 #include "extract/cst_extractor.h"
 #include "host/design/ndm.h"
-#include "host/port/file.h"
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 #include "part/lunpart.h"
@@ -17,16 +16,44 @@ namespace {
 Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
 
 // The part reader as annotate runs it ahead of the manager over a UCF: it keeps only the PART
-// (the manager passes over a UCF's PART and stores every other CONFIG setting itself), and is
-// silent about parse errors, which the manager reports.
+// (the manager passes over a UCF's PART and stores every other CONFIG setting itself), is
+// silent about parse errors, which the manager reports, and warns when the PART constraint of
+// an INST, NET or PIN statement replaces a different part read before.
 class UcfPartReader : public Ta_LunPart {
 public:
     using Ta_LunPart::Ta_LunPart;
     bool cb_config(const char* name, const char* value, const Pr_Logical_ConstraintHandle* handle) override {
         return UT_STR::ICompare(name, "PART") != 0 || Ta_LunPart::cb_config(name, value, handle);
     }
+    bool cb_comp(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override {
+        return Watch(handle, [&] { return Ta_LunPart::cb_comp(defn, handle); });
+    }
+    bool cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override {
+        return Watch(handle, [&] { return Ta_LunPart::cb_net(defn, handle); });
+    }
+    bool cb_pin(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override {
+        return Watch(handle, [&] { return Ta_LunPart::cb_pin(defn, handle); });
+    }
     bool cb_error(int, int, const char*) override { return true; }
     bool cb_syntax_error(int, int, const char*, const Pr_Logical_ConstraintHandle*) override { return true; }
+
+private:
+    std::string Part() {
+        Ndm_Block* config = view && view->GetBlock() ? FindConstraintBlock(view->GetBlock(), "CONFIG") : nullptr;
+        const Ndm_Property* part = config ? config->GetPropertyByName("PART") : nullptr;
+        return part && part->GetValueString() ? part->GetValueString() : "";
+    }
+    template <class F>
+    bool Watch(const Pr_Logical_ConstraintHandle* handle, F&& handle_statement) {
+        std::string before = Part();
+        bool ok = handle_statement();
+        std::string after = Part();
+        if (!before.empty() && after != before)
+            Msg(__LINE__).issueWarning("Line %i in '%s': PART = %s replaces the part %s read before.\n",
+                                       handle ? handle->getline() : 0, constraint_filename, after.c_str(),
+                                       before.c_str());
+        return ok;
+    }
 };
 
 bool IsConfigBlock(const Ndm_Block* b) {
@@ -89,7 +116,7 @@ int RunPart(const PartArgs& args, const QuillmapOptions& options) {
         }
     }
     if (parts.empty()) Msg(__LINE__).issueWarning("No PART setting found in the constraint files.\n");
-    QuillmapWarnDifferentParts(parts);
+    QuillmapWarnDifferentParts(parts, {});
     for (const std::string& line : out) std::cout << line << "\n";
     std::cout.flush();
     return kStatusOk;
@@ -97,9 +124,10 @@ int RunPart(const PartArgs& args, const QuillmapOptions& options) {
 
 }  // namespace
 
-void QuillmapReadUcfPart(Ndm_View* view, const std::string& file, const std::string& filter, bool debug) {
-    if (!Port::File::exist(file.c_str())) return;  // the manager reports a missing file
+void QuillmapReadUcfPart(Ndm_View* view, const std::string& file, std::shared_ptr<const Pr_FileText> text,
+                         const std::string& filter, bool debug) {
     UcfPartReader reader(file.c_str(), CP_UCF, filter.empty() ? nullptr : filter.c_str());
+    reader.set_text(std::move(text));
     if (debug) reader.set_debug_callbacks();
     reader.annotate(view);
 }
@@ -121,14 +149,19 @@ std::vector<std::pair<const Ndm_Block*, std::string>> QuillmapPartsOf(const Ndm_
     return parts;
 }
 
-void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts) {
+void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts, const std::vector<std::string>& kept) {
     bool differ = false;
     for (const QuillmapPartSource& p : parts) differ = differ || p.part != parts.front().part;
     if (!differ) return;
-    std::string list;
+    std::string list, after;
     for (const QuillmapPartSource& p : parts)
         list += (list.empty() ? "" : ", ") + ("PART = " + p.part + " in '" + p.source + "'");
-    Msg(__LINE__).issueWarning("The constraint files name different parts: %s.\n", list.c_str());
+    for (const std::string& part : kept) after += (after.empty() ? "" : ", ") + ("PART = " + part);
+    if (kept.empty())
+        Msg(__LINE__).issueWarning("The constraint files name different parts: %s.\n", list.c_str());
+    else
+        Msg(__LINE__).issueWarning("The constraint files name different parts: %s. The design keeps %s.\n",
+                                   list.c_str(), after.c_str());
 }
 
 void AddPartCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options) {
@@ -138,7 +171,8 @@ void AddPartCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& o
         "Print the target part and the global CONFIG settings of constraint files, without a netlist.");
     cmd->footer(
         "\nOnly CONFIG NAME = value statements and the PART constraints of INST, NET and PIN\n"
-        "statements are read; no design object is looked up. Each file is read on its own.\n"
+        "statements are read (not PROHIBIT, VREF, timing or group statements); no design object\n"
+        "is looked up. Each file is read on its own.\n"
         "Output: \"PART = <part>\" first, then one \"NAME = value\" line per other setting, in\n"
         "file order; with several files, the lines of each file in turn, each starting with the\n"
         "file name and \": \". A warning names every file and part when the files name different\n"

@@ -28,7 +28,8 @@ Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name
     : owner_(owner), type_(type), name_(name ? name : "") {}
 
 Ndm_Property::~Ndm_Property() {
-    for (Ndm_Property* e : entries_) delete e;
+    if (list_)
+        for (Ndm_Property* e : list_->entries) delete e;
 }
 
 bool Ndm_Property::AddString(const char* text) {
@@ -39,9 +40,9 @@ bool Ndm_Property::AddString(const char* text) {
 
 Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
     if (type_ != NDM_PROP_LIST) return nullptr;
-    entries_.push_back(new Ndm_Property(owner_, type, name));
-    Ndm_Property* entry = entries_.back();
-    if (index_) index_->try_emplace(entry->name_, entry);
+    if (!list_) list_ = std::make_unique<ListData>();
+    Ndm_Property* entry = list_->entries.emplace_back(new Ndm_Property(owner_, type, name));
+    if (list_->index) list_->index->try_emplace(entry->name_, entry);
     return entry;
 }
 
@@ -63,27 +64,31 @@ Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
 }
 
 Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
-    if (!name) return nullptr;
-    if (entries_.size() <= kIndexFrom) {
-        for (Ndm_Property* e : entries_)
+    if (!name || !list_) return nullptr;
+    std::vector<Ndm_Property*>& entries = list_->entries;
+    if (entries.size() <= kIndexFrom) {
+        for (Ndm_Property* e : entries)
             if (e->name_ == name) return e;
         return nullptr;
     }
-    if (!index_) {
+    auto& index = list_->index;
+    if (!index) {
         // Timing lists grow to tens of thousands of entries; look them up by hash.
-        index_ = std::make_unique<std::unordered_map<std::string_view, Ndm_Property*>>();
-        index_->reserve(entries_.size());
-        for (Ndm_Property* e : entries_) index_->try_emplace(e->name_, e);
+        index = std::make_unique<std::unordered_map<std::string_view, Ndm_Property*>>();
+        index->reserve(entries.size());
+        for (Ndm_Property* e : entries) index->try_emplace(e->name_, e);
     }
-    auto it = index_->find(name);
-    return it == index_->end() ? nullptr : it->second;
+    auto it = index->find(name);
+    return it == index->end() ? nullptr : it->second;
 }
 
 bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
-    auto it = std::find(entries_.begin(), entries_.end(), entry);
-    if (it == entries_.end()) return false;
-    entries_.erase(it);
-    index_.reset();  // rebuilt on the next lookup: the first entry of that name may have changed
+    if (!list_) return false;
+    auto it = std::find(list_->entries.begin(), list_->entries.end(), entry);
+    if (it == list_->entries.end()) return false;
+    list_->entries.erase(it);
+    // The first entry of that name may have changed: the index is rebuilt on the next lookup.
+    list_->index.reset();
     delete entry;
     return true;
 }

@@ -51,8 +51,10 @@ public:
     // Texts of a string list, in order (empty for other types).
     const std::vector<std::string>& GetStrings() const { return strings_; }
     // Entries of a list property, in order (empty for other types).
-    std::span<Ndm_Property* const> GetListItr() const { return entries_; }
-    int GetNumEntries() const { return static_cast<int>(entries_.size()); }
+    std::span<Ndm_Property* const> GetListItr() const {
+        return list_ ? std::span<Ndm_Property* const>(list_->entries) : std::span<Ndm_Property* const>();
+    }
+    int GetNumEntries() const { return list_ ? static_cast<int>(list_->entries.size()) : 0; }
 
     // Appends a text to a string list; false for other types.
     bool AddString(const char* text);
@@ -86,11 +88,15 @@ private:
     std::string name_;
     std::string text_;
     std::vector<std::string> strings_;
-    std::vector<Ndm_Property*> entries_;  // owned
-    // First entry of each name, built by the first lookup in a list of more than kIndexFrom
-    // entries and kept up to date by additions.
+    // Entries of a list property (owned), and the first entry of each name, built by the first
+    // lookup in a list of more than kIndexFrom entries and kept up to date by additions. Only
+    // list properties pay for it.
+    struct ListData {
+        std::vector<Ndm_Property*> entries;
+        std::unique_ptr<std::unordered_map<std::string_view, Ndm_Property*>> index;
+    };
     static constexpr size_t kIndexFrom = 8;
-    mutable std::unique_ptr<std::unordered_map<std::string_view, Ndm_Property*>> index_;
+    std::unique_ptr<ListData> list_;
 };
 
 // Kinds of design objects.

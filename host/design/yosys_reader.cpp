@@ -793,32 +793,48 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
 // reaches a port is named after the port.
 //
 // Top-level port bits that share a local bit with another port bit get networks of their own
-// (see PadBoundary); so do port bits joined to another one only through a submodule (a wire
-// from an input port to an output port inside a cell), the first input bit keeping the net.
+// (see PadBoundary). So do port bits joined to another one only through a submodule (a wire
+// from an input port to an output port inside a cell), the first input bit keeping the net:
+// there the split port's network takes every name of its local bit in the top module.
 void Reader::Networks(Ndm_View* view) {
     constexpr uint32_t kNone = UINT32_MAX;
     std::vector<uint32_t> network_of_root(parent_.size(), kNone);
-    std::unordered_map<uint32_t, uint32_t> keeper;  // net (root) -> the top port signal keeping it
+    std::unordered_map<uint32_t, uint32_t> keeper;     // net (root) -> the top port signal keeping it
+    std::unordered_map<int32_t, uint32_t> split_bits;  // top local bit -> its network, kNone before
     for (const Instance& inst : instances_) {
         Module& m = modules_[inst.module];
         if (m.signal_order.size() != m.num_signals) SignalOrder(m);
         std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
         const bool top = &inst == &instances_.front() && !m.pad_only.empty();
         if (top) {
+            auto root_of = [&](uint32_t s) { return Find(inst.base + static_cast<uint32_t>(m.signal_bit[s])); };
             for (uint32_t s : m.signal_order) {
                 if (!m.port_kind[s] || m.pad_only[s] || m.signal_bit[s] < 0) continue;
-                auto [it, fresh] = keeper.try_emplace(Find(inst.base + static_cast<uint32_t>(m.signal_bit[s])), s);
+                auto [it, fresh] = keeper.try_emplace(root_of(s), s);
                 if (!fresh && m.port_kind[it->second] == 1 && m.port_kind[s] == 2) it->second = s;
             }
+            for (uint32_t s : m.signal_order)
+                if (m.port_kind[s] && !m.pad_only[s] && m.signal_bit[s] >= 0 && keeper[root_of(s)] != s)
+                    split_bits.emplace(m.signal_bit[s], kNone);
         }
         for (uint32_t s : m.signal_order) {
             int32_t bit = m.signal_bit[s];
             if (bit < 0) continue;
-            uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
-            if (top && m.port_kind[s] && (m.pad_only[s] || keeper[root] != s)) {
+            if (top && m.pad_only[s]) {
                 view->CreateNetwork()->AddSignal(signals[s]);
                 continue;
             }
+            if (top && !split_bits.empty()) {
+                if (auto it = split_bits.find(bit); it != split_bits.end()) {
+                    if (it->second == kNone) {
+                        it->second = static_cast<uint32_t>(view->GetNumNetworks());
+                        view->CreateNetwork();
+                    }
+                    view->GetNetworkItr()[it->second]->AddSignal(signals[s]);
+                    continue;
+                }
+            }
+            uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
             uint32_t& index = network_of_root[root];
             if (index == kNone) {
                 index = static_cast<uint32_t>(view->GetNumNetworks());

@@ -262,6 +262,33 @@ enum PR_EDGE {
 // Priority value meaning "no priority".
 inline constexpr int PR_NO_PRIORITY = 2147483647;
 
+// The whole text of a constraint file, read once: large regular files are mapped, others
+// (pipes, terminals, process substitutions) read into memory. A parser given one with set_text
+// parses it instead of opening its file again, so two readers of one file can share a stream
+// that can be read only once.
+class Pr_FileText {
+  public:
+    // The text of the named file, or null when it cannot be opened or read.
+    static std::shared_ptr<const Pr_FileText> Read(const char* name);
+    ~Pr_FileText();
+    Pr_FileText(const Pr_FileText&) = delete;
+    Pr_FileText& operator=(const Pr_FileText&) = delete;
+
+    const char* data() const { return mapped_ ? static_cast<const char*>(mapped_) : buffer_.get(); }
+    std::size_t size() const { return size_; }
+
+  private:
+    friend class Pr_Logical_Parser;
+    enum class ReadResult { Ok, CannotOpen, CannotRead };
+    Pr_FileText() = default;
+    ReadResult load(const char* name);
+
+    static constexpr std::size_t kMapThreshold = 1 << 20;
+    void* mapped_ = nullptr;
+    std::unique_ptr<char[]> buffer_;
+    std::size_t size_ = 0;
+};
+
 class Pr_Logical_Parser {
   public:
     // Binds the parser to a file; a null name is allowed (parse() then reports it cannot open).
@@ -331,9 +358,13 @@ class Pr_Logical_Parser {
     // Reads the file from its start and calls the callbacks. True when the file was read,
     // no syntax error occurred and every callback returned true.
     bool parse();
+    // Parses text (the file's text read beforehand) instead of opening the file; messages still
+    // name the file. Null goes back to reading the file.
+    void set_text(std::shared_ptr<const Pr_FileText> text) { text_ = std::move(text); }
     // The file name as given; the empty text when none was given.
     const char* get_filename() const { return filename_.c_str(); }
 
   private:
     std::string filename_;
+    std::shared_ptr<const Pr_FileText> text_;
 };

@@ -1299,30 +1299,13 @@ class FileDescriptor {
     int fd_;
 };
 
-enum class ReadResult { Ok, CannotOpen, CannotRead };
+}  // namespace
 
-// The bytes of a constraint file: large regular files are mapped, others read into memory.
-class FileText {
-  public:
-    FileText() = default;
-    ~FileText() {
-        if (mapped_) ::munmap(mapped_, size_);
-    }
-    FileText(const FileText&) = delete;
-    FileText& operator=(const FileText&) = delete;
+Pr_FileText::~Pr_FileText() {
+    if (mapped_) ::munmap(mapped_, size_);
+}
 
-    ReadResult load(const char* name);
-    const char* data() const { return mapped_ ? static_cast<const char*>(mapped_) : buffer_.get(); }
-    std::size_t size() const { return size_; }
-
-  private:
-    static constexpr std::size_t kMapThreshold = 1 << 20;
-    void* mapped_ = nullptr;
-    std::unique_ptr<char[]> buffer_;
-    std::size_t size_ = 0;
-};
-
-ReadResult FileText::load(const char* name) {
+Pr_FileText::ReadResult Pr_FileText::load(const char* name) {
     FileDescriptor fd(::open(name, O_RDONLY | O_CLOEXEC));
     if (fd.get() < 0) return ReadResult::CannotOpen;
     struct stat st {};
@@ -1360,7 +1343,11 @@ ReadResult FileText::load(const char* name) {
     }
 }
 
-}  // namespace
+std::shared_ptr<const Pr_FileText> Pr_FileText::Read(const char* name) {
+    auto text = std::shared_ptr<Pr_FileText>(new Pr_FileText());
+    if (!name || text->load(name) != ReadResult::Ok) return nullptr;
+    return text;
+}
 
 Pr_Logical_Parser::Pr_Logical_Parser(const char* filename) : filename_(filename ? filename : "") {}
 Pr_Logical_Parser::Pr_Logical_Parser(const Pr_Logical_Parser& other) = default;
@@ -1368,15 +1355,19 @@ Pr_Logical_Parser& Pr_Logical_Parser::operator=(const Pr_Logical_Parser& other) 
 Pr_Logical_Parser::~Pr_Logical_Parser() = default;
 
 bool Pr_Logical_Parser::parse() {
-    FileText text;
+    if (text_) {
+        pr_detail::Reader reader(*this, text_->data(), text_->size());
+        return reader.run();
+    }
+    Pr_FileText text;
     switch (text.load(filename_.c_str())) {
-        case ReadResult::CannotOpen:
+        case Pr_FileText::ReadResult::CannotOpen:
             messages().issueError("Could not open constraint file '%s'.\n", filename_.c_str());
             return false;
-        case ReadResult::CannotRead:
+        case Pr_FileText::ReadResult::CannotRead:
             messages().issueError("Could not read constraint file '%s'.\n", filename_.c_str());
             return false;
-        case ReadResult::Ok:
+        case Pr_FileText::ReadResult::Ok:
             break;
     }
     pr_detail::Reader reader(*this, text.data(), text.size());
@@ -1490,12 +1481,16 @@ bool Pr_Logical_Parser::dump() {
 }
 
 bool Pr_Logical_Parser::load(Pr_Logical_Parser& other) {
-    if (&other != this) filename_ = other.filename_;
+    if (&other != this) {
+        filename_ = other.filename_;
+        text_ = other.text_;
+    }
     return true;
 }
 
 bool Pr_Logical_Parser::load(const char* filename) {
     filename_ = filename ? filename : "";
+    text_.reset();
     return true;
 }
 

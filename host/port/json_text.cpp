@@ -38,7 +38,8 @@ std::string Port_DecodeByteEscapes(std::string_view utf8) {
     std::string out;
     out.reserve(utf8.size());
     for (size_t i = 0; i < utf8.size(); ++i) {
-        if (i + 2 < utf8.size() && IsByteEscapeCodePoint(utf8.data() + i)) {
+        if (i + 2 < utf8.size() && IsByteEscapeCodePoint(utf8.data() + i) &&
+            (static_cast<unsigned char>(utf8[i + 2]) & 0xC0) == 0x80) {
             out += static_cast<char>(0x80 + ((static_cast<unsigned char>(utf8[i + 1]) - 0x9E) << 6) +
                                      (static_cast<unsigned char>(utf8[i + 2]) - 0x80));
             i += 2;

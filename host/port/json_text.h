@@ -20,8 +20,8 @@ constexpr uint32_t kPort_ByteEscapeLast = 0xF7FF;
 // valid UTF-8 copied as it is, other bytes as byte escapes (above).
 void Port_AppendJsonString(std::string& out, std::string_view text);
 
-// The bytes a decoded JSON text stands for: each U+F780..U+F7FF in its UTF-8 form becomes the
-// byte it stands for; everything else is kept.
+// The bytes a decoded JSON text (valid UTF-8, as a JSON reader gives it) stands for: each
+// U+F780..U+F7FF in its UTF-8 form becomes the byte it stands for; everything else is kept.
 std::string Port_DecodeByteEscapes(std::string_view utf8);
 
 // Length (2 to 4) of the valid UTF-8 multi-byte sequence at the start of text, or 0 when the

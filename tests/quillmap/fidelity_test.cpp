@@ -147,6 +147,7 @@ TEST(Fidelity, PartsStatusesAndFatalExtraction) {
     dir.Write("b.ucf", "CONFIG STEPPING = ES;\n");
     dir.Write("c.ucf", "CONFIG STEPPING = ES;\nCONFIG PART = qx200-ff1-1;\n");
     dir.Write("p.ucf", "NET clk LOC = P10;\nCONFIG PART = qx100-fg256-2;\n");
+    dir.Write("inst.ucf", "CONFIG PART = qx100-fg256-2;\nINST \"count_*\" PART = qx200-ff1-1;\n");
     dir.Write("dup.ucf", "TIMEGRP g OFFSET = IN 1 ns BEFORE clk TIMEGRP regs;\n"
                          "TIMEGRP g OFFSET = IN 2 ns BEFORE clk TIMEGRP regs;\n");
     dir.Write("set.ucf", "SET \"=s\" RLOC_RANGE = X0Y0:X1Y1;\n");
@@ -174,6 +175,24 @@ TEST(Fidelity, PartsStatusesAndFatalExtraction) {
          {"CONFIG PART = qx100-fg256-2 ;\n", "CONFIG PART = qx200-ff1-1 ;\nCONFIG STEPPING = ES ;\n"},
          {}},
         {"annotate " + d + "p.qdf --ucf " + d + "p.ucf", 2, {}, {"Second \"CONFIG PART\" statement found"}},
+        // an NCF after a UCF finds the UCF's block: the warning says which part is kept
+        {"annotate " + kBlinky + " --ucf " + d + "c.ucf --ncf " + d + "a.ncf",
+         0,
+         {},
+         {"different parts: PART = qx200-ff1-1 in '" + d + "c.ucf', PART = qx100-fg256-2 in '" + d +
+          "a.ncf'. The design keeps PART = qx100-fg256-2.\n"}},
+        {"annotate " + kBlinky + " --ucf " + d + "inst.ucf",
+         0,
+         {},
+         {"Line 2 in '" + d + "inst.ucf': PART = qx200-ff1-1 replaces the part qx100-fg256-2 read before."}},
+        // a stream that can be read once feeds both the part reader and the annotator
+        {"annotate " + kBlinky + " --aul --ucf /dev/stdin -o " + d + "pipe.qdf < " + LUN_SOURCE_DIR +
+             "/examples/blinky/blinky.ucf",
+         0,
+         {},
+         {"Line 40 in '/dev/stdin': Could not find net(s) 'dbg_probe'"}},
+        {"extract " + d + "pipe.qdf", 0, {"CONFIG PART = qx100-fg256-2 ;\n", "TIMESPEC TS_clk = "}, {}},
+        {"annotate " + kBlinky + " --ucf " + d, 1, {}, {"Could not open constraint file"}},
         {"annotate " + kBlinky + " --second-pass --ucf " + d + "p.ucf", 0, {}, {}},
         {"annotate " + kBlinky + " --ucf " + d + "dup.ucf", 1, {}, {"INTERNAL_ERROR", "duplicate OFFSET"}},
         {"annotate " + kBlinky + " --ucf " + d + "set.ucf -o " + d + "set.qdf", 0, {}, {}},

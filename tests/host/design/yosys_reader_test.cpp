@@ -236,7 +236,7 @@ constexpr const char* kSharedPorts = R"({"modules": {
                      "connections": {"C": [2], "D": [4]}},
               "u": {"type": "pass", "connections": {"a": [3], "b": [4]}}},
     "netnames": {"a_copy": {"bits": [2]}, "b_copy": {"bits": [2]}, "internal": {"bits": [2]},
-                 "sys_clk": {"bits": [2]}, "x": {"bits": [3]}, "y": {"bits": [4]}}}
+                 "sys_clk": {"bits": [2]}, "x": {"bits": [3]}, "y": {"bits": [4]}, "y_alias": {"bits": [4]}}}
 }})";
 
 TEST(YosysReader, EveryTopPortBitIsAPadOfItsOwn) {
@@ -251,13 +251,14 @@ TEST(YosysReader, EveryTopPortBitIsAPadOfItsOwn) {
         {"a_copy", {"a_copy"}},
         {"b_copy", {"b_copy"}},
         {"x", {"x", "u/a", "u/b"}},
-        {"y", {"y"}},  // joined to x only inside u
+        {"y", {"y", "y_alias"}},  // joined to x only inside u: its own bit is its own net
     };
     EXPECT_EQ(nets, expected);
     Ndm_Block* top = view->GetBlock();
     EXPECT_EQ(top->GetBlockByName("ff")->GetPinByName("C")->GetSignal(), top->GetSignalByName("sys_clk"));
     EXPECT_EQ(top->GetPinByName("a_copy")->GetSignal(), top->GetSignalByName("a_copy"));
     EXPECT_EQ(top->GetPinByName("y")->GetSignal(), top->GetSignalByName("y"));
+    EXPECT_EQ(top->GetBlockByName("ff")->GetPinByName("D")->GetSignal()->GetNetwork()->GetFullName(), "y");
 }
 
 constexpr const char* kTwoRoots = R"({"modules": {
