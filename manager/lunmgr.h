@@ -7,11 +7,12 @@
 
 #include <memory>
 #include <string>
-#include <unordered_set>
 #include <utility>
 #include <vector>
 
 #include "frame/lunbase.h"
+#include "host/design/ndm_lookup.h"
+#include "lookup/lookup_report.h"
 #include "host/port/string_base.h"
 
 class Ta_LunMgr : public Ta_LunBase {
@@ -125,8 +126,10 @@ protected:
     bool ApplyUnmatchedPolicy(ObjectKind kind, const Pr_Logical_ConstraintDefn& defn, const char* name,
                               const Pr_Logical_ConstraintHandle* handle);
 
-    // The children of the top block that a PIN path can be found below, in stored order.
-    std::vector<Ndm_Block*> PinSearchChildren(const char* path, bool ignore_case);
+    // The messages of the lookups for one statement.
+    lunfind::Report LookupReport(const Pr_Logical_ConstraintHandle* handle);
+    // The lookup of a statement's object name with every retry, for the current view.
+    Ndm_ObjectFinder& Finder();
 
     bool config_seen;
     bool allow_unmatched_locs;
@@ -135,12 +138,6 @@ protected:
     Port::StringBase<char> identifier;
 
 private:
-    // Distinct pin names (exact and case-folded) of the children of the top block `top`, made on
-    // the first PIN statement that needs them; empty sets with `unbounded` mean "too many to keep".
-    struct PinNames {
-        const Ndm_Block* top = nullptr;
-        std::unordered_set<std::string> exact, folded;
-        bool unbounded = false;
-    };
-    std::shared_ptr<PinNames> pin_names_;
+    std::shared_ptr<Ndm_ObjectFinder> finder_;  // bound to finder_view_
+    Ndm_View* finder_view_ = nullptr;
 };

@@ -270,6 +270,8 @@ class Pr_FileText {
   public:
     // The text of the named file, or null when it cannot be opened or read.
     static std::shared_ptr<const Pr_FileText> Read(const char* name);
+    // A copy of text, as if read from a file.
+    static std::shared_ptr<const Pr_FileText> FromText(std::string_view text);
     ~Pr_FileText();
     Pr_FileText(const Pr_FileText&) = delete;
     Pr_FileText& operator=(const Pr_FileText&) = delete;
@@ -364,7 +366,14 @@ class Pr_Logical_Parser {
     // The file name as given; the empty text when none was given.
     const char* get_filename() const { return filename_.c_str(); }
 
+  protected:
+    // During cb_error and cb_syntax_error: the statement that could not be read (its first
+    // line and its text up to its ";"); null otherwise.
+    const Handle* failed_statement() const { return failed_; }
+
   private:
+    friend class pr_detail::Reader;
     std::string filename_;
     std::shared_ptr<const Pr_FileText> text_;
+    const Handle* failed_ = nullptr;
 };

@@ -461,8 +461,14 @@ void Reader::report() {
     const Failure& f = failure_;
     lexer_.state = f.from;
     if (f.value) {
-        result(parser_.cb_error(f.line, f.col, f.text));
+        // The statement's text, up to its ";", for readers that keep what they cannot read.
         lexer_.skip_to_semicolon();
+        std::size_t stop = lexer_.state.pos;
+        while (stop > first_.begin && (lexer_.data()[stop - 1] == '\n' || lexer_.data()[stop - 1] == '\r')) --stop;
+        handle_.assign(first_.line, {lexer_.data() + first_.begin, stop > first_.begin ? stop - first_.begin : 0});
+        parser_.failed_ = &handle_;
+        result(parser_.cb_error(f.line, f.col, f.text));
+        parser_.failed_ = nullptr;
         return;
     }
     std::size_t end = f.end;
@@ -473,7 +479,9 @@ void Reader::report() {
     if (end < first_.begin) end = first_.begin;
     handle_.assign(first_.line, {lexer_.data() + first_.begin, end - first_.begin});
     syntax_error_ = true;
+    parser_.failed_ = &handle_;
     result(parser_.cb_syntax_error(f.line, f.col, f.text, &handle_));
+    parser_.failed_ = nullptr;
 }
 
 // ---------------------------------------------------------------- quantities
@@ -1341,6 +1349,15 @@ Pr_FileText::ReadResult Pr_FileText::load(const char* name) {
         if (n == 0) return ReadResult::Ok;
         size_ += static_cast<std::size_t>(n);
     }
+}
+
+std::shared_ptr<const Pr_FileText> Pr_FileText::FromText(std::string_view text) {
+    auto copy = std::shared_ptr<Pr_FileText>(new Pr_FileText());
+    copy->buffer_ = std::make_unique_for_overwrite<char[]>(text.size() + 1);
+    std::memcpy(copy->buffer_.get(), text.data(), text.size());
+    copy->buffer_[text.size()] = '\0';
+    copy->size_ = text.size();
+    return copy;
 }
 
 std::shared_ptr<const Pr_FileText> Pr_FileText::Read(const char* name) {
