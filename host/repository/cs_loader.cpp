@@ -1,0 +1,304 @@
+#include "host/repository/cs_loader.h"
+
+#include <cstring>
+
+#include "host/parser/pr_property_texts.h"
+#include "host/port/msgman.h"
+#include "host/repository/cs_mgr.h"
+
+namespace {
+
+bool Is(const char* a, const char* b) { return std::strcmp(a, b) == 0; }
+
+// Runs of blanks, tabs and line ends as one blank; no blank at either end; no final ";".
+std::string Folded(std::string_view text) {
+    std::string out;
+    bool blank = false;
+    for (char c : text) {
+        if (c == ' ' || c == '\t' || c == '\n' || c == '\r') {
+            blank = !out.empty();
+            continue;
+        }
+        if (blank) out += ' ';
+        blank = false;
+        out += c;
+    }
+    while (!out.empty() && (out.back() == ';' || out.back() == ' ')) out.pop_back();
+    return out;
+}
+
+std::string Joined(const std::vector<const char*>& words, const char* separator) {
+    std::string out;
+    for (const char* w : words) (out += out.empty() ? "" : separator) += w;
+    return out;
+}
+
+// The typed class of an attribute of an INST, NET or PIN statement.
+const Cs_ConstraintType& ObjectType(const char* key) {
+    if (Is(key, "LOC")) return Cs_Constraint_Locate::Type();
+    if (Is(key, "IOSTANDARD")) return Cs_Constraint_IOStandard::Type();
+    if (Is(key, "DRIVE")) return Cs_Constraint_Drive::Type();
+    if (Is(key, "SLEW")) return Cs_Constraint_Slew::Type();
+    if (Is(key, "MAXDELAY")) return Cs_Constraint_MaxDelay::Type();
+    if (Is(key, "TNM") || Is(key, "TNM_NET") || Is(key, "TPSYNC") || Is(key, "TPTHRU"))
+        return Cs_Constraint_TimingName::Type();
+    if (Is(key, "PERIOD")) return Cs_Constraint_Period::Type();
+    if (Is(key, "OFFSET")) return Cs_Constraint_Offset::Type();
+    if (Is(key, "PROHIBIT")) return Cs_Constraint_Prohibit::Type();
+    if (Is(key, "AREA_GROUP")) return Cs_Constraint_AreaGroup::Type();
+    return Cs_Constraint_Unsupported::Type();
+}
+
+}  // namespace
+
+// One factory for every class: the constraint objects differ only in their type.
+std::unique_ptr<Cs_Constraint> Cs_MakeConstraint(const Cs_ConstraintType& type);
+
+Cs_Loader::Cs_Loader(Cs_ConstraintMgr& mgr, const char* file, bool ucf)
+    : Pr_Logical_Parser(file), mgr_(mgr), file_(file ? mgr.Text(file) : nullptr), ucf_(ucf) {}
+
+void Cs_Loader::Read(std::shared_ptr<const Pr_FileText> text) {
+    set_text(std::move(text));
+    parse();
+}
+
+Cs_Constraint& Cs_Loader::Add(const Cs_ConstraintType& type, Cs_Scope scope, const char* target, const char* key,
+                              std::string_view value, const Handle* handle, bool flag) {
+    std::unique_ptr<Cs_Constraint> c = Cs_MakeConstraint(type);
+    c->scope_ = scope;
+    c->flag_ = flag;
+    c->target_ = mgr_.Text(target ? target : "");
+    c->key_ = mgr_.Text(key ? key : "");
+    c->value_ = mgr_.Text(value);
+    c->statement_ = mgr_.Text(handle ? Folded(handle->return_ascii()) : std::string());
+    c->source_ = Cs_ConstraintSourceInfo(Cs_SourceFile(file_, handle ? handle->getline() : 0));
+    out_.push_back(std::move(c));
+    return *out_.back();
+}
+
+template <class T>
+Cs_Constraint& Cs_Loader::Add(Cs_Scope scope, const char* target, const char* key, std::string_view value,
+                              const Handle* handle, bool flag) {
+    return Add(T::Type(), scope, target, key, value, handle, flag);
+}
+
+std::string Cs_Loader::AfterEquals(const Handle* handle) const {
+    std::string text = handle ? Folded(handle->return_ascii()) : std::string();
+    size_t eq = text.find('=');
+    if (eq == std::string::npos) return text;
+    size_t from = text.find_first_not_of(' ', eq + 1);
+    return from == std::string::npos ? std::string() : text.substr(from);
+}
+
+void Cs_Loader::Invalid(int line, const std::string& message, const Handle* statement) {
+    const Handle* h = statement ? statement : failed_statement();
+    Add<Cs_Constraint_Unsupported>(Cs_Scope::Design, "", "INVALID_CONSTRAINT:",
+                                   h ? Folded(h->return_ascii()) : std::string(), h);
+    if (!out_.empty() && !h) out_.back()->source_ = Cs_ConstraintSourceInfo(Cs_SourceFile(file_, line));
+    outcome_.Add(std::make_shared<Cs_Status_Parse>(Cs_StatusID::PARSE_ERROR, 10, message,
+                                                   file_ ? file_ : "", line));
+}
+
+bool Cs_Loader::cb_error(int line, int column, const char* value) {
+    Invalid(line, Port_Format("The value '%s' at column %d cannot be read.", value, column), nullptr);
+    return true;
+}
+
+bool Cs_Loader::cb_syntax_error(int line, int column, const char* text, const Handle* handle) {
+    Invalid(line, Port_Format("Syntax error at column %d near '%s'.", column, text), handle);
+    return true;
+}
+
+bool Cs_Loader::cb_comment(const char* text, const Handle* handle) {
+    Add<Cs_Constraint_Comment>(Cs_Scope::Comment, "", "", text ? text : "", handle);
+    return true;
+}
+
+bool Cs_Loader::cb_enable(bool enable, const char* name, const Handle* handle) {
+    Add<Cs_Constraint_TimeSpec>(Cs_Scope::TimeSpec, "", enable ? "ENABLE" : "DISABLE", name, handle).paths_ = {
+        mgr_.Text(name)};
+    return true;
+}
+
+// INST, NET and PIN: the properties the annotator would attach, one constraint each.
+bool Cs_Loader::Objects(Cs_Scope scope, const Defn& defn, const Handle* handle) {
+    const char* target = defn.get_object_name();
+    for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
+        const Pr_Logical_Constraint& c = **it;
+        const char* key = c.get_name();
+        if (c.get_type() == Pr_Logical_Constraint::INIT_) {
+            // A range stays one attribute, as written; write-back expands it.
+            auto* range = dynamic_cast<const Pr_Logical_InitRangeConstraint*>(&c);
+            Add<Cs_Constraint_Unsupported>(scope, target, key, range ? range->get_constraint_value() : "", handle);
+            continue;
+        }
+        if (c.get_type() == Pr_Logical_Constraint::STRING && Is(key, "PART")) {
+            auto* s = dynamic_cast<const Pr_Logical_StringConstraint*>(&c);
+            Add<Cs_Constraint_Unsupported>(scope, target, "PART", s ? s->get_value() : "", handle);
+            continue;
+        }
+        Pr_PropertyPlan plan = Pr_PlanProperties(c, key, ucf_);
+        switch (plan.rule) {
+            case Pr_PropertyRule::ValuelessTig:
+                Add<Cs_Constraint_Unsupported>(scope, target, "TIG", "", handle, true);
+                continue;
+            case Pr_PropertyRule::DivideBy:
+            case Pr_PropertyRule::ReservedSites:
+                // Kept as written; the annotators refuse them with their own message.
+                Add<Cs_Constraint_Unsupported>(scope, target, key, "", handle);
+                continue;
+            case Pr_PropertyRule::Attach:
+            case Pr_PropertyRule::IllegalTnm:
+                break;
+            default:
+                continue;
+        }
+        for (const Pr_PropertyText& p : plan.texts) {
+            const char* name = p.name.c_str();
+            Add(ObjectType(name), scope, target, name, p.value, handle, p.flag);
+        }
+    }
+    return true;
+}
+
+bool Cs_Loader::cb_comp(const Defn& defn, const Handle* handle) { return Objects(Cs_Scope::Instance, defn, handle); }
+bool Cs_Loader::cb_net(const Defn& defn, const Handle* handle) { return Objects(Cs_Scope::Net, defn, handle); }
+bool Cs_Loader::cb_pin(const Defn& defn, const Handle* handle) { return Objects(Cs_Scope::Pin, defn, handle); }
+
+// AREA_GROUP and SET attributes: "<name> = <value>" as the CONFIG block keeps them.
+bool Cs_Loader::Attributes(Cs_Scope scope, const Defn& defn, const Handle* handle) {
+    const char* target = defn.get_object_name();
+    for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
+        Pr_PropertyPlan plan = Pr_PlanProperties(**it, (*it)->get_name(), ucf_);
+        for (const Pr_PropertyText& p : plan.texts) {
+            if (scope == Cs_Scope::Set)
+                Add<Cs_Constraint_Set>(scope, target, p.name.c_str(), p.value, handle, p.flag);
+            else
+                Add<Cs_Constraint_AreaGroup>(scope, target, p.name.c_str(), p.value, handle, p.flag);
+        }
+    }
+    return true;
+}
+
+bool Cs_Loader::cb_areagroup(const Defn& defn, const Handle* handle) {
+    return Attributes(Cs_Scope::AreaGroup, defn, handle);
+}
+bool Cs_Loader::cb_set(const Defn& defn, const Handle* handle) { return Attributes(Cs_Scope::Set, defn, handle); }
+
+bool Cs_Loader::cb_model(const Defn&, const Handle* handle) {
+    Invalid(handle ? handle->getline() : 0, "MODEL statements are not allowed in constraint files.", handle);
+    return true;
+}
+bool Cs_Loader::cb_begin_model(const char*, const Handle* handle) {
+    Invalid(handle ? handle->getline() : 0, "BEGIN MODEL statements are not allowed in constraint files.", handle);
+    return true;
+}
+bool Cs_Loader::cb_end_model(const Handle* handle) {
+    Invalid(handle ? handle->getline() : 0, "END statements are not allowed in constraint files.", handle);
+    return true;
+}
+
+bool Cs_Loader::cb_config(const char* name, const char* value, const Handle* handle) {
+    if (Port::StringBase<char>(name).Compare("PART", Port::StringBase<char>::IGNORE_CASE) == 0)
+        Add<Cs_Constraint_Unsupported>(Cs_Scope::Design, "", "PART", value, handle);
+    else if (Port::StringBase<char>(name).Compare("STEPPING", Port::StringBase<char>::IGNORE_CASE) == 0)
+        Add<Cs_Constraint_Stepping>(Cs_Scope::Design, "", "STEPPING", value, handle);
+    else
+        Add<Cs_Constraint_Global>(Cs_Scope::Design, "", name, value, handle);
+    return true;
+}
+
+bool Cs_Loader::cb_prohibit(const std::vector<const char*>& sites, const Handle* handle) {
+    Add<Cs_Constraint_Prohibit>(Cs_Scope::Design, "", "PROHIBIT", Joined(sites, ", "), handle);
+    return true;
+}
+
+bool Cs_Loader::cb_vref(const std::vector<const char*>& sites, const Handle* handle) {
+    Add<Cs_Constraint_Global>(Cs_Scope::Design, "", "VREF", Joined(sites, ", "), handle);
+    return true;
+}
+
+bool Cs_Loader::cb_temperature(double celsius, const Handle* handle) {
+    Add<Cs_Constraint_Global>(Cs_Scope::Design, "", "TEMPERATURE", Port_Format("%0.3fC", celsius), handle);
+    return true;
+}
+
+bool Cs_Loader::cb_voltage(double volts, const Handle* handle) {
+    Add<Cs_Constraint_Global>(Cs_Scope::Design, "", "VOLTAGE", Port_Format("%0.3fV", volts), handle);
+    return true;
+}
+
+// A timing entry: the statement's text after "=" is its value; the group names it refers to
+// are its paths.
+Cs_Constraint& Cs_Loader::TimingEntry(const char* target, const char* key, const Handle* handle,
+                                      std::vector<const char*> groups) {
+    Cs_Constraint& c = Add<Cs_Constraint_TimeSpec>(Cs_Scope::TimeSpec, target, key, AfterEquals(handle), handle);
+    for (const char* g : groups)
+        if (g && *g) c.paths_.push_back(mgr_.Text(g));
+    return c;
+}
+
+bool Cs_Loader::cb_offset(bool, double, const double*, bool, const char*, const char*, const Handle* handle) {
+    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, "", "OFFSET", AfterEquals(handle), handle);
+    return true;
+}
+
+bool Cs_Loader::cb_roffset(bool, double, const double*, bool, const char*, const char* regs, const char*,
+                           const Handle* handle) {
+    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, "", "OFFSET", AfterEquals(handle), handle).paths_ = {
+        mgr_.Text(regs)};
+    return true;
+}
+
+bool Cs_Loader::cb_toffset(const char* group, bool in, double, const double*, bool, const char* clock,
+                           const char*, const Handle* handle) {
+    std::string key = Port_Format("TSO_%s_%s_%s", group, in ? "in" : "out", clock);
+    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, group, key.c_str(), AfterEquals(handle), handle).paths_ = {
+        mgr_.Text(group)};
+    return true;
+}
+
+bool Cs_Loader::cb_troffset(const char* group, bool in, double, const double*, bool, const char* clock,
+                            const char* regs, const char*, const Handle* handle) {
+    std::string key = Port_Format("TSO_%s_%s_%s_%s", group, in ? "in" : "out", clock, regs);
+    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, group, key.c_str(), AfterEquals(handle), handle).paths_ = {
+        mgr_.Text(group), mgr_.Text(regs)};
+    return true;
+}
+
+bool Cs_Loader::cb_tspec_maxdelay(const char* name, bool, bool, const std::vector<const char*>& points,
+                                  const char*, bool, double, bool, int, bool, const Handle* handle) {
+    TimingEntry(name, name, handle, points);
+    return true;
+}
+
+bool Cs_Loader::cb_tspec_period(const char* name, const char* group, const char*, bool, double, bool, bool,
+                                double, bool, double, double, const double*, int, const Handle* handle) {
+    TimingEntry(name, name, handle, {group});
+    return true;
+}
+
+bool Cs_Loader::cb_tspec_tig(const char* name, bool, bool, const std::vector<const char*>& points, int,
+                             const Handle* handle) {
+    TimingEntry(name, name, handle, points);
+    return true;
+}
+
+bool Cs_Loader::cb_tspec_drop_spec(const char* name, const Handle* handle) {
+    TimingEntry(name, name, handle, {});
+    return true;
+}
+
+bool Cs_Loader::cb_timegrp(const char* group, const std::vector<std::pair<const char*, PR_EDGE>>& members,
+                           const std::vector<const char*>& excluded, const Handle* handle) {
+    Cs_Constraint& c = Add<Cs_Constraint_TimeGrp>(Cs_Scope::TimeGroup, group, group, AfterEquals(handle), handle);
+    for (const auto& m : members) c.paths_.push_back(mgr_.Text(m.first));
+    for (const char* x : excluded) c.paths_.push_back(mgr_.Text(x));
+    return true;
+}
+
+bool Cs_Loader::cb_timegrp_areagroup(const char* group, const char* areagroup, const Handle* handle) {
+    Cs_Constraint& c = Add<Cs_Constraint_TimeGrp>(Cs_Scope::TimeGroup, group, "AREA_GROUP", areagroup, handle);
+    c.paths_.push_back(mgr_.Text(group));
+    return true;
+}

@@ -1,0 +1,185 @@
+#include "host/repository/cs_mgr.h"
+
+#include <algorithm>
+
+#include "host/parser/pr_logical.h"
+#include "host/port/msgman.h"
+#include "host/repository/cs_loader.h"
+
+namespace {
+
+uint64_t ContentHash(const Pr_FileText& text) { return Ndm_NamePool::Hash({text.data(), text.size()}); }
+
+std::shared_ptr<Cs_Status> FileError(const std::string& file, const char* why) {
+    return std::make_shared<Cs_Status_Parse>(Cs_StatusID::FILE_ERROR, 1,
+                                             Port_Format("Cannot read constraint file '%s': %s.", file.c_str(), why),
+                                             file, 0);
+}
+
+}  // namespace
+
+Cs_ConstraintMgr::Cs_ConstraintMgr() : texts_(std::make_unique<Ndm_NamePool>()) {}
+
+Cs_ConstraintMgr::~Cs_ConstraintMgr() = default;
+
+size_t Cs_ConstraintMgr::GetNumConstraints() const {
+    size_t n = loose_.size();
+    for (const Source& s : sources_) n += s.constraints.size();
+    return n;
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::GetFindings() const {
+    Cs_ReturnCode all;
+    for (const Source& s : sources_) all.Append(s.parse);
+    all.Append(resolution_);
+    return all;
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::SetDesign(const Ndm_Design* design) {
+    design_ = design;
+    return Resolve();
+}
+
+Cs_ConstraintMgr::Source* Cs_ConstraintMgr::FindSource(const std::string& name) {
+    for (Source& s : sources_)
+        if (name == s.info->GetFileName()) return &s;
+    return nullptr;
+}
+
+Cs_ConstraintMgr::Source& Cs_ConstraintMgr::AddSource(const std::string& name, int syntax) {
+    if (Source* s = FindSource(name)) return *s;
+    sources_.push_back(Source{std::make_unique<Cs_FileInfo>(name, syntax), {}, {}});
+    return sources_.back();
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source) {
+    Cs_ReturnCode outcome;
+    const std::string name = source.info->GetFileName();
+    std::shared_ptr<const Pr_FileText> text = Pr_FileText::Read(name.c_str());
+    if (!text) {
+        outcome.Add(FileError(name, "it cannot be opened or read"));
+        return outcome;
+    }
+    Cs_Loader loader(*this, name.c_str(), source.info->GetSyntax() != Cs_ConstraintSyntax::NCF);
+    loader.Read(text);
+    source.constraints = std::move(loader.constraints());
+    source.info->hash_ = ContentHash(*text);
+    source.info->size_ = text->size();
+    source.info->read_ = true;
+    source.parse = loader.outcome();
+    outcome.Append(loader.outcome());
+    return outcome;
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::Changed() {
+    if (bulk_) {
+        bulk_changed_ = true;
+        return {};
+    }
+    bulk_changed_ = false;
+    return Resolve();
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::LoadConstraints(const Port::StringBase<char>& file, int syntax) {
+    return ReplaceConstraintsFromFile(file, syntax);
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::ReplaceConstraintsFromFile(const Port::StringBase<char>& file, int syntax) {
+    Cs_ReturnCode outcome = ReadSource(AddSource(file.str(), syntax));
+    outcome.Append(Changed());
+    return outcome;
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::AddConstraintSource(const Port::StringBase<char>& file, int syntax) {
+    AddSource(file.str(), syntax);
+    return {};
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::RemoveConstraintSource(const Port::StringBase<char>& file) {
+    auto it = std::find_if(sources_.begin(), sources_.end(),
+                           [&](const Source& s) { return file.str() == s.info->GetFileName(); });
+    if (it == sources_.end()) return {};
+    sources_.erase(it);
+    return Changed();
+}
+
+void Cs_ConstraintMgr::SetBulkConstraintMode(bool on) {
+    bulk_ = on;
+    if (!on && bulk_changed_) Changed();
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::UpdateConstraintsFromSource() {
+    Cs_ReturnCode outcome;
+    std::vector<Cs_FileInfo*> stale = GetOutOfDateConstraintSources();
+    for (Source& s : sources_)
+        if (std::find(stale.begin(), stale.end(), s.info.get()) != stale.end()) outcome.Append(ReadSource(s));
+    bulk_changed_ = bulk_changed_ || !stale.empty();
+    if (!bulk_ && bulk_changed_) outcome.Append(Changed());
+    return outcome;
+}
+
+std::vector<Cs_FileInfo*> Cs_ConstraintMgr::GetConstraintSources() const {
+    std::vector<Cs_FileInfo*> out;
+    for (const Source& s : sources_) out.push_back(s.info.get());
+    return out;
+}
+
+std::vector<Cs_FileInfo*> Cs_ConstraintMgr::GetOutOfDateConstraintSources() const {
+    std::vector<Cs_FileInfo*> out;
+    for (const Source& s : sources_) {
+        const Cs_FileInfo& info = *s.info;
+        bool stale = !info.read_;
+        if (!stale) {
+            std::shared_ptr<const Pr_FileText> text = Pr_FileText::Read(info.GetFileName());
+            stale = !text || text->size() != info.size_ || ContentHash(*text) != info.hash_;
+        }
+        if (stale) out.push_back(s.info.get());
+    }
+    return out;
+}
+
+Cs_ReturnCode Cs_ConstraintMgr::CreateConstraints(const Port::StringBase<char>& text, int syntax,
+                                                  Cs_Constraint* parent) {
+    Cs_Loader loader(*this, nullptr, syntax != Cs_ConstraintSyntax::NCF);
+    auto copy = Pr_FileText::FromText(text.str());
+    loader.Read(copy);
+    for (auto& c : loader.constraints()) {
+        c->parent_ = parent;
+        loose_.push_back(std::move(c));
+    }
+    Cs_ReturnCode outcome = loader.outcome();
+    outcome.Append(Changed());
+    return outcome;
+}
+
+Cs_SharedContainerT<Cs_Constraint*> Cs_ConstraintMgr::GetConstraints(int effective) const {
+    Cs_SharedContainerT<Cs_Constraint*> out;
+    ForEach([&](Cs_Constraint& c) {
+        if (effective == ALL || !(c.GetType() == Cs_Constraint_Comment::Type())) out.push_back(&c);
+    });
+    return out;
+}
+
+Cs_SharedContainerT<Cs_Constraint*> Cs_ConstraintMgr::GetConstraints(const Cs_Filter_ConstraintType& filter,
+                                                                    int effective) const {
+    Cs_SharedContainerT<Cs_Constraint*> out;
+    ForEach([&](Cs_Constraint& c) {
+        if (filter.Accepts(c) && (effective == ALL || !(c.GetType() == Cs_Constraint_Comment::Type())))
+            out.push_back(&c);
+    });
+    return out;
+}
+
+void Cs_ConstraintMgr::DeleteAllConstraints() {
+    sources_.clear();
+    loose_.clear();
+    resolution_ = Cs_ReturnCode();
+    texts_ = std::make_unique<Ndm_NamePool>();
+    bulk_changed_ = false;
+}
+
+Cs_ConstraintMgr* Cs_ConstraintMgr::CreateScratchPad() const {
+    auto* scratch = new Cs_ConstraintMgr();
+    scratch->design_ = design_;
+    return scratch;
+}

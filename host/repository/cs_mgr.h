@@ -1,0 +1,139 @@
+// Cs_ConstraintMgr: a design's constraints as data. It reads constraint files (sources) into
+// constraints that know their file and line, resolves them against a bound design exactly as
+// the annotators find names, records overrides and associations, and keeps everything in a
+// repository file (SQLite) that Commit writes and Restore reads back. See docs/repository.md.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "host/design/name_pool.h"
+#include "host/port/string_base.h"
+#include "host/repository/cs_constraint.h"
+#include "host/repository/cs_region.h"
+#include "host/repository/cs_status.h"
+
+class Ndm_Design;
+class Ndm_Property;
+
+// For tests: called at each step of a commit ("open", "write", "sync", "rename"); false makes
+// that step fail as an I/O error would. Null (the default) for normal runs.
+using Cs_CommitFaultHook = bool (*)(const char* step);
+void Cs_SetCommitFaultHook(Cs_CommitFaultHook hook);
+
+class Cs_ConstraintMgr {
+public:
+    // Which constraints GetConstraints hands out.
+    enum EFFECTIVETYPE {
+        ALL = 1,     // every constraint, comments included
+        ACTIVE = 2,  // every constraint but comments
+    };
+
+    // What ReplaceConstraintsFromProps took in; converts to the outcome.
+    class PropReplaceResults {
+    public:
+        // The properties taken into the repository, in the order met.
+        const Cs_SharedContainerT<Ndm_Property*>& ConstraintProperties() const { return properties_; }
+        operator Cs_ReturnCode() const { return outcome_; }  // NOLINT: converts by design
+
+    private:
+        friend class Cs_ConstraintMgr;
+        Cs_SharedContainerT<Ndm_Property*> properties_;
+        Cs_ReturnCode outcome_;
+    };
+
+    Cs_ConstraintMgr();
+    virtual ~Cs_ConstraintMgr();
+    Cs_ConstraintMgr(const Cs_ConstraintMgr&) = delete;
+    Cs_ConstraintMgr& operator=(const Cs_ConstraintMgr&) = delete;
+
+    // ---- design
+    // Binds the design (null unbinds) and resolves every constraint against its view EXPANDED
+    // (else its first view).
+    Cs_ReturnCode SetDesign(const Ndm_Design* design);
+    const Ndm_Design* GetDesign() const { return design_; }
+
+    // ---- sources
+    // Registers file as a source and reads it, adding its constraints after the others.
+    Cs_ReturnCode LoadConstraints(const Port::StringBase<char>& file, int syntax);
+    // Replaces the constraints read from file by its current content (registering it when new).
+    Cs_ReturnCode ReplaceConstraintsFromFile(const Port::StringBase<char>& file, int syntax);
+    // Registers a source without reading it; UpdateConstraintsFromSource reads it.
+    Cs_ReturnCode AddConstraintSource(const Port::StringBase<char>& file, int syntax);
+    // Forgets a source and its constraints.
+    Cs_ReturnCode RemoveConstraintSource(const Port::StringBase<char>& file);
+    // While on, source changes only record what is to be done; turning it off resolves once.
+    void SetBulkConstraintMode(bool on);
+    // Reads every source not read yet or changed on disk since it was read, in source order.
+    Cs_ReturnCode UpdateConstraintsFromSource();
+    std::vector<Cs_FileInfo*> GetConstraintSources() const;
+    // Sources whose content differs from what was read (content hash and size), or that can no
+    // longer be read, or that were never read.
+    std::vector<Cs_FileInfo*> GetOutOfDateConstraintSources() const;
+
+    // ---- constraints
+    // Parses text (a statement or a few) as constraints of no file; returns the parse
+    // statuses. parent is recorded as the constraints' associated constraint when given.
+    Cs_ReturnCode CreateConstraints(const Port::StringBase<char>& text, int syntax, Cs_Constraint* parent);
+    Cs_SharedContainerT<Cs_Constraint*> GetConstraints(int effective) const;
+    Cs_SharedContainerT<Cs_Constraint*> GetConstraints(const Cs_Filter_ConstraintType& filter, int effective) const;
+    size_t GetNumConstraints() const;
+    // What the repository found about its content: the parse statuses of every source, then
+    // the statuses of the last resolution.
+    Cs_ReturnCode GetFindings() const;
+    // Empties the repository: constraints and sources (the design stays bound).
+    void DeleteAllConstraints();
+    // A new, empty repository for the same design, owned by the caller.
+    Cs_ConstraintMgr* CreateScratchPad() const;
+
+    // ---- persistence (cs_store.cpp)
+    // Writes the whole repository to file, atomically: the new file is built beside the old
+    // one and renamed into place when complete and synced.
+    Cs_ReturnCode Commit(const Port::StringBase<char>& file) const;
+    // Replaces the repository by the content of file; on failure the repository is left as it
+    // was and the status names the file and the reason.
+    Cs_ReturnCode Restore(const Port::StringBase<char>& file);
+
+    // ---- write-back and take-in
+    // Writes every constraint resolved to objects of the region's view onto them as properties.
+    Cs_ReturnCode WriteConstraintProps(const Cs_DesignRegion& region) const;
+    // Takes the constraint properties of the region's objects into the repository.
+    PropReplaceResults ReplaceConstraintsFromProps(const Cs_DesignRegion& region);
+
+    // Interned copy of a text, owned by the repository.
+    const char* Text(std::string_view text) { return texts_->Intern(text); }
+
+private:
+    friend class Cs_Loader;
+    friend class Cs_Store;
+    using Constraints = std::vector<std::unique_ptr<Cs_Constraint>>;
+    struct Source {
+        std::unique_ptr<Cs_FileInfo> info;
+        Constraints constraints;  // in file order
+        Cs_ReturnCode parse;      // statuses of the last read
+    };
+
+    Source* FindSource(const std::string& name);
+    Source& AddSource(const std::string& name, int syntax);
+    // Reads one source, replacing its constraints.
+    Cs_ReturnCode ReadSource(Source& source);
+    // After sources changed: resolves again unless in bulk mode.
+    Cs_ReturnCode Changed();
+    // Resolution of every constraint (cs_resolve.cpp).
+    Cs_ReturnCode Resolve();
+    template <class F>
+    void ForEach(F&& f) const {
+        for (const Source& s : sources_)
+            for (const auto& c : s.constraints) f(*c);
+        for (const auto& c : loose_) f(*c);
+    }
+
+    const Ndm_Design* design_ = nullptr;
+    std::vector<Source> sources_;
+    Constraints loose_;  // constraints of no file (CreateConstraints, take-in), after the sources
+    Cs_ReturnCode resolution_;  // statuses of the last resolution
+    std::unique_ptr<Ndm_NamePool> texts_;
+    bool bulk_ = false;
+    bool bulk_changed_ = false;
+};

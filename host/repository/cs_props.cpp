@@ -1,0 +1,120 @@
+// Write-back of the repository's typed constraints onto a view as properties, and take-in of
+// constraint properties found on a view.
+#include <cstring>
+
+#include "host/design/ndm.h"
+#include "host/filter/prop_filter.h"
+#include "host/parser/pr_logical.h"
+#include "host/port/msgman.h"
+#include "host/repository/cs_mgr.h"
+
+std::unique_ptr<Cs_Constraint> Cs_MakeConstraint(const Cs_ConstraintType& type);
+
+namespace {
+
+// Attaches name = value (a flag when value is null) to object through the filter, as the
+// annotators do: a temporary list, the filter's verdict, the name recorded in FROM_UCF.
+bool Attach(Ndh_PropInFilter& filter, Ndm_PropertyHolder* object, const char* name, const char* value,
+            Cs_ReturnCode& outcome, const Cs_Constraint& c) {
+    object->DeleteProperty("_TempPropList");
+    Ndm_Property* list = object->CreatePropertyList("_TempPropList");
+    if (value)
+        list->CreatePropertyString(name, value);
+    else
+        list->CreatePropertyBool(name);
+    Ndh_PropFiltResult verdict = filter.FilterProp(list, object);
+    object->DeleteProperty(list);
+    if (verdict.BadPropName() || verdict.BadDataType()) {
+        outcome.Add(std::make_shared<Cs_Status_Resolution>(
+            Cs_StatusID::NO_RESOLVED_ASSOCIATIONS, Cs_Status::WARNING, 82,
+            Port_Format("%s cannot be written on %s: the property filter refuses it.", c.GetMsgName().c_str(),
+                        object->GetFullName().c_str()),
+            &c));
+        return false;
+    }
+    std::string upper(name);
+    for (char& ch : upper)
+        if (ch >= 'a' && ch <= 'z') ch = static_cast<char>(ch - 32);
+    Ndm_Property* names = object->GetPropertyByName("FROM_UCF");
+    if (!names) names = object->CreatePropertyStringList("FROM_UCF");
+    names->AddString(upper.c_str());
+    return true;
+}
+
+}  // namespace
+
+Cs_ReturnCode Cs_ConstraintMgr::WriteConstraintProps(const Cs_DesignRegion& region) const {
+    Cs_ReturnCode outcome;
+    const Ndm_View* view = region.GetView();
+    if (!view) return outcome;
+    Ndh_PropInFilter filter("ucf.prp", nullptr);
+    ForEach([&](const Cs_Constraint& c) {
+        // Attributes without a class are the bridge's to attach; design-wide constraints stay
+        // in the repository.
+        if (c.GetType() == Cs_Constraint_Unsupported::Type() || c.IsAssociationExempt()) return;
+        for (Ndm_PropertyHolder* object : c.GetAssociatedDesignObjs()) {
+            const Ndm_View* owner = nullptr;
+            switch (object->GetKind()) {
+                case Ndm_ObjKind::Block: owner = static_cast<Ndm_Block*>(object)->GetView(); break;
+                case Ndm_ObjKind::Network: owner = static_cast<Ndm_Network*>(object)->GetView(); break;
+                case Ndm_ObjKind::Signal: owner = static_cast<Ndm_Signal*>(object)->GetBlock()->GetView(); break;
+                case Ndm_ObjKind::Pin: owner = static_cast<Ndm_Pin*>(object)->GetBlock()->GetView(); break;
+                default: break;
+            }
+            if (owner != view) continue;
+            Attach(filter, object, c.GetAttribute(), c.IsFlag() ? nullptr : c.GetValueText(), outcome, c);
+        }
+    });
+    return outcome;
+}
+
+Cs_ConstraintMgr::PropReplaceResults Cs_ConstraintMgr::ReplaceConstraintsFromProps(const Cs_DesignRegion& region) {
+    PropReplaceResults results;
+    const Ndm_View* view = region.GetView();
+    if (!view || !view->GetBlock()) return results;
+    Ndh_PropInFilter filter("ucf.prp", nullptr);
+    auto take = [&](Ndm_PropertyHolder* object, Cs_Scope scope, const std::string& name) {
+        for (Ndm_Property* p : object->GetPropertyItr()) {
+            const char* key = p->GetName();
+            if (filter.CanonicalName(key).empty()) continue;
+            std::vector<std::string> values;
+            bool flag = false;
+            switch (p->GetType()) {
+                case NDM_PROP_STRING: values.push_back(p->GetValueString()); break;
+                case NDM_PROP_STRING_LIST: values = p->GetStrings(); break;
+                case NDM_PROP_INT32: values.push_back(std::to_string(p->GetInt32())); break;
+                case NDM_PROP_FLOAT64: values.push_back(Port_Format("%.17g", p->GetFloat64())); break;
+                case NDM_PROP_BOOL:
+                    if (!p->GetBool()) continue;
+                    flag = true;
+                    values.push_back("");
+                    break;
+                default: continue;
+            }
+            for (const std::string& v : values) {
+                std::unique_ptr<Cs_Constraint> c = Cs_MakeConstraint(Cs_Constraint_Unsupported::Type());
+                c->scope_ = scope;
+                c->flag_ = flag;
+                c->target_ = Text(name);
+                c->key_ = Text(key);
+                c->value_ = Text(v);
+                c->statement_ = Text(std::string(Cs_ScopeWord(scope)) + " \"" + name + "\" " + key +
+                                     (flag ? std::string() : " = " + v));
+                loose_.push_back(std::move(c));
+            }
+            results.properties_.push_back(p);
+        }
+    };
+    std::vector<Ndm_Block*> stack{view->GetBlock()};
+    while (!stack.empty()) {
+        Ndm_Block* b = stack.back();
+        stack.pop_back();
+        if (b->GetParent() && !b->GetPropertyByName("TYPE")) take(b, Cs_Scope::Instance, b->GetFullName());
+        for (Ndm_Pin* pin : b->GetPinItr()) take(pin, Cs_Scope::Pin, pin->GetFullName());
+        auto children = b->GetBlockItr();
+        for (size_t i = children.size(); i-- > 0;) stack.push_back(children[i]);
+    }
+    for (Ndm_Network* n : view->GetNetworkItr()) take(n, Cs_Scope::Net, n->GetName());
+    results.outcome_ = Changed();
+    return results;
+}

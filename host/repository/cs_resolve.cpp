@@ -1,0 +1,151 @@
+// Resolution: which design objects each constraint names, which constraints and groups it
+// refers to, and which later constraints override it.
+#include <cstring>
+#include <map>
+#include <string>
+#include <unordered_map>
+
+#include "host/design/ndm.h"
+#include "host/design/ndm_lookup.h"
+#include "host/port/msgman.h"
+#include "host/repository/cs_mgr.h"
+
+namespace {
+
+// The view names are resolved in: EXPANDED, else the first view.
+Ndm_View* WorkView(const Ndm_Design* design) {
+    if (!design) return nullptr;
+    Ndm_View* view = const_cast<Ndm_Design*>(design)->GetViewByName("EXPANDED");
+    if (!view && !design->GetViewItr().empty()) view = design->GetViewItr().front();
+    return view && view->GetBlock() ? view : nullptr;
+}
+
+// Attributes an object keeps several values of, in order (their properties are string lists):
+// a later one adds to an earlier one rather than overriding it.
+bool Accumulates(const char* key) {
+    static const char* const kLists[] = {"TNM", "TNM_NET", "TIG", "TPSYNC", "TPTHRU", "OFFSET", "ENABLE", "DISABLE",
+                                         "PROHIBIT", "VREF", "DCI_CASCADE", "RANGE", "COMPRESSION",
+                                         "PLACE", "GROUP", "MODE", "IMPLEMENT", "RLOC_ORIGIN"};
+    for (const char* k : kLists)
+        if (std::strcmp(k, key) == 0) return true;
+    return false;
+}
+
+// The group a membership constraint (TNM, TNM_NET, TPSYNC, TPTHRU) defines: its value, after
+// a qualifier ("FFS : grp" defines grp).
+std::string DefinedGroup(const char* value) {
+    std::string v(value);
+    size_t colon = v.rfind(" : ");
+    return colon == std::string::npos ? v : v.substr(colon + 3);
+}
+
+}  // namespace
+
+Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
+    Cs_ReturnCode outcome;
+    std::vector<Cs_Constraint*> all;
+    ForEach([&](Cs_Constraint& c) {
+        c.objects_.clear();
+        c.conflicts_.clear();
+        c.constraints_.clear();
+        if (c.parent_) c.constraints_.push_back(c.parent_);
+        all.push_back(&c);
+    });
+
+    // Groups and the constraints that define them, for the associations below.
+    std::unordered_map<std::string, std::vector<const Cs_Constraint*>> groups;
+    for (Cs_Constraint* c : all) {
+        if (c->GetType() == Cs_Constraint_TimingName::Type()) groups[DefinedGroup(c->value_)].push_back(c);
+        if (c->GetType() == Cs_Constraint_TimeGrp::Type() && std::strcmp(c->key_, "AREA_GROUP") != 0)
+            groups[c->target_].push_back(c);
+    }
+
+    Ndm_View* view = WorkView(design_);
+    // Names are found as the annotator of the source's file kind finds them: a UCF falls back
+    // to other letter cases and tries ".PAD"; an NCF does neither.
+    std::unique_ptr<Ndm_ObjectFinder> ucf_finder, ncf_finder;
+    std::unordered_map<const char*, bool> ncf_file;
+    for (const Source& s : sources_)
+        ncf_file[texts_->Intern(s.info->GetFileName())] = s.info->GetSyntax() == Cs_ConstraintSyntax::NCF;
+    Ndm_LookupReport silent;
+    // The last constraint that set (object or design, attribute) and its value.
+    std::map<std::pair<const void*, std::string>, const Cs_Constraint*> last;
+    // Results per statement and name: the constraints of one statement share one lookup.
+    std::string working;
+    const Cs_Constraint* previous = nullptr;
+    for (Cs_Constraint* c : all) {
+        const bool object = !c->IsAssociationExempt();
+        if (object && view) {
+            const Cs_SourceFile* where = c->source_.GetSourceFile();
+            const bool ncf = where && ncf_file[where->GetFile()];
+            std::unique_ptr<Ndm_ObjectFinder>& finder = ncf ? ncf_finder : ucf_finder;
+            if (!finder) finder = std::make_unique<Ndm_ObjectFinder>(view, ncf, !ncf);
+            const bool same = previous && previous->scope_ == c->scope_ && previous->target_ == c->target_ &&
+                              previous->statement_ == c->statement_ &&
+                              previous->source_.GetSourceFile() && where &&
+                              previous->source_.GetSourceFile()->GetLine() == where->GetLine();
+            if (same) {
+                c->objects_ = previous->objects_;
+            } else {
+                switch (c->scope_) {
+                    case Cs_Scope::Instance:
+                        for (Ndm_Block* b : finder->Instances(c->target_, working, silent)) c->objects_.push_back(b);
+                        break;
+                    case Cs_Scope::Net:
+                        for (Ndm_Signal* s : finder->Nets(c->target_, working, silent))
+                            c->objects_.push_back(s->GetNetwork() ? static_cast<Ndm_PropertyHolder*>(s->GetNetwork())
+                                                                  : s);
+                        break;
+                    case Cs_Scope::Pin:
+                        for (Ndm_Pin* p : finder->Pins(c->target_, working, silent)) c->objects_.push_back(p);
+                        break;
+                    default: break;
+                }
+            }
+            previous = c;
+            if (c->objects_.empty()) {
+                outcome.Add(std::make_shared<Cs_Status_Resolution>(
+                    Cs_StatusID::NO_DESIGN_MATCH, Cs_Status::WARNING, 20,
+                    Port_Format("%s matches no object of the design.", c->GetMsgName().c_str()), c));
+            }
+        }
+        // Group references of timing specifications, groups and offsets.
+        bool missing = false;
+        for (const char* g : c->paths_) {
+            auto it = groups.find(g);
+            if (it == groups.end()) {
+                missing = true;
+                continue;
+            }
+            for (const Cs_Constraint* d : it->second)
+                if (d != c) c->constraints_.push_back(d);
+        }
+        if (missing && c->constraints_.empty() && c->scope_ != Cs_Scope::Comment)
+            outcome.Add(std::make_shared<Cs_Status_Resolution>(
+                Cs_StatusID::NO_RESOLVED_ASSOCIATIONS, Cs_Status::INFO, 81,
+                Port_Format("%s names no group that a constraint defines.", c->GetMsgName().c_str()), c));
+
+        // Overrides: a later constraint setting the same attribute of the same object (or of
+        // the design) to another value wins over the earlier one.
+        if (c->scope_ == Cs_Scope::Comment || c->flag_ || Accumulates(c->key_) ||
+            std::strcmp(c->key_, "INVALID_CONSTRAINT:") == 0)
+            continue;
+        auto record = [&](const void* owner, Ndm_PropertyHolder* entity) {
+            std::string key = std::string(Cs_ScopeWord(c->scope_)) + "\n" + c->target_ + "\n" + c->key_;
+            if (entity) key = c->key_;
+            auto [it, fresh] = last.try_emplace({owner, key}, c);
+            if (fresh) return;
+            const Cs_Constraint* earlier = it->second;
+            if (std::strcmp(earlier->value_, c->value_) != 0)
+                const_cast<Cs_Constraint*>(earlier)->conflicts_.emplace_back(Cs_Conflict::OVERRIDE, entity, c);
+            it->second = c;
+        };
+        if (object) {
+            for (Ndm_PropertyHolder* o : c->objects_) record(o, o);
+        } else {
+            record(nullptr, nullptr);
+        }
+    }
+    resolution_ = outcome;
+    return outcome;
+}
