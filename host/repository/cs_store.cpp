@@ -340,7 +340,14 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
                 file = std::string(p->GetSourceFile()->GetFile() ? p->GetSourceFile()->GetFile() : "");
                 line = int64_t{p->GetSourceFile()->GetLine()};
             }
-            if (auto* r = dynamic_cast<const Cs_Status_Resolution*>(&st)) constraint = id_of(r->GetConstraint());
+            if (auto* r = dynamic_cast<const Cs_Status_Resolution*>(&st)) {
+                constraint = id_of(r->GetConstraint());
+                const Cs_SourceFile* at = r->GetConstraint() ? r->GetConstraint()->GetSourceInfo()->GetSourceFile() : nullptr;
+                if (at) {
+                    file = std::string(at->GetFile());
+                    line = int64_t{at->GetLine()};
+                }
+            }
             ok = ok && db.Insert("INSERT INTO status VALUES (?,?,?,?,?,?,?,?)",
                                  {source, int64_t{static_cast<int>(st.GetID())}, int64_t{st.GetSeverity()},
                                   int64_t{st.GetLocalizedMsgNum()}, st.GetMessage(), file, line, constraint},
@@ -510,8 +517,9 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         auto severity = static_cast<Cs_Status::SEVERITY>(Int(r[2]));
         int number = static_cast<int>(Int(r[3]));
         std::shared_ptr<Cs_Status> st;
-        if (!IsNull(r[5])) {
-            auto parse = std::make_shared<Cs_Status_Parse>(id, number, Str(r[4]), Str(r[5]), static_cast<int>(Int(r[6])));
+        if (IsNull(r[7])) {
+            auto parse =
+                std::make_shared<Cs_Status_Parse>(id, number, Str(r[4]), Str(r[5]), static_cast<int>(Int(r[6])));
             parse->SetSeverity(severity);
             st = parse;
         } else {
