@@ -11,26 +11,14 @@
 #include <random>
 #include <string>
 
+#include "bench_designs.h"
 #include "host/design/ndm.h"
 #include "host/port/msgman.h"
 #include "manager/lunmgr.h"
 
 namespace {
 
-std::unique_ptr<Ndm_Design> MakeDesign(int cells) {
-    auto design = std::make_unique<Ndm_Design>("bench");
-    Ndm_View* view = design->CreateView("EXPANDED");
-    Ndm_Block* top = view->CreateTopBlock("top");
-    char name[64];
-    for (int i = 0; i < cells; ++i) {
-        std::snprintf(name, sizeof name, "cell_%d", i);
-        Ndm_Block* cell = top->CreateBlock(name);
-        for (const char* pin : {"A", "B", "C", "Y"}) cell->CreatePin(pin);
-        std::snprintf(name, sizeof name, "n_%d", i);
-        view->CreateNetwork()->AddSignal(top->CreateSignal(name));
-    }
-    return design;
-}
+std::unique_ptr<Ndm_Design> MakeDesign(int cells) { return MakeFlatDesign(cells); }
 
 // Writes the constraint file; returns its path.
 std::string WriteConstraints(int cells, int exact, int wildcard) {

@@ -4,6 +4,7 @@
 #include <cerrno>
 #include <climits>
 #include <cstdio>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
@@ -76,16 +77,31 @@ bool AtomicFile::Commit() {
 
 char* wcstombs(const wchar_t* text) {
     if (!text) return nullptr;
-    std::mbstate_t state{};
-    const wchar_t* src = text;
-    size_t n = std::wcsrtombs(nullptr, &src, 0, &state);
-    if (n == static_cast<size_t>(-1)) return nullptr;
-    char* out = new char[n + 1];
-    src = text;
-    state = std::mbstate_t{};
-    std::wcsrtombs(out, &src, n + 1, &state);
-    out[n] = '\0';
-    return out;
+    std::string out;
+    for (const wchar_t* p = text; *p; ++p) {
+        const auto c = static_cast<uint32_t>(*p);
+        if (c <= 0xFF) {
+            out += static_cast<char>(c);
+        } else if (c < 0x800) {
+            out += static_cast<char>(0xC0 | (c >> 6));
+            out += static_cast<char>(0x80 | (c & 0x3F));
+        } else if (c < 0x10000) {
+            if (c >= 0xD800 && c <= 0xDFFF) return nullptr;
+            out += static_cast<char>(0xE0 | (c >> 12));
+            out += static_cast<char>(0x80 | ((c >> 6) & 0x3F));
+            out += static_cast<char>(0x80 | (c & 0x3F));
+        } else if (c <= 0x10FFFF) {
+            out += static_cast<char>(0xF0 | (c >> 18));
+            out += static_cast<char>(0x80 | ((c >> 12) & 0x3F));
+            out += static_cast<char>(0x80 | ((c >> 6) & 0x3F));
+            out += static_cast<char>(0x80 | (c & 0x3F));
+        } else {
+            return nullptr;
+        }
+    }
+    char* copy = new char[out.size() + 1];
+    std::memcpy(copy, out.data(), out.size() + 1);
+    return copy;
 }
 
 }  // namespace Port

@@ -34,7 +34,9 @@ private:
 };
 
 // Narrow copy of a wide text (new[], the caller releases it), or null for null or for a
-// text that cannot be converted.
+// text that cannot be converted. A character up to 0xFF is that byte (so a text made of one
+// character per byte, as repository messages are, gives its bytes back); a larger one is its
+// UTF-8 form; a surrogate or a value above 0x10FFFF cannot be converted.
 char* wcstombs(const wchar_t* text);
 
 }  // namespace Port

@@ -12,6 +12,7 @@
 #include "host/design/design_io.h"
 #include "host/design/ndm.h"
 #include "host/port/file.h"
+#include "host/port/stream.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
 #include "manager/lunmgr.h"
@@ -104,6 +105,17 @@ TEST_F(Repo, LoadsEachStatementAsTypedConstraints) {
         EXPECT_EQ(st->GetMessage(), "NET \"dbg_probe\" LOC = P40 (" + kBlinky + "blinky.ucf line 40) matches no object of the design.");
     }
     EXPECT_EQ(unmatched, 1);
+
+    // messages are bytes: the wide form converts back to the same bytes
+    Cs_ReturnCode latin = mgr.LoadConstraints(dir.Write("l.ucf", "NET \"n\xe9t\" LOC = P1;\n").c_str(),
+                                              Cs_ConstraintSyntax::UCF);
+    const Cs_Status* last = nullptr;
+    for (const auto& st : latin) last = st.get();
+    ASSERT_NE(last, nullptr);
+    std::unique_ptr<char[]> narrow(Port::wcstombs(last->GetLocalizedMsg().c_str()));
+    ASSERT_TRUE(narrow);
+    EXPECT_EQ(std::string(narrow.get()), last->GetMessage());
+    EXPECT_NE(last->GetMessage().find("n\xe9t"), std::string::npos);
 
     // a timing specification is associated with the constraints that define its groups
     const Cs_Constraint* spec = Find("TS_cnt_uart");
@@ -226,6 +238,69 @@ TEST_F(Repo, SourcesOutOfDateAfterAnEdit) {
     mgr.RemoveConstraintSource(b.c_str());
     EXPECT_EQ(mgr.GetConstraintSources().size(), 1u);
     EXPECT_EQ(Find("LOC", "btn"), nullptr);
+}
+
+// Every property of a design's objects (not constraint blocks), as "object: name type value".
+std::set<std::string> ObjectProperties(Ndm_View* view, const std::set<std::string>& names) {
+    std::set<std::string> out;
+    auto add = [&](const Ndm_PropertyHolder* o) {
+        for (const Ndm_Property* p : o->GetPropertyItr()) {
+            if (!names.count(p->GetName())) continue;
+            std::string text = o->GetFullName() + ": " + p->GetName() + " " + Ndm_PropTypeName(p->GetType()) + " ";
+            text += lun_test::PropText(o, p->GetName());
+            out.insert(text);
+        }
+    };
+    std::vector<Ndm_Block*> stack{view->GetBlock()};
+    while (!stack.empty()) {
+        Ndm_Block* b = stack.back();
+        stack.pop_back();
+        if (!b->GetPropertyByName("TYPE")) add(b);
+        for (Ndm_Pin* p : b->GetPinItr()) add(p);
+        for (Ndm_Block* c : b->GetBlockItr()) stack.push_back(c);
+    }
+    for (Ndm_Network* n : view->GetNetworkItr()) add(n);
+    return out;
+}
+
+// Write-back gives the typed constraints the properties the annotator gives them; take-in
+// turns properties back into constraints.
+TEST_F(Repo, WriteBackMatchesTheFileRoadAndTakeInReadsProperties) {
+    std::string ucf = dir.Write("w.ucf", ReadFile(kBlinky + "blinky.ucf") +
+                                             "NET \"led<1>\" OFFSET = IN 2 ns VALID 1 ns BEFORE clk;\n"
+                                             "NET btn MAXDELAY = 3 ns;\nNET btn PERIOD = 10 ns HIGH 40%;\n");
+    mgr.LoadConstraints(ucf.c_str(), Cs_ConstraintSyntax::UCF);
+    Ndm_View* view = design->GetViewByName("EXPANDED");
+    EXPECT_TRUE(mgr.WriteConstraintProps(Cs_DesignRegion_View(view)));
+
+    auto file_road = Ndm_LoadDesign((kBlinky + "blinky.json").c_str(), nullptr);
+    Ta_LunMgr annotator(ucf.c_str(), CP_UCF, nullptr);
+    annotator.annotate(file_road->GetViewByName("EXPANDED"));
+    const std::set<std::string> typed = {"LOC",    "IOSTANDARD", "DRIVE",    "SLEW",     "TNM",       "TNM_NET",
+                                         "OFFSET", "PERIOD",     "MAXDELAY", "PROHIBIT", "AREA_GROUP"};
+    std::set<std::string> written = ObjectProperties(view, typed);
+    EXPECT_EQ(written, ObjectProperties(file_road->GetViewByName("EXPANDED"), typed));
+    EXPECT_TRUE(written.count("clk: LOC string P10"));
+    EXPECT_TRUE(written.count("led[3]: DRIVE int32 8"));
+
+    // take-in: the properties become constraints of no file
+    Cs_ConstraintMgr taken;
+    taken.SetDesign(file_road.get());
+    Cs_ConstraintMgr::PropReplaceResults results =
+        taken.ReplaceConstraintsFromProps(Cs_DesignRegion_View(file_road->GetViewByName("EXPANDED")));
+    EXPECT_TRUE(static_cast<Cs_ReturnCode>(results));
+    std::set<std::string> names;
+    for (const Ndm_Property* p : results.ConstraintProperties()) names.insert(p->GetOwner()->GetFullName() + "." + p->GetName());
+    EXPECT_TRUE(names.count("clk.LOC"));
+    EXPECT_TRUE(names.count("rst_n.PULLUP"));
+    EXPECT_FALSE(names.count("clk.FROM_UCF"));
+    const Cs_Constraint* loc = nullptr;
+    for (const Cs_Constraint* c : taken.GetConstraints(Cs_ConstraintMgr::ALL))
+        if (std::string(c->GetAttribute()) == "LOC" && std::string(c->GetTarget()) == "clk") loc = c;
+    ASSERT_NE(loc, nullptr);
+    EXPECT_STREQ(loc->GetValueText(), "P10");
+    EXPECT_EQ(loc->GetSourceInfo()->GetSourceFile(), nullptr);
+    EXPECT_EQ(Names(loc), std::vector<std::string>{"clk"});
 }
 
 // A canonical text of everything the repository file keeps.
