@@ -46,6 +46,16 @@ void BM_Repository(benchmark::State& state) {
     std::string file = WriteConstraints(cells);
     std::string db = file + ".qbcd";
     Port_MsgCapture quiet;
+    // The name indexes of the design are built by the first lookup that needs them, once per
+    // design: build them before timing, as the annotator benchmark does.
+    {
+        std::string warm = file + ".warm";
+        std::ofstream(warm) << "INST cell_0 LOC = SITE_X0Y0;\nNET n_0 IOSTANDARD = LVCMOS33;\n";
+        Cs_ConstraintMgr mgr;
+        mgr.SetDesign(design.get());
+        mgr.LoadConstraints(warm.c_str(), Cs_ConstraintSyntax::UCF);
+        std::remove(warm.c_str());
+    }
     double load = 0, commit = 0, restore = 0, per_constraint = 0, bytes = 0;
     size_t count = 0;
     for (auto _ : state) {
