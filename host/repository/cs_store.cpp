@@ -52,26 +52,22 @@ CREATE INDEX association_by_object ON association(object);
 using Value = std::variant<std::monostate, int64_t, std::string>;
 using Row = std::vector<Value>;
 
-// FNV-1a over the rows in the order they are written and read back.
+// A 64-bit checksum of the rows in the order they are written and read back: each value
+// (its kind, and its number or the hash of its text) is mixed in turn.
 struct Checksum {
-    uint64_t h = 1469598103934665603ULL;
-    void Bytes(const void* data, size_t n) {
-        auto* p = static_cast<const unsigned char*>(data);
-        for (size_t i = 0; i < n; ++i) h = (h ^ p[i]) * 1099511628211ULL;
+    uint64_t h = 0x9E3779B97F4A7C15ULL;
+    void Mix(uint64_t v) {
+        h ^= v + 0x9E3779B97F4A7C15ULL + (h << 6) + (h >> 2);
+        h *= 0xBF58476D1CE4E5B9ULL;
+        h ^= h >> 31;
     }
     void Add(const Row& row) {
         for (const Value& v : row) {
-            unsigned char tag = static_cast<unsigned char>(v.index());
-            Bytes(&tag, 1);
-            if (auto* i = std::get_if<int64_t>(&v)) Bytes(i, sizeof *i);
-            if (auto* s = std::get_if<std::string>(&v)) {
-                uint64_t n = s->size();
-                Bytes(&n, sizeof n);
-                Bytes(s->data(), s->size());
-            }
+            Mix(v.index());
+            if (auto* i = std::get_if<int64_t>(&v)) Mix(static_cast<uint64_t>(*i));
+            if (auto* s = std::get_if<std::string>(&v)) Mix(Ndm_NamePool::Hash(*s) ^ s->size());
         }
-        unsigned char end = 0xff;
-        Bytes(&end, 1);
+        Mix(0xff);
     }
 };
 
@@ -416,10 +412,9 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     if (check.size() != 1 || Str(check[0][0]) != "ok")
         return fail("it is damaged (" + (check.empty() ? std::string("no answer") : Str(check[0][0])) + ")");
 
-    Checksum sum;
     std::vector<Row> sources, constraints, paths, assocs, conflicts, statuses;
-    if (!db.Select("SELECT * FROM source ORDER BY rowid", 6, &sum, sources, error) ||
-        !db.Select("SELECT * FROM constraints ORDER BY rowid", 11, &sum, constraints, error))
+    if (!db.Select("SELECT * FROM source ORDER BY rowid", 6, nullptr, sources, error) ||
+        !db.Select("SELECT * FROM constraints ORDER BY rowid", 11, nullptr, constraints, error))
         return fail("it is damaged (" + error + ")");
     // Rows of the per-constraint tables come back in the order they were written, which
     // interleaves them per constraint; read them that way so that the checksum agrees.
