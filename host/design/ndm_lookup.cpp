@@ -22,6 +22,30 @@ bool SamePrefix(const char* text, const char* name, size_t n, bool fold) {
     return true;
 }
 
+// Appends the children of block named by the part of text before one of its "/" (exactly, or
+// ignoring case); returns how many different lengths matched. Only the "/" positions at which
+// some child name ends are looked up.
+int AddNamedBeforeSlash(const Ndm_Block* block, std::string_view text, bool fold, std::vector<uint32_t>& lengths,
+                        std::vector<Ndm_Block*>& out) {
+    lengths.clear();
+    block->GetBlockNameLengths(lengths);
+    int groups = 0;
+    for (uint32_t n : lengths) {
+        if (n >= text.size()) break;
+        if (text[n] != '/') continue;
+        const size_t before = out.size();
+        block->GetBlocksByName(text.substr(0, n), fold, out);
+        if (out.size() != before) ++groups;
+    }
+    return groups;
+}
+
+// Blocks of several name groups back into stored order.
+void SortByOrder(std::vector<Ndm_Block*>& blocks) {
+    std::sort(blocks.begin(), blocks.end(),
+              [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
+}
+
 // Children of block that can continue a path whose remainder below block is rest: those whose
 // name is the part of rest before one of its "/" (exactly, or ignoring case), in stored order.
 // Only the "/" positions at which some child name ends are looked up.
@@ -38,19 +62,7 @@ void PathCandidates(const Ndm_Block* block, std::string_view rest, bool fold,
         }
         return;
     }
-    lengths.clear();
-    block->GetBlockNameLengths(lengths);
-    int groups = 0;
-    for (uint32_t n : lengths) {
-        if (n >= rest.size()) break;
-        if (rest[n] != '/') continue;
-        const size_t before = out.size();
-        block->GetBlocksByName(rest.substr(0, n), fold, out);
-        if (out.size() != before) ++groups;
-    }
-    if (groups > 1)
-        std::sort(out.begin(), out.end(),
-                  [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
+    if (AddNamedBeforeSlash(block, rest, fold, lengths, out) > 1) SortByOrder(out);
 }
 
 // The block named by path below and including block (see find_blk_hier). report(searched,
@@ -113,19 +125,6 @@ std::string_view LiteralPrefix(const char* pattern) {
     return std::string_view(pattern, std::strcspn(pattern, "*?"));
 }
 
-bool SameBytes(std::string_view a, std::string_view b, size_t n, bool fold) {
-    for (size_t i = 0; i < n; ++i) {
-        unsigned char x = static_cast<unsigned char>(a[i]);
-        unsigned char y = static_cast<unsigned char>(b[i]);
-        if (fold) {
-            if (x >= 'A' && x <= 'Z') x = static_cast<unsigned char>(x + 32);
-            if (y >= 'A' && y <= 'Z') y = static_cast<unsigned char>(y + 32);
-        }
-        if (x != y) return false;
-    }
-    return true;
-}
-
 // How names that start with base can relate to the literal prefix lit.
 enum class Reach {
     None,  // none of them starts with lit
@@ -135,7 +134,7 @@ enum class Reach {
 
 Reach Relate(std::string_view base, std::string_view lit, bool fold, std::string_view* rem) {
     const size_t common = std::min(base.size(), lit.size());
-    if (!SameBytes(base, lit, common, fold)) return Reach::None;
+    if (!SamePrefix(base.data(), lit.data(), common, fold)) return Reach::None;
     if (lit.size() <= base.size()) return Reach::All;
     *rem = lit.substr(base.size());
     return Reach::Some;
@@ -156,17 +155,8 @@ void Narrow(const Ndm_Block* block, std::string_view rem, bool fold, std::vector
         if (out.size() != before) ++groups;
     }
     std::vector<uint32_t> lengths;
-    block->GetBlockNameLengths(lengths);
-    for (uint32_t n : lengths) {
-        if (n >= rem.size()) break;
-        if (rem[n] != '/') continue;
-        const size_t before = out.size();
-        block->GetBlocksByName(rem.substr(0, n), fold, out);
-        if (out.size() != before) ++groups;
-    }
-    if (groups > 1)
-        std::sort(out.begin(), out.end(),
-                  [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
+    groups += AddNamedBeforeSlash(block, rem, fold, lengths, out);
+    if (groups > 1) SortByOrder(out);
 }
 
 // Pre-order walk from root, children in stored order, over the blocks whose full name or
@@ -238,8 +228,7 @@ std::vector<Ndm_Block*> ChildrenNamedByPathPrefix(const Ndm_Block* top, std::str
     for (size_t cut = path.find_first_of(separators); cut != std::string_view::npos;
          cut = path.find_first_of(separators, cut + 1))
         top->GetBlocksByName(path.substr(0, cut), ignore_case, children);
-    std::sort(children.begin(), children.end(),
-              [](const Ndm_Block* a, const Ndm_Block* b) { return a->GetOrder() < b->GetOrder(); });
+    SortByOrder(children);
     children.erase(std::unique(children.begin(), children.end()), children.end());
     return children;
 }
@@ -497,67 +486,64 @@ std::vector<Ndm_Block*> Ndm_ObjectFinder::Instances(const char* name, std::strin
     return found;
 }
 
-std::vector<Ndm_Signal*> Ndm_ObjectFinder::Nets(const char* name, std::string& working, Ndm_LookupReport& report) {
-    using namespace Ndm_Lookup;
-    std::vector<Ndm_Signal*> found;
-    Ndm_Block* top = view_->GetBlock();
+namespace {
+
+// The NET and PIN lookups: attempt(text, exact, found) exactly, then, unless case-sensitive,
+// ignoring case; then again with each other bus delimiter, until something is found.
+template <class T, class Attempt>
+std::vector<T*> Retry(const char* name, bool case_sensitive, std::string& working, Attempt&& attempt) {
+    std::vector<T*> found;
     std::vector<char> w = Buffer(name ? name : "");
     std::vector<Port::StringBase<char>> tried;
-    for (;;) {
-        char* text = w.data();
-        const bool wild = IsWildcard(text);
-        const bool hier = std::strchr(text, '/') != nullptr;
+    do {
         for (bool exact = true;; exact = false) {
-            if (!wild) {
-                Ndm_Signal* sig = FindSignal(top, text, exact, report);
-                if (!sig && hier) {
-                    for (Ndm_Block* child : ChildrenNamedByPathPrefix(top, text, "/", !exact))
-                        if ((sig = FindSignalPath(child, text, exact, report))) break;
-                }
-                if (sig) found.push_back(sig);
-            } else {
-                FindNetSignals(view_, found, text, exact, report);
-                if (found.empty() && hier) FindSignals(top, found, text, exact, report);
-            }
-            if (!exact || !found.empty() || case_sensitive_) break;
+            attempt(w.data(), exact, found);
+            if (!exact || !found.empty() || case_sensitive) break;
         }
-        if (found.empty() && NextBusDelimiters(text, tried)) continue;
-        break;
-    }
+    } while (found.empty() && Ndm_Lookup::NextBusDelimiters(w.data(), tried));
     working = w.data();
     return found;
 }
 
+}  // namespace
+
+std::vector<Ndm_Signal*> Ndm_ObjectFinder::Nets(const char* name, std::string& working, Ndm_LookupReport& report) {
+    using namespace Ndm_Lookup;
+    Ndm_Block* top = view_->GetBlock();
+    return Retry<Ndm_Signal>(name, case_sensitive_, working, [&](char* text, bool exact, std::vector<Ndm_Signal*>& found) {
+        const bool hier = std::strchr(text, '/') != nullptr;
+        if (!IsWildcard(text)) {
+            Ndm_Signal* sig = FindSignal(top, text, exact, report);
+            if (!sig && hier) {
+                for (Ndm_Block* child : ChildrenNamedByPathPrefix(top, text, "/", !exact))
+                    if ((sig = FindSignalPath(child, text, exact, report))) break;
+            }
+            if (sig) found.push_back(sig);
+        } else {
+            FindNetSignals(view_, found, text, exact, report);
+            if (found.empty() && hier) FindSignals(top, found, text, exact, report);
+        }
+    });
+}
+
 std::vector<Ndm_Pin*> Ndm_ObjectFinder::Pins(const char* name, std::string& working, Ndm_LookupReport& report) {
     using namespace Ndm_Lookup;
-    std::vector<Ndm_Pin*> found;
     Ndm_Block* top = view_->GetBlock();
-    std::vector<char> w = Buffer(name ? name : "");
-    std::vector<Port::StringBase<char>> tried;
-    for (;;) {
-        char* text = w.data();
-        const bool wild = IsWildcard(text);
-        for (bool exact = true;; exact = false) {
-            if (!wild) {
-                Ndm_Pin* pin = top->GetPinByName(text);
-                if (!pin) {
-                    for (Ndm_Block* child : PinSearchChildren(text, !exact))
-                        if ((pin = FindPinPath(child, text, exact, report))) break;
-                }
-                if (pin) found.push_back(pin);
-            } else {
-                std::vector<char> rest = Buffer(text);
-                std::vector<char> token(rest.size() < 2048 ? rest.size() : 2048);
-                if (UT_STR::GetToken(rest.data(), token.data(), token.size(), "."))
-                    FindPins(top, found, token.data(), rest.data(), exact, report);
+    return Retry<Ndm_Pin>(name, case_sensitive_, working, [&](char* text, bool exact, std::vector<Ndm_Pin*>& found) {
+        if (!IsWildcard(text)) {
+            Ndm_Pin* pin = top->GetPinByName(text);
+            if (!pin) {
+                for (Ndm_Block* child : PinSearchChildren(text, !exact))
+                    if ((pin = FindPinPath(child, text, exact, report))) break;
             }
-            if (!exact || !found.empty() || case_sensitive_) break;
+            if (pin) found.push_back(pin);
+        } else {
+            std::vector<char> rest = Buffer(text);
+            std::vector<char> token(rest.size() < 2048 ? rest.size() : 2048);
+            if (UT_STR::GetToken(rest.data(), token.data(), token.size(), "."))
+                FindPins(top, found, token.data(), rest.data(), exact, report);
         }
-        if (found.empty() && NextBusDelimiters(text, tried)) continue;
-        break;
-    }
-    working = w.data();
-    return found;
+    });
 }
 
 std::vector<Ndm_Block*> Ndm_ObjectFinder::PinSearchChildren(const char* path, bool ignore_case) {
