@@ -11,6 +11,7 @@ namespace {
 
 // First n bytes of text equal name (ASCII case folded when fold); text holds at least n bytes.
 bool SamePrefix(const char* text, const char* name, size_t n, bool fold) {
+    if (n == 0) return true;  // either may then be null (an empty view)
     if (!fold) return std::memcmp(text, name, n) == 0;
     for (size_t i = 0; i < n; ++i) {
         unsigned char a = static_cast<unsigned char>(text[i]);
