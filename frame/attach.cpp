@@ -1,17 +1,14 @@
 // Ta_LunBase: attaching constraints through the property filter, the verdict messages and the
 // record of which constraint names came from which kind of file.
 #include "frame/lunbase.h"
-#include "host/filter/prop_filter.h"
+#include "host/filter/prop_attach.h"
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 
 namespace {
-const char* kTempList = "_TempPropList";
 const char* kNewObj = "TA_LUN_NEW_OBJ";
 const char* kFromUcf = "FROM_UCF";
 const char* kFromNcf = "FROM_NCF";
-
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "lunbase", line, "1.0"); }
 }  // namespace
 
 template <class MakeEntry>
@@ -23,12 +20,8 @@ unsigned char Ta_LunBase::Attach(const char* name, Ndm_PropertyHolder* object,
         if (object->GetPropertyByName(kFromUcf)) return 1;
         object->CreatePropertyBool(kNewObj);
     }
-    object->DeleteProperty(kTempList);
-    Ndm_Property* list = object->CreatePropertyList(kTempList);
-    make_entry(list);
     if (!prop_filter) prop_filter = new Ndh_PropInFilter(filter_filename ? filter_filename : "ucf.pfd", nullptr);
-    Ndh_PropFiltResult result = prop_filter->FilterProp(list, object);
-    object->DeleteProperty(list);
+    Ndh_PropFiltResult result = Ndh_FilterOnto(*prop_filter, object, make_entry);
     if (!ConstraintDRC(result, name, handle)) return 0;
     AddConstraintToList(name, object);
     return 1;
@@ -60,8 +53,12 @@ unsigned char Ta_LunBase::AttachConstraint(const char* name, double value, Ndm_P
 
 unsigned char Ta_LunBase::ConstraintDRC(const Ndh_PropFiltResult& result, const char* name,
                                         const Pr_Logical_ConstraintHandle* handle) {
-    int line = handle ? handle->getline() : 0;
-    const char* file = constraint_filename;
+    return Ta_LunReportVerdict(result, name, constraint_filename, handle ? handle->getline() : 0, "lunbase");
+}
+
+unsigned char Ta_LunReportVerdict(const Ndh_PropFiltResult& result, const char* name, const char* file, int line,
+                                  const char* module) {
+    auto Msg = [module](int at) { return Port_MsgManData::createObject("Quillmap", module, at, "1.0"); };
     if (result.Succeed()) return 1;
     if (result.BadPropName()) {
         Msg(__LINE__).issueError("Line %i in '%s': '%s' is an invalid constraint name.\n", line, file, name);
@@ -95,11 +92,7 @@ unsigned char Ta_LunBase::ConstraintDRC(const Ndh_PropFiltResult& result, const 
 unsigned char Ta_LunBase::AddConstraintToList(const char* name, Ndm_PropertyHolder* object) {
     const char* list_name = file_type == CP_UCF ? kFromUcf : file_type == CP_NCF ? kFromNcf : nullptr;
     if (!list_name || !object) return 1;
-    char* upper = UT_STR::Upper(UT_STR::Dup(name ? name : ""));
-    Ndm_Property* list = object->GetPropertyByName(list_name);
-    if (!list) list = object->CreatePropertyStringList(list_name);
-    list->AddString(upper);
-    delete[] upper;
+    Ndh_RecordConstraintName(object, list_name, name);
     return 1;
 }
 

@@ -95,3 +95,9 @@ private:
     // search the hierarchy again; a cached block is checked before it is reused.
     Ndm_Block* block_cache_[3] = {nullptr, nullptr, nullptr};
 };
+
+// Turns a filter verdict for the constraint name into the messages of an attachment, located
+// at file and line and issued for module ("lunbase" for the annotators); 0 only for an
+// unknown name.
+unsigned char Ta_LunReportVerdict(const Ndh_PropFiltResult& result, const char* name, const char* file, int line,
+                                  const char* module);

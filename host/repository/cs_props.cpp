@@ -3,7 +3,7 @@
 #include <cstring>
 
 #include "host/design/ndm.h"
-#include "host/filter/prop_filter.h"
+#include "host/filter/prop_attach.h"
 #include "host/parser/pr_logical.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
@@ -16,14 +16,12 @@ namespace {
 // annotators do: a temporary list, the filter's verdict, the name recorded in FROM_UCF.
 bool Attach(Ndh_PropInFilter& filter, Ndm_PropertyHolder* object, const char* name, const char* value,
             Cs_ReturnCode& outcome, const Cs_Constraint& c) {
-    object->DeleteProperty("_TempPropList");
-    Ndm_Property* list = object->CreatePropertyList("_TempPropList");
-    if (value)
-        list->CreatePropertyString(name, value);
-    else
-        list->CreatePropertyBool(name);
-    Ndh_PropFiltResult verdict = filter.FilterProp(list, object);
-    object->DeleteProperty(list);
+    Ndh_PropFiltResult verdict = Ndh_FilterOnto(filter, object, [&](Ndm_Property* list) {
+        if (value)
+            list->CreatePropertyString(name, value);
+        else
+            list->CreatePropertyBool(name);
+    });
     if (verdict.BadPropName() || verdict.BadDataType()) {
         outcome.Add(std::make_shared<Cs_Status_Resolution>(
             Cs_StatusID::NO_RESOLVED_ASSOCIATIONS, Cs_Status::WARNING, 82,
@@ -32,12 +30,7 @@ bool Attach(Ndh_PropInFilter& filter, Ndm_PropertyHolder* object, const char* na
             &c));
         return false;
     }
-    std::string upper(name);
-    for (char& ch : upper)
-        if (ch >= 'a' && ch <= 'z') ch = static_cast<char>(ch - 32);
-    Ndm_Property* names = object->GetPropertyByName("FROM_UCF");
-    if (!names) names = object->CreatePropertyStringList("FROM_UCF");
-    names->AddString(upper.c_str());
+    Ndh_RecordConstraintName(object, "FROM_UCF", name);
     return true;
 }
 
