@@ -17,7 +17,7 @@ std::wstring Cs_Status::GetLocalizedMsg() const {
 
 void Cs_Status::Report() const {
     Port_MsgManData msg = Port_MsgManData::createObject("Quillmap", "repository", __LINE__, "1.0");
-    std::string text = message_ + "\n";
+    std::string text = ReportText() + "\n";
     switch (severity_) {
         case INFO: msg.issueInfo("%s", text.c_str()); break;
         case WARNING: msg.issueWarning("%s", text.c_str()); break;
@@ -40,6 +40,11 @@ const Cs_SourceFile* Cs_Status_Parse::GetSourceFile() const {
 }
 
 Cs_Status* Cs_Status_Parse::Clone() const { return new Cs_Status_Parse(*this); }
+
+std::string Cs_Status_Parse::ReportText() const {
+    if (GetID() != Cs_StatusID::PARSE_ERROR) return GetMessage();
+    return Port_Format("Line %d in '%s': %s", line_, file_->c_str(), GetMessage().c_str());
+}
 
 Cs_Status_Resolution::Cs_Status_Resolution(Cs_StatusID id, SEVERITY severity, int number, std::string message,
                                            const Cs_Constraint* constraint)

@@ -39,10 +39,14 @@ public:
     // The message as bytes.
     const std::string& GetMessage() const { return message_; }
     // Issues the message through the message manager (program "Quillmap", module
-    // "repository") with the status's severity.
+    // "repository") with the status's severity; a parse error is located by its file and line.
     void Report() const;
     // A copy, owned by the caller.
     virtual Cs_Status* Clone() const;
+
+protected:
+    // The line Report issues, without its line end.
+    virtual std::string ReportText() const { return message_; }
 
 private:
     Cs_StatusID id_;
@@ -59,6 +63,9 @@ public:
     // Where: the file and the statement's line (0 for a whole file).
     const Cs_SourceFile* GetSourceFile() const;
     Cs_Status* Clone() const override;
+
+protected:
+    std::string ReportText() const override;
 
 private:
     std::shared_ptr<const std::string> file_;  // shared by copies

@@ -7,9 +7,21 @@
 
 namespace Util {
 
+// Thrown when a member is called where it must not be; carries who threw it and where.
 class IllegalMethodCalledException : public std::logic_error {
 public:
     explicit IllegalMethodCalledException(const std::string& what) : std::logic_error(what) {}
+    IllegalMethodCalledException(const std::string& program, const std::string& file, const std::string& revision,
+                                 int line, const std::string& message)
+        : std::logic_error(message), program_(program), file_(file), revision_(revision), line_(line) {}
+    const std::string& program() const { return program_; }
+    const std::string& file() const { return file_; }
+    const std::string& revision() const { return revision_; }
+    int line() const { return line_; }
+
+private:
+    std::string program_, file_, revision_;
+    int line_ = 0;
 };
 
 namespace Details {
