@@ -6,6 +6,8 @@
 // the whole road.
 #pragma once
 
+#include <cstdint>
+
 #include "host/filter/prop_filter.h"
 #include "host/port/string_base.h"
 #include "host/repository/cs_mgr.h"
@@ -18,7 +20,8 @@ class Ndm_View;
 class Ta_LunCSHelper {
 public:
     // Bridge modes, read from "ZEP_QUILLMAP_CS" by GetMode; the host acts on them.
-    enum MODE { NO_CS = 1, CREATE_BCD = 2, WRITE_BACK = 3 };
+    // 32 bits wide: the host also meets the unnamed value 4, and 0 before the mode is read.
+    enum MODE : int32_t { NO_CS = 1, CREATE_BCD = 2, WRITE_BACK = 3 };
     // DRC levels, from "ZEP_QUILLMAP_CONSTRAINT_DRC".
     enum DRC_LEVEL { NONE = 0, WARN_ONLY = 10, NORMAL = 20, STRICT = 30 };
 
