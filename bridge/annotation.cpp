@@ -3,6 +3,7 @@
 #include <memory>
 #include <string>
 
+#include "bridge/bridge_messages.h"
 #include "bridge/luncshelper.h"
 #include "frame/lunbase.h"
 #include "host/design/ndm.h"
@@ -10,9 +11,9 @@
 #include "host/parser/pr_logical.h"
 #include "host/port/msgman.h"
 
-namespace {
+using luncshelper::Msg;
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "luncshelper", line, "1.0"); }
+namespace {
 
 bool Matches(const Port::StringBase<char>& key, const char* word) {
     return key.Compare(word, Port::StringBase<char>::IGNORE_CASE) == 0;
@@ -26,11 +27,10 @@ bool IsRange(const std::string& key) {
     return false;
 }
 
-// Loads files into mgr: one file replaces its constraints; several are removed and added
-// again inside one bulk bracket and then read. trace_each tells how each file is announced.
+// Loads several files into mgr: each is removed and added again inside one bulk bracket, then
+// all are read; status_per_file tells whether each is announced as a status or a trace line.
 Cs_ReturnCode Load(Cs_ConstraintMgr& mgr, Util_FNameGroup* files, int count, const char* multi_trace,
                    bool status_per_file) {
-    Cs_ReturnCode outcome;
     Port_MsgManData::debugStub(multi_trace, count);
     mgr.SetBulkConstraintMode(true);
     for (int i = 0; i < count; ++i) {
@@ -40,8 +40,8 @@ Cs_ReturnCode Load(Cs_ConstraintMgr& mgr, Util_FNameGroup* files, int count, con
             Msg(__LINE__).issueStatus("Annotating constraints to design from ucf file \"%s\" ...\n", file);
         else
             Port_MsgManData::debugStub("Annotating constraints to design from ucf file \"%s\" ...\n", file);
-        outcome = mgr.RemoveConstraintSource(file);
-        outcome = mgr.AddConstraintSource(file, Cs_ConstraintSyntax::UCF);
+        mgr.RemoveConstraintSource(file);
+        mgr.AddConstraintSource(file, Cs_ConstraintSyntax::UCF);
     }
     mgr.SetBulkConstraintMode(false);
     return mgr.UpdateConstraintsFromSource();
@@ -194,16 +194,8 @@ bool Ta_LunCSHelper::Check_Buffer_Type(Cs_Constraint_Unsupported* constraint, co
     const char* file = sourceFile && sourceFile->GetFile() ? sourceFile->GetFile() : "<not avail>";
     const int line = sourceFile ? sourceFile->GetLine() : -999;
     if (object)
-        Msg(__LINE__).issueError(
-            "BUFFER_TYPE attribute on AUTOBUF instance <%s> is being modified in %s file %s on line number %i.  "
-            "This functionality is not supported in this release of OVI.  It is suggested to remove this line from "
-            "the %s file and modify the source code accordingly to modify the buffer specification if needed.\n",
-            object->GetName(), fileKind, file, line, fileKind);
+        Msg(__LINE__).issueError(luncshelper::kBufferTypeOnInstance, object->GetName(), fileKind, file, line, fileKind);
     else
-        Msg(__LINE__).issueError(
-            "BUFFER_TYPE attribute on AUTOBUF instance is being modified in %s file %s on line number %i.  This "
-            "functionality is not supported in this release of OVI.  It is suggested to remove this line from the "
-            "%s file and modify the source code accordingly to modify the buffer specification if needed.\n",
-            fileKind, file, line, fileKind);
+        Msg(__LINE__).issueError(luncshelper::kBufferType, fileKind, file, line, fileKind);
     return true;
 }

@@ -2,14 +2,15 @@
 #include <memory>
 #include <string>
 
+#include "bridge/bridge_messages.h"
 #include "bridge/luncshelper.h"
 #include "host/design/ndm.h"
 #include "host/port/env.h"
 #include "host/port/msgman.h"
 
-namespace {
+using luncshelper::Msg;
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "luncshelper", line, "1.0"); }
+namespace {
 
 bool IsIO(const Cs_Constraint& c) {
     const Cs_ConstraintType& t = c.GetType();

@@ -1,4 +1,5 @@
 // Ta_LunCSHelper: DRC level and status reporting; modes, set-up, copies and commit.
+#include "bridge/bridge_messages.h"
 #include "bridge/luncshelper.h"
 
 #include <map>
@@ -13,9 +14,9 @@
 #include "host/port/stream.h"
 #include "host/util/shared_resource.h"
 
-namespace {
+using luncshelper::Msg;
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "luncshelper", line, "1.0"); }
+namespace {
 
 constexpr int kManagerKey = 1234321;
 
@@ -206,13 +207,7 @@ bool Ta_LunCSHelper::Init(Ndm_Design* design) {
     Cs_Filter_ConstraintType filter(Cs_Constraint_Unsupported::Type());
     for (Cs_Constraint* c : m_cmgr->GetConstraints(filter, Cs_ConstraintMgr::ACTIVE)) {
         auto* u = static_cast<Cs_Constraint_Unsupported*>(c);
-        if (u->GetKey().str() != "BUFFER_TYPE") continue;
-        const Cs_SourceFile* where = u->GetSourceInfo()->GetSourceFile();
-        Msg(__LINE__).issueError(
-            "BUFFER_TYPE attribute on AUTOBUF instance is being modified in %s file %s on line number %i.  This "
-            "functionality is not supported in this release of OVI.  It is suggested to remove this line from the "
-            "%s file and modify the source code accordingly to modify the buffer specification if needed.\n",
-            "UCF", where ? where->GetFile() : "<not avail>", where ? where->GetLine() : -999, "UCF");
+        Check_Buffer_Type(u, u->GetSourceInfo()->GetSourceFile(), nullptr, "UCF");  // the form without an instance
     }
     return true;
 }

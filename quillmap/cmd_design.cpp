@@ -36,9 +36,7 @@ std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const st
 }
 
 Ndm_View* QuillmapWorkView(Ndm_Design& design, const std::string& path, const char* purpose) {
-    Ndm_View* view = design.GetViewByName("EXPANDED");
-    if (!view && !design.GetViewItr().empty()) view = design.GetViewItr().front();
-    if (view && view->GetBlock()) return view;
+    if (Ndm_View* view = design.GetWorkView()) return view;
     Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
         .issueError("Design '%s' has no view to %s.\n", path.c_str(), purpose);
     return nullptr;

@@ -26,13 +26,13 @@ public:
         return UT_STR::ICompare(name, "PART") != 0 || Ta_LunPart::cb_config(name, value, handle);
     }
     bool cb_comp(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override {
-        return Watch(handle, [&] { return Ta_LunPart::cb_comp(defn, handle); });
+        return Watch(defn, handle, [&] { return Ta_LunPart::cb_comp(defn, handle); });
     }
     bool cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override {
-        return Watch(handle, [&] { return Ta_LunPart::cb_net(defn, handle); });
+        return Watch(defn, handle, [&] { return Ta_LunPart::cb_net(defn, handle); });
     }
     bool cb_pin(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle) override {
-        return Watch(handle, [&] { return Ta_LunPart::cb_pin(defn, handle); });
+        return Watch(defn, handle, [&] { return Ta_LunPart::cb_pin(defn, handle); });
     }
     bool cb_error(int, int, const char*) override { return true; }
     bool cb_syntax_error(int, int, const char*, const Pr_Logical_ConstraintHandle*) override { return true; }
@@ -43,8 +43,14 @@ private:
         const Ndm_Property* part = config ? config->GetPropertyByName("PART") : nullptr;
         return part && part->GetValueString() ? part->GetValueString() : "";
     }
+    // Statements without a PART constraint (nearly all) go straight through: looking for the
+    // CONFIG block searches the hierarchy.
     template <class F>
-    bool Watch(const Pr_Logical_ConstraintHandle* handle, F&& handle_statement) {
+    bool Watch(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_ConstraintHandle* handle, F&& handle_statement) {
+        bool part = false;
+        for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it)
+            part = part || ((*it)->get_type() == Pr_Logical_Constraint::STRING && UT_STR::Compare((*it)->get_name(), "PART") == 0);
+        if (!part) return handle_statement();
         std::string before = Part();
         bool ok = handle_statement();
         std::string after = Part();

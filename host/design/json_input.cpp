@@ -15,12 +15,6 @@ namespace Ndm_JsonInput {
 
 namespace {
 
-// The UTF-8 form of a code point that stands for one byte (U+F780..U+F7FF: EF 9E xx, EF 9F xx).
-bool IsLiteralByteEscape(const char* p) {
-    return static_cast<unsigned char>(p[0]) == 0xEF &&
-           (static_cast<unsigned char>(p[1]) == 0x9E || static_cast<unsigned char>(p[1]) == 0x9F);
-}
-
 // Files at least this large are mapped rather than read.
 constexpr size_t kMapAtLeast = 1 << 20;
 
@@ -188,7 +182,7 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
         if (c == '\\') {
             if (!escape) escape = p;
             ++p;
-        } else if (bytes && !escape && IsLiteralByteEscape(p)) {
+        } else if (bytes && !escape && Port_IsByteEscape(p)) {
             escape = p;
         }
     }
@@ -200,9 +194,8 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
     scratch.assign(begin, static_cast<size_t>(escape - begin));
     for (p = escape; p < end; ++p) {
         if (*p != '\\') {
-            if (bytes && end - p >= 3 && IsLiteralByteEscape(p)) {
-                scratch += static_cast<char>(0x80 + ((static_cast<unsigned char>(p[1]) - 0x9E) << 6) +
-                                             (static_cast<unsigned char>(p[2]) - 0x80));
+            if (bytes && end - p >= 3 && Port_IsByteEscape(p)) {
+                scratch += Port_ByteOfEscape(p);
                 p += 2;
                 continue;
             }

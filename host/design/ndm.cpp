@@ -554,6 +554,12 @@ Ndm_View* Ndm_Design::GetViewByName(const char* name) const {
     return nullptr;
 }
 
+Ndm_View* Ndm_Design::GetWorkView() const {
+    Ndm_View* view = GetViewByName("EXPANDED");
+    if (!view && !views_.empty()) view = views_.front();
+    return view && view->GetBlock() ? view : nullptr;
+}
+
 Ndm_View* Ndm_Design::CreateView(const char* name) {
     if (!name) return nullptr;
     if (Ndm_View* v = GetViewByName(name)) return v;

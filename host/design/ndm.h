@@ -255,6 +255,9 @@ public:
     void SetName(std::string_view name) { name_ = Intern(name); }
     // View of that name, or null.
     Ndm_View* GetViewByName(const char* name) const;
+    // The view tools work on: EXPANDED, else the first view; null when that view has no top
+    // block.
+    Ndm_View* GetWorkView() const;
     // Views in creation order.
     std::span<Ndm_View* const> GetViewItr() const { return views_; }
     // Creates a view; returns the existing one when the name is taken.

@@ -433,6 +433,12 @@ std::string Ndh_PropInFilter::CanonicalName(const char* name) const {
     return Lookup(*defs_, name, kAllKinds).stored;
 }
 
+bool Ndh_PropInFilter::KeepsEveryValue(const char* name, const char* kind) const {
+    if (!defs_ || !name || !kind) return false;
+    Match m = Lookup(*defs_, name, KindWord(kind));
+    return m.def && m.def->type == ValueType::StringList;
+}
+
 Ndh_PropFiltResult Ndh_PropInFilter::FilterProp(Ndm_Property* list, Ndm_PropertyHolder* object) {
     if (!list || !object || list->GetType() != NDM_PROP_LIST || list->GetNumEntries() != 1)
         return R();

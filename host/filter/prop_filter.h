@@ -74,6 +74,10 @@ public:
     // Canonical (stored) spelling of a constraint name for any object kind, or the empty text
     // when the name is unknown. For tools and checks of definition files.
     std::string CanonicalName(const char* name) const;
+    // True when the definitions keep every value of the constraint name on an object of kind
+    // (a kind word of the definition file: "inst", "net", "pin", "config", ...): its type is
+    // stringlist, so a later value adds to the earlier ones instead of replacing them.
+    bool KeepsEveryValue(const char* name, const char* kind) const;
 
 private:
     std::shared_ptr<const ndh_filter::Definitions> defs_;

@@ -26,22 +26,15 @@ void AppendEscape(std::string& out, unsigned code) {
     out += hex;
 }
 
-// True for the UTF-8 form of a code point that stands for a byte (EF 9E xx, EF 9F xx).
-bool IsByteEscapeCodePoint(const char* p) {
-    return static_cast<unsigned char>(p[0]) == 0xEF &&
-           (static_cast<unsigned char>(p[1]) == 0x9E || static_cast<unsigned char>(p[1]) == 0x9F);
-}
-
 }  // namespace
 
 std::string Port_DecodeByteEscapes(std::string_view utf8) {
     std::string out;
     out.reserve(utf8.size());
     for (size_t i = 0; i < utf8.size(); ++i) {
-        if (i + 2 < utf8.size() && IsByteEscapeCodePoint(utf8.data() + i) &&
+        if (i + 2 < utf8.size() && Port_IsByteEscape(utf8.data() + i) &&
             (static_cast<unsigned char>(utf8[i + 2]) & 0xC0) == 0x80) {
-            out += static_cast<char>(0x80 + ((static_cast<unsigned char>(utf8[i + 1]) - 0x9E) << 6) +
-                                     (static_cast<unsigned char>(utf8[i + 2]) - 0x80));
+            out += Port_ByteOfEscape(utf8.data() + i);
             i += 2;
         } else {
             out += utf8[i];
@@ -61,7 +54,7 @@ void Port_AppendJsonString(std::string& out, std::string_view text) {
         }
         if (c >= 0x80) {
             size_t n = Port_Utf8SequenceLength(text.substr(i));
-            if (n && !(n == 3 && IsByteEscapeCodePoint(text.data() + i))) {
+            if (n && !(n == 3 && Port_IsByteEscape(text.data() + i))) {
                 i += n;
                 continue;
             }

@@ -16,6 +16,19 @@
 constexpr uint32_t kPort_ByteEscapeFirst = 0xF780;
 constexpr uint32_t kPort_ByteEscapeLast = 0xF7FF;
 
+// True when p starts the UTF-8 form of a code point that stands for a byte (EF 9E xx or
+// EF 9F xx, U+F780..U+F7FF); p must hold at least two bytes.
+inline bool Port_IsByteEscape(const char* p) {
+    return static_cast<unsigned char>(p[0]) == 0xEF &&
+           (static_cast<unsigned char>(p[1]) == 0x9E || static_cast<unsigned char>(p[1]) == 0x9F);
+}
+
+// The byte that the three UTF-8 bytes at p (a byte escape) stand for.
+inline char Port_ByteOfEscape(const char* p) {
+    return static_cast<char>(0x80 + ((static_cast<unsigned char>(p[1]) - 0x9E) << 6) +
+                             (static_cast<unsigned char>(p[2]) - 0x80));
+}
+
 // Appends text as a JSON string literal (quotes included): ", \ and control bytes escaped,
 // valid UTF-8 copied as it is, other bytes as byte escapes (above).
 void Port_AppendJsonString(std::string& out, std::string_view text);

@@ -109,7 +109,7 @@ public:
     virtual const Cs_ConstraintType& GetType() const = 0;
     Cs_Scope GetScope() const { return scope_; }
     // The name the statement gives: the object name or pattern of INST, NET, PIN, the group,
-    // specification, area-group or set name; empty for design-wide settings and comments.
+    // TIMESPEC, area-group or set name; empty for design-wide settings and comments.
     const char* GetTarget() const { return target_; }
     // The attribute as a property name (LOC, TNM_NET, PERIOD, the TIMESPEC name, ...).
     const char* GetAttribute() const { return key_; }
@@ -126,13 +126,13 @@ public:
     std::string GetMsgName() const;
 
     // Constraints that name no design object by nature: design-wide settings, timing
-    // specifications and groups, area groups, sets and comments.
+    // statements and groups, area groups, sets and comments.
     bool IsAssociationExempt() const;
 
     // Resolution results (Cs_ConstraintMgr::SetDesign, UpdateConstraintsFromSource).
     const std::vector<Ndm_PropertyHolder*>& GetAssociatedDesignObjs() const { return objects_; }
     const std::vector<const Cs_Constraint*>& GetAssociatedConstraints() const { return constraints_; }
-    // The group names a timing specification's paths run through (FROM, THRU, TO), as written.
+    // The group names a TIMESPEC's paths run through (FROM, THRU, TO), as written.
     const std::vector<const char*>& GetAssociatedPaths() const { return paths_; }
     const std::vector<Cs_Conflict>& GetConflicts() const { return conflicts_; }
 

@@ -52,10 +52,10 @@ Cs_ConstraintMgr::Source& Cs_ConstraintMgr::AddSource(const std::string& name, i
     return sources_.back();
 }
 
-Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source) {
+Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const Pr_FileText> text) {
     Cs_ReturnCode outcome;
     const std::string name = source.info->GetFileName();
-    std::shared_ptr<const Pr_FileText> text = Pr_FileText::Read(name.c_str());
+    if (!text) text = Pr_FileText::Read(name.c_str());
     if (!text) {
         outcome.Add(FileError(name, "it cannot be opened or read"));
         return outcome;
@@ -110,10 +110,13 @@ void Cs_ConstraintMgr::SetBulkConstraintMode(bool on) {
 
 Cs_ReturnCode Cs_ConstraintMgr::UpdateConstraintsFromSource() {
     Cs_ReturnCode outcome;
-    std::vector<Cs_FileInfo*> stale = GetOutOfDateConstraintSources();
-    for (Source& s : sources_)
-        if (std::find(stale.begin(), stale.end(), s.info.get()) != stale.end()) outcome.Append(ReadSource(s));
-    bulk_changed_ = bulk_changed_ || !stale.empty();
+    // Each source is read once: the content that shows it changed is the content parsed.
+    for (Source& s : sources_) {
+        std::shared_ptr<const Pr_FileText> text;
+        if (!IsStale(s, text)) continue;
+        outcome.Append(ReadSource(s, text));
+        bulk_changed_ = true;
+    }
     if (!bulk_ && bulk_changed_) outcome.Append(Changed());
     return outcome;
 }
@@ -127,15 +130,16 @@ std::vector<Cs_FileInfo*> Cs_ConstraintMgr::GetConstraintSources() const {
 std::vector<Cs_FileInfo*> Cs_ConstraintMgr::GetOutOfDateConstraintSources() const {
     std::vector<Cs_FileInfo*> out;
     for (const Source& s : sources_) {
-        const Cs_FileInfo& info = *s.info;
-        bool stale = !info.read_;
-        if (!stale) {
-            std::shared_ptr<const Pr_FileText> text = Pr_FileText::Read(info.GetFileName());
-            stale = !text || text->size() != info.size_ || ContentHash(*text) != info.hash_;
-        }
-        if (stale) out.push_back(s.info.get());
+        std::shared_ptr<const Pr_FileText> text;
+        if (IsStale(s, text)) out.push_back(s.info.get());
     }
     return out;
+}
+
+bool Cs_ConstraintMgr::IsStale(const Source& source, std::shared_ptr<const Pr_FileText>& text) {
+    const Cs_FileInfo& info = *source.info;
+    text = Pr_FileText::Read(info.GetFileName());
+    return !info.read_ || !text || text->size() != info.size_ || ContentHash(*text) != info.hash_;
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::CreateConstraints(const Port::StringBase<char>& text, int syntax,

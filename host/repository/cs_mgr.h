@@ -15,6 +15,7 @@
 #include "host/repository/cs_status.h"
 
 class Ndm_Design;
+class Pr_FileText;
 class Ndm_Property;
 
 // For tests: called at each step of a commit ("open", "write", "sync", "rename"); false makes
@@ -116,8 +117,10 @@ private:
 
     Source* FindSource(const std::string& name);
     Source& AddSource(const std::string& name, int syntax);
-    // Reads one source, replacing its constraints.
-    Cs_ReturnCode ReadSource(Source& source);
+    // Reads one source, replacing its constraints; text is its content when already read.
+    Cs_ReturnCode ReadSource(Source& source, std::shared_ptr<const Pr_FileText> text = nullptr);
+    // Whether a source differs from what was read; text gets its current content.
+    static bool IsStale(const Source& source, std::shared_ptr<const Pr_FileText>& text);
     // After sources changed: resolves again unless in bulk mode.
     Cs_ReturnCode Changed();
     // Resolution of every constraint (cs_resolve.cpp).

@@ -7,28 +7,31 @@
 
 #include "host/design/ndm.h"
 #include "host/design/ndm_lookup.h"
+#include "host/filter/prop_filter.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
 
 namespace {
 
-// The view names are resolved in: EXPANDED, else the first view.
-Ndm_View* WorkView(const Ndm_Design* design) {
-    if (!design) return nullptr;
-    Ndm_View* view = const_cast<Ndm_Design*>(design)->GetViewByName("EXPANDED");
-    if (!view && !design->GetViewItr().empty()) view = design->GetViewItr().front();
-    return view && view->GetBlock() ? view : nullptr;
+
+// The kind word of the property filter for the objects a scope's constraints sit on.
+const char* FilterKind(Cs_Scope scope) {
+    switch (scope) {
+        case Cs_Scope::Instance: return "inst";
+        case Cs_Scope::Net: return "net";
+        case Cs_Scope::Pin: return "pin";
+        default: return "config";  // design-wide settings, area-group and set attributes
+    }
 }
 
-// Attributes an object keeps several values of, in order (their properties are string lists):
-// a later one adds to an earlier one rather than overriding it.
-bool Accumulates(const char* key) {
-    static const char* const kLists[] = {"TNM", "TNM_NET", "TIG", "TPSYNC", "TPTHRU", "OFFSET", "ENABLE", "DISABLE",
-                                         "PROHIBIT", "VREF", "DCI_CASCADE", "RANGE", "COMPRESSION",
-                                         "PLACE", "GROUP", "MODE", "IMPLEMENT", "RLOC_ORIGIN"};
-    for (const char* k : kLists)
-        if (std::strcmp(k, key) == 0) return true;
-    return false;
+// Constraints that add to the earlier ones rather than override them: attributes the
+// repository's property definitions (ucf.prp) keep every value of, and the timing entries
+// that a TIMESPEC block lists side by side (global offsets, ENABLE, DISABLE).
+bool Accumulates(const Ndh_PropInFilter& filter, const Cs_Constraint& c) {
+    if (c.GetScope() == Cs_Scope::TimeSpec)
+        for (const char* key : {"OFFSET", "ENABLE", "DISABLE"})
+            if (std::strcmp(c.GetAttribute(), key) == 0) return true;
+    return filter.KeepsEveryValue(c.GetAttribute(), FilterKind(c.GetScope()));
 }
 
 // The group a membership constraint (TNM, TNM_NET, TPSYNC, TPTHRU) defines: its value, after
@@ -60,7 +63,8 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
             groups[c->target_].push_back(c);
     }
 
-    Ndm_View* view = WorkView(design_);
+    Ndm_View* view = design_ ? design_->GetWorkView() : nullptr;
+    const Ndh_PropInFilter filter("ucf.prp", nullptr);
     // Names are found as the annotator of the source's file kind finds them: a UCF falls back
     // to other letter cases and tries ".PAD"; an NCF does neither.
     std::unique_ptr<Ndm_ObjectFinder> ucf_finder, ncf_finder;
@@ -114,7 +118,7 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
                     Port_Format("%s matches no object of the design.", c->GetMsgName().c_str()), c));
             }
         }
-        // Group references of timing specifications, groups and offsets.
+        // Group references of TIMESPEC statements, groups and offsets.
         bool missing = false;
         for (const char* g : c->paths_) {
             auto it = groups.find(g);
@@ -132,7 +136,7 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
 
         // Overrides: a later constraint setting the same attribute of the same object (or of
         // the design) to another value wins over the earlier one.
-        if (c->scope_ == Cs_Scope::Comment || c->flag_ || Accumulates(c->key_) ||
+        if (c->scope_ == Cs_Scope::Comment || c->flag_ || Accumulates(filter, *c) ||
             std::strcmp(c->key_, "INVALID_CONSTRAINT:") == 0)
             continue;
         auto record = [&](const void* owner, Ndm_PropertyHolder* entity) {

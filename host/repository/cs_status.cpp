@@ -30,20 +30,15 @@ Cs_Status* Cs_Status::Clone() const { return new Cs_Status(*this); }
 Cs_Status_Parse::Cs_Status_Parse(Cs_StatusID id, int number, std::string message, std::string file, int line)
     : Cs_Status(id, ERROR, number, std::move(message)),
       file_(std::make_shared<const std::string>(std::move(file))),
-      line_(line) {}
+      source_(file_->c_str(), line) {}
 
 Cs_Status_Parse::~Cs_Status_Parse() = default;
-
-const Cs_SourceFile* Cs_Status_Parse::GetSourceFile() const {
-    if (!source_) source_ = std::make_shared<Cs_SourceFile>(file_->c_str(), line_);
-    return source_.get();
-}
 
 Cs_Status* Cs_Status_Parse::Clone() const { return new Cs_Status_Parse(*this); }
 
 std::string Cs_Status_Parse::ReportText() const {
     if (GetID() != Cs_StatusID::PARSE_ERROR) return GetMessage();
-    return Port_Format("Line %d in '%s': %s", line_, file_->c_str(), GetMessage().c_str());
+    return Port_Format("Line %d in '%s': %s", source_.GetLine(), file_->c_str(), GetMessage().c_str());
 }
 
 Cs_Status_Resolution::Cs_Status_Resolution(Cs_StatusID id, SEVERITY severity, int number, std::string message,

@@ -9,6 +9,8 @@
 #include <string>
 #include <vector>
 
+#include "host/repository/cs_constraint.h"
+
 class Cs_Constraint;
 class Cs_SourceFile;
 
@@ -61,16 +63,15 @@ public:
     Cs_Status_Parse(Cs_StatusID id, int number, std::string message, std::string file, int line);
     ~Cs_Status_Parse() override;
     // Where: the file and the statement's line (0 for a whole file).
-    const Cs_SourceFile* GetSourceFile() const;
+    const Cs_SourceFile* GetSourceFile() const { return &source_; }
     Cs_Status* Clone() const override;
 
 protected:
     std::string ReportText() const override;
 
 private:
-    std::shared_ptr<const std::string> file_;  // shared by copies
-    int line_;
-    mutable std::shared_ptr<Cs_SourceFile> source_;
+    std::shared_ptr<const std::string> file_;  // shared by copies, so source_ stays valid in them
+    Cs_SourceFile source_;
 };
 
 // A finding about one constraint (no design match, no associations).

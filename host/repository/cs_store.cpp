@@ -117,13 +117,6 @@ Ndm_PropertyHolder* FindObject(Ndm_View* view, const std::string& kind, const st
     return nullptr;
 }
 
-Ndm_View* WorkView(const Ndm_Design* design) {
-    if (!design) return nullptr;
-    auto* d = const_cast<Ndm_Design*>(design);
-    Ndm_View* view = d->GetViewByName("EXPANDED");
-    if (!view && !d->GetViewItr().empty()) view = d->GetViewItr().front();
-    return view;
-}
 
 class Db {
 public:
@@ -488,7 +481,7 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         c->parent_ = constraint(parent);
         if (c->parent_) c->constraints_.push_back(c->parent_);
     }
-    Ndm_View* view = WorkView(mgr.design_);
+    Ndm_View* view = mgr.design_ ? mgr.design_->GetWorkView() : nullptr;
     for (const Row& r : paths)
         if (Cs_Constraint* c = constraint(r[0])) c->paths_.push_back(staged.Text(Str(r[1])));
     for (const Row& r : assocs) {

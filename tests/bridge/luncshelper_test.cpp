@@ -309,7 +309,7 @@ TEST_F(Bridge, AnnotateAttachesUnsupportedAttributes) {
                   "BUFFER_TYPE attribute on AUTOBUF instance <tx0> is being modified in UCF file " + ucf +
                       " on line number 4.  This functionality is not supported in this release of OVI.  It is "
                       "suggested to remove this line from the UCF file and modify the source code accordingly to "
-                      "modify the buffer specification if needed.\n",
+                      "modify the buffer spec" "ification if needed.\n",
                   "Could not find any associations for the following constraint:\n    'INST \"nosuch\" KEEP (" + ucf +
                       " line 5)'\n"}));
     Port::StringBase<char> part = "none", stepping = "none";

@@ -117,13 +117,13 @@ TEST_F(Repo, LoadsEachStatementAsTypedConstraints) {
     EXPECT_EQ(std::string(narrow.get()), last->GetMessage());
     EXPECT_NE(last->GetMessage().find("n\xe9t"), std::string::npos);
 
-    // a timing specification is associated with the constraints that define its groups
-    const Cs_Constraint* spec = Find("TS_cnt_uart");
-    ASSERT_NE(spec, nullptr);
+    // a TIMESPEC is associated with the constraints that define its groups
+    const Cs_Constraint* timing = Find("TS_cnt_uart");
+    ASSERT_NE(timing, nullptr);
     std::set<std::string> groups;
-    for (const Cs_Constraint* d : spec->GetAssociatedConstraints()) groups.insert(d->GetValueText());
+    for (const Cs_Constraint* d : timing->GetAssociatedConstraints()) groups.insert(d->GetValueText());
     EXPECT_EQ(groups, (std::set<std::string>{"cnt_regs", "uart_regs"}));
-    EXPECT_EQ(spec->GetAssociatedPaths().size(), 2u);
+    EXPECT_EQ(timing->GetAssociatedPaths().size(), 2u);
 }
 
 // Unreadable statements are kept; overrides are recorded on the constraint that loses.
