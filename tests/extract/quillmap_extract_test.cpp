@@ -32,9 +32,9 @@ TEST_F(ExtractTest, QuillmapExtractToStdoutAndFile) {
     q->CreatePropertyInt32("SLEW", 20);
     ASSERT_TRUE(Ndm_WriteNative(design, in.c_str()));
     std::string norm = dir.path() + "/norm.qdf";
-    ASSERT_EQ(RunCommand(std::string(QUILLMAP_EXE) + " convert --normalize " + in + " -o " + norm, &out, &err), 0)
+    ASSERT_EQ(lun_test::Quillmap("convert --normalize " + in + " -o " + norm, &out, &err), 0)
         << err;
-    ASSERT_EQ(RunCommand(std::string(QUILLMAP_EXE) + " dump " + norm, &out, &err), 0) << err;
+    ASSERT_EQ(lun_test::Quillmap("dump " + norm, &out, &err), 0) << err;
     EXPECT_NE(out.find("  network \"q\" signals 1\n    % \"SLEW\" string \"SLOW\"\n"), std::string::npos) << out;
     ASSERT_EQ(RunCommand(exe + "-o " + file + " " + norm, &out, &err), 0) << err;
     EXPECT_EQ(out, "");

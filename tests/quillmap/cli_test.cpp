@@ -8,12 +8,9 @@ namespace {
 
 using lun_test::RunCommand;
 
-const std::string kExe = QUILLMAP_EXE;
 const std::string kExample = std::string(LUN_SOURCE_DIR) + "/examples/blinky/";
 
-int Quillmap(const std::string& args, std::string* out = nullptr, std::string* err = nullptr) {
-    return RunCommand(kExe + " " + args, out, err);
-}
+using lun_test::Quillmap;
 
 TEST(Cli, UsageAndVersion) {
     std::string out, err;

@@ -16,9 +16,7 @@ using lun_test::RunCommand;
 
 const std::string kBlinky = std::string(LUN_SOURCE_DIR) + "/examples/blinky/blinky.json";
 
-int Quillmap(const std::string& args, std::string* out = nullptr, std::string* err = nullptr) {
-    return RunCommand(std::string(QUILLMAP_EXE) + " " + args, out, err);
-}
+using lun_test::Quillmap;
 
 size_t Count(const std::string& text, const std::string& what) {
     size_t n = 0;

@@ -41,6 +41,50 @@ std::string PropText(const Ndm_PropertyHolder* holder, const char* name) {
     }
 }
 
+void ForEachObject(Ndm_View* view, const std::function<void(Ndm_PropertyHolder*)>& visit, bool with_top) {
+    std::vector<Ndm_Block*> stack{view->GetBlock()};
+    while (!stack.empty()) {
+        Ndm_Block* b = stack.back();
+        stack.pop_back();
+        if (b->GetPropertyByName("TYPE")) continue;  // a constraint block
+        if (b->GetParent() || with_top) visit(b);
+        for (Ndm_Pin* p : b->GetPinItr()) visit(p);
+        for (Ndm_Block* c : b->GetBlockItr()) stack.push_back(c);
+    }
+    for (Ndm_Network* n : view->GetNetworkItr()) visit(n);
+}
+
+std::set<std::string> ObjectProperties(Ndm_View* view, const std::function<bool(const std::string&)>& keep) {
+    std::set<std::string> out;
+    ForEachObject(view, [&](Ndm_PropertyHolder* o) {
+        for (const Ndm_Property* p : o->GetPropertyItr())
+            if (keep(p->GetName())) out.insert(o->GetFullName() + ": " + p->GetName() + " " + PropText(o, p->GetName()));
+    }, false);
+    return out;
+}
+
+int Quillmap(const std::string& args, std::string* out, std::string* err) {
+    return RunCommand(std::string(QUILLMAP_EXE) + " " + args, out, err);
+}
+
+ScopedEnv::ScopedEnv(const char* name, const char* value) : name_(name) {
+    if (const char* old = ::getenv(name)) {
+        old_ = old;
+        had_ = true;
+    }
+    if (value)
+        ::setenv(name, value, 1);
+    else
+        ::unsetenv(name);
+}
+
+ScopedEnv::~ScopedEnv() {
+    if (had_)
+        ::setenv(name_, old_.c_str(), 1);
+    else
+        ::unsetenv(name_);
+}
+
 std::string ScratchDir::Write(const std::string& name, const std::string& content) const {
     std::string file = path_ + "/" + name;
     std::ofstream out(file, std::ios::binary);

@@ -1,7 +1,9 @@
 // Shared helpers of the test programs: scratch directories and small files.
 #pragma once
 
+#include <functional>
 #include <memory>
+#include <set>
 #include <string>
 
 #include "host/design/ndm.h"
@@ -37,6 +39,31 @@ private:
 // Text of a property for comparisons: a string as it is, the texts of a string list joined
 // with " | ", a number in decimal; "<none>" for a missing property.
 std::string PropText(const Ndm_PropertyHolder* holder, const char* name);
+
+// Every object a constraint can sit on: blocks that are not constraint blocks (the top block
+// only with_top), pins, networks; in a stable order.
+void ForEachObject(Ndm_View* view, const std::function<void(Ndm_PropertyHolder*)>& visit, bool with_top = true);
+
+// The properties of those objects but the top block, as "full name: NAME text" (PropText), for
+// the names that keep says yes to.
+std::set<std::string> ObjectProperties(Ndm_View* view, const std::function<bool(const std::string&)>& keep);
+
+// Runs the built quillmap with args (a shell command line; redirections allowed).
+int Quillmap(const std::string& args, std::string* out = nullptr, std::string* err = nullptr);
+
+// Sets (or, with null, unsets) an environment variable until the end of the scope.
+class ScopedEnv {
+public:
+    ScopedEnv(const char* name, const char* value);
+    ~ScopedEnv();
+    ScopedEnv(const ScopedEnv&) = delete;
+    ScopedEnv& operator=(const ScopedEnv&) = delete;
+
+private:
+    const char* name_;
+    std::string old_;
+    bool had_ = false;
+};
 
 // Whole content of a file ("" when it cannot be read).
 std::string ReadFile(const std::string& path);

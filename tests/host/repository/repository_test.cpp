@@ -194,21 +194,10 @@ TEST_F(Repo, FindsTheObjectsTheAnnotatorFinds) {
     annotator.annotate(file_road->GetViewByName("EXPANDED"));
     // Objects carrying each probe on the file road, by full name.
     std::map<std::string, std::set<std::string>> annotated;
-    std::vector<const Ndm_PropertyHolder*> all;
-    Ndm_View* view = file_road->GetViewByName("EXPANDED");
-    std::vector<Ndm_Block*> stack{view->GetBlock()};
-    while (!stack.empty()) {
-        Ndm_Block* b = stack.back();
-        stack.pop_back();
-        all.push_back(b);
-        for (Ndm_Pin* p : b->GetPinItr()) all.push_back(p);
-        for (Ndm_Block* c : b->GetBlockItr()) stack.push_back(c);
-    }
-    for (Ndm_Network* n : view->GetNetworkItr()) all.push_back(n);
-    for (const Ndm_PropertyHolder* o : all)
+    lun_test::ForEachObject(file_road->GetViewByName("EXPANDED"), [&](Ndm_PropertyHolder* o) {
         if (const Ndm_Property* p = o->GetPropertyByName("TPSYNC"))
             for (const std::string& v : p->GetStrings()) annotated[v].insert(o->GetFullName());
-
+    });
     for (size_t i = 0; i < names.size(); ++i) {
         const Cs_Constraint* c = Find("TPSYNC", "", static_cast<int>(i));
         ASSERT_NE(c, nullptr);
@@ -240,29 +229,6 @@ TEST_F(Repo, SourcesOutOfDateAfterAnEdit) {
     EXPECT_EQ(Find("LOC", "btn"), nullptr);
 }
 
-// Every property of a design's objects (not constraint blocks), as "object: name type value".
-std::set<std::string> ObjectProperties(Ndm_View* view, const std::set<std::string>& names) {
-    std::set<std::string> out;
-    auto add = [&](const Ndm_PropertyHolder* o) {
-        for (const Ndm_Property* p : o->GetPropertyItr()) {
-            if (!names.count(p->GetName())) continue;
-            std::string text = o->GetFullName() + ": " + p->GetName() + " " + Ndm_PropTypeName(p->GetType()) + " ";
-            text += lun_test::PropText(o, p->GetName());
-            out.insert(text);
-        }
-    };
-    std::vector<Ndm_Block*> stack{view->GetBlock()};
-    while (!stack.empty()) {
-        Ndm_Block* b = stack.back();
-        stack.pop_back();
-        if (!b->GetPropertyByName("TYPE")) add(b);
-        for (Ndm_Pin* p : b->GetPinItr()) add(p);
-        for (Ndm_Block* c : b->GetBlockItr()) stack.push_back(c);
-    }
-    for (Ndm_Network* n : view->GetNetworkItr()) add(n);
-    return out;
-}
-
 // Write-back gives the typed constraints the properties the annotator gives them; take-in
 // turns properties back into constraints.
 TEST_F(Repo, WriteBackMatchesTheFileRoadAndTakeInReadsProperties) {
@@ -278,10 +244,11 @@ TEST_F(Repo, WriteBackMatchesTheFileRoadAndTakeInReadsProperties) {
     annotator.annotate(file_road->GetViewByName("EXPANDED"));
     const std::set<std::string> typed = {"LOC",    "IOSTANDARD", "DRIVE",    "SLEW",     "TNM",       "TNM_NET",
                                          "OFFSET", "PERIOD",     "MAXDELAY", "PROHIBIT", "AREA_GROUP"};
-    std::set<std::string> written = ObjectProperties(view, typed);
-    EXPECT_EQ(written, ObjectProperties(file_road->GetViewByName("EXPANDED"), typed));
-    EXPECT_TRUE(written.count("clk: LOC string P10"));
-    EXPECT_TRUE(written.count("led[3]: DRIVE int32 8"));
+    auto is_typed = [&](const std::string& name) { return typed.count(name) > 0; };
+    std::set<std::string> written = lun_test::ObjectProperties(view, is_typed);
+    EXPECT_EQ(written, lun_test::ObjectProperties(file_road->GetViewByName("EXPANDED"), is_typed));
+    EXPECT_TRUE(written.count("clk: LOC P10"));
+    EXPECT_TRUE(written.count("led[3]: DRIVE 8"));
 
     // take-in: the properties become constraints of no file
     Cs_ConstraintMgr taken;
