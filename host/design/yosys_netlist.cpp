@@ -1,0 +1,369 @@
+// The Yosys netlist reader, second half: the design built from the modules read, with the
+// hierarchy expanded, pins connected and networks formed.
+#include <algorithm>
+#include <cstring>
+#include <numeric>
+
+#include "host/design/yosys_reader_impl.h"
+#include "host/port/msgman.h"
+
+namespace ndm_yosys {
+
+// ---------------------------------------------------------------------------------------
+// Building
+
+bool Reader::ResolveTypes() {
+    for (Module& m : modules_) {
+        for (Cell& cell : m.cells) {
+            if (void* v = module_index_.Find(cell.type)) {
+                Module& sub = modules_[FromValue(v)];
+                sub.instantiated = true;
+                if (!sub.box)
+                    cell.sub = static_cast<int32_t>(FromValue(v));
+                else
+                    BoxDirections(m, cell, sub);
+            }
+        }
+    }
+    return true;
+}
+
+// Connections of a library cell without port_directions take them from its module.
+void Reader::BoxDirections(Module& m, const Cell& cell, Module& box) {
+    for (uint32_t k = 0; k < cell.num_conns; ++k) {
+        Conn& conn = m.conns[cell.first_conn + k];
+        if (conn.dir != Ndm_Dir::None) continue;
+        if (const Port* port = FindPort(box, conn.name)) conn.dir = port->dir;
+    }
+}
+
+std::string NameList(const std::vector<const char*>& names) {
+    std::string out;
+    for (size_t i = 0; i < names.size() && i < 5; ++i) {
+        if (i) out += ", ";
+        out += '\'';
+        out += names[i];
+        out += '\'';
+    }
+    if (names.size() > 5) out += ", ...";
+    return out;
+}
+
+bool Reader::ChooseTop(const char* top_module, uint32_t& top) {
+    if (top_module) {
+        const char* name = design_.FindInterned(StripEscape(top_module));
+        void* v = name ? module_index_.Find(name) : nullptr;
+        if (!v) return Error(Port_Format("Top module '%s' not found in '%s'.", top_module, path_));
+        top = static_cast<uint32_t>(FromValue(v));
+        return true;
+    }
+    std::vector<const char*> marked, free;
+    uint32_t marked_index = 0, free_index = 0;
+    for (uint32_t i = 0; i < modules_.size(); ++i) {
+        if (modules_[i].top_attr) {
+            marked.push_back(modules_[i].name);
+            marked_index = i;
+        }
+        if (!modules_[i].instantiated && !modules_[i].box) {
+            free.push_back(modules_[i].name);
+            free_index = i;
+        }
+    }
+    if (marked.size() == 1) {
+        top = marked_index;
+        return true;
+    }
+    if (marked.size() > 1)
+        return Error(Port_Format("Cannot tell the top module of '%s': modules %s all carry the \"top\" "
+                                 "attribute. Name the top module.",
+                                 path_, NameList(marked).c_str()));
+    if (free.size() == 1) {
+        top = free_index;
+        return true;
+    }
+    if (free.empty())
+        return Error(Port_Format("Cannot tell the top module of '%s': every module is instantiated by "
+                                 "another. Name the top module.",
+                                 path_));
+    return Error(Port_Format("Cannot tell the top module of '%s': modules %s are not instantiated by any "
+                             "other module. Name the top module.",
+                             path_, NameList(free).c_str()));
+}
+
+bool Reader::CheckCycles(uint32_t module, std::vector<uint32_t>& stack) {
+    Module& m = modules_[module];
+    if (m.state == 2) return true;
+    stack.push_back(module);
+    if (m.state == 1) {
+        auto first = std::find(stack.begin(), stack.end(), module);
+        std::string chain;
+        for (auto it = first; it != stack.end(); ++it) {
+            if (!chain.empty()) chain += " -> ";
+            chain += modules_[*it].name;
+        }
+        return Error(Port_Format("Module '%s' in '%s' instantiates itself: %s.", m.name, path_, chain.c_str()));
+    }
+    m.state = 1;
+    for (const Cell& cell : m.cells)
+        if (cell.sub >= 0 && !CheckCycles(static_cast<uint32_t>(cell.sub), stack)) return false;
+    m.state = 2;
+    stack.pop_back();
+    return true;
+}
+
+const Port* Reader::FindPort(Module& m, const char* name) {
+    if (m.ports.size() <= 8) {
+        for (const Port& p : m.ports)
+            if (p.name == name) return &p;
+        return nullptr;
+    }
+    if (!m.port_index.Find(m.ports.front().name))
+        for (size_t i = 0; i < m.ports.size(); ++i) m.port_index.InsertIfAbsent(m.ports[i].name, AsValue(i));
+    void* v = m.port_index.Find(name);
+    return v ? &m.ports[FromValue(v)] : nullptr;
+}
+
+// Name of bit i of a vector: the plain name for a single bit at index 0, else name[index]
+// where bit 0 is the least significant and index counts from offset (downwards when upto).
+const char* Reader::BitName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i) {
+    if (width == 1 && offset == 0) return name;
+    int64_t index = upto ? int64_t{offset} + width - 1 - i : int64_t{offset} + i;
+    name_buf_.assign(name);
+    name_buf_ += '[';
+    name_buf_ += std::to_string(index);
+    name_buf_ += ']';
+    return name_buf_.c_str();
+}
+
+uint32_t Reader::Alloc(uint32_t count) {
+    uint32_t base = static_cast<uint32_t>(parent_.size());
+    parent_.resize(parent_.size() + count);
+    std::iota(parent_.begin() + base, parent_.end(), base);
+    return base;
+}
+
+uint32_t Reader::Find(uint32_t id) {
+    while (parent_[id] != id) {
+        parent_[id] = parent_[parent_[id]];
+        id = parent_[id];
+    }
+    return id;
+}
+
+void Reader::Union(uint32_t a, uint32_t b) {
+    a = Find(a);
+    b = Find(b);
+    if (a == b) return;
+    // The smaller id (the earlier instance) stays the root.
+    if (a < b)
+        parent_[b] = a;
+    else
+        parent_[a] = b;
+}
+
+bool Reader::Expand(Ndm_Block* block, uint32_t module, uint32_t base) {
+    Module& m = modules_[module];
+    instances_.push_back({block, module, base});
+    block->Reserve(m.cells.size(), m.num_signals, 0);
+    for (const Net& net : m.nets)
+        for (uint32_t i = 0; i < net.bits.count; ++i)
+            block->CreateSignal(BitName(net.name, net.bits.count, net.offset, net.upto, i));
+    std::span<Ndm_Signal* const> signals = block->GetSignalItr();
+
+    for (const Cell& cell : m.cells) {
+        Ndm_Block* child = block->CreateBlock(cell.name);
+        child->SetTypeName(cell.type);
+        Module* sub = cell.sub >= 0 ? &modules_[cell.sub] : nullptr;
+        uint32_t num_pins = 0;
+        for (uint32_t k = 0; k < cell.num_conns; ++k) num_pins += m.conns[cell.first_conn + k].bits.count;
+        child->Reserve(0, 0, num_pins);
+        for (uint32_t k = 0; k < cell.num_conns; ++k) {
+            const Conn& conn = m.conns[cell.first_conn + k];
+            const Port* port = nullptr;
+            if (sub && !(port = FindPort(*sub, conn.name)))
+                return Error(Port_Format("Cell '%s' in module '%s' of '%s' connects port '%s', which module "
+                                         "'%s' does not have.",
+                                         cell.name, m.name, path_, conn.name, sub->name));
+            Ndm_Dir dir = port ? port->dir : conn.dir;
+            for (uint32_t i = 0; i < conn.bits.count; ++i) {
+                const char* name = port ? BitName(conn.name, conn.bits.count, port->offset, port->upto, i)
+                                        : BitName(conn.name, conn.bits.count, 0, false, i);
+                Ndm_Pin* pin = child->CreatePin(name, dir);
+                int32_t bit = m.bits[conn.bits.first + i];
+                if (bit >= 0 && m.bit_signal[bit] >= 0) pin->SetSignal(signals[m.bit_signal[bit]]);
+            }
+        }
+        if (!sub) continue;
+        uint32_t child_base = Alloc(sub->num_bits);
+        if (!Expand(child, static_cast<uint32_t>(cell.sub), child_base)) return false;
+        for (uint32_t k = 0; k < cell.num_conns; ++k) {
+            const Conn& conn = m.conns[cell.first_conn + k];
+            const Port* port = FindPort(*sub, conn.name);
+            uint32_t width = std::min(conn.bits.count, port->bits.count);
+            for (uint32_t i = 0; i < width; ++i) {
+                int32_t outer = m.bits[conn.bits.first + i];
+                int32_t inner = sub->bits[port->bits.first + i];
+                if (outer >= 0 && inner >= 0)
+                    Union(base + static_cast<uint32_t>(outer), child_base + static_cast<uint32_t>(inner));
+            }
+        }
+    }
+    return true;
+}
+
+// Pins of the top block: one per port bit, on the port's own netname when it has one.
+void Reader::TopPins(Ndm_Block* block, uint32_t module) {
+    Module& m = modules_[module];
+    std::span<Ndm_Signal* const> signals = block->GetSignalItr();
+    Ndm_PtrMap net_index;
+    for (size_t n = 0; n < m.nets.size(); ++n) net_index.InsertIfAbsent(m.nets[n].name, AsValue(n));
+    size_t num_pins = 0;
+    for (const Port& port : m.ports) num_pins += port.bits.count;
+    block->Reserve(0, 0, num_pins);
+    for (const Port& port : m.ports) {
+        void* v = net_index.Find(port.name);
+        const Net* net = v ? &m.nets[FromValue(v)] : nullptr;
+        bool same = net && net->bits.count == port.bits.count;
+        for (uint32_t i = 0; i < port.bits.count; ++i) {
+            Ndm_Pin* pin = block->CreatePin(BitName(port.name, port.bits.count, port.offset, port.upto, i), port.dir);
+            int32_t bit = m.bits[port.bits.first + i];
+            if (same)
+                pin->SetSignal(signals[m.net_first_signal[FromValue(v)] + i]);
+            else if (bit >= 0 && m.bit_signal[bit] >= 0)
+                pin->SetSignal(signals[m.bit_signal[bit]]);
+        }
+    }
+}
+
+// One network per connected set of bits carrying at least one signal; blocks join in preorder.
+// Within a block, the bits of port names join first, then other public names, then generated
+// ("$...") names: the first of the top-most signals to join names the network, so a net that
+// reaches a port is named after the port.
+//
+// Top-level port bits that share a local bit with another port bit get networks of their own
+// (see PadBoundary). So do port bits joined to another one only through a submodule (a wire
+// from an input port to an output port inside a cell), the first input bit keeping the net:
+// there the split port's network takes every name of its local bit in the top module.
+void Reader::Networks(Ndm_View* view) {
+    constexpr uint32_t kNone = UINT32_MAX;
+    std::vector<uint32_t> network_of_root(parent_.size(), kNone);
+    std::unordered_map<uint32_t, uint32_t> keeper;     // net (root) -> the top port signal keeping it
+    std::unordered_map<int32_t, uint32_t> split_bits;  // top local bit -> its network, kNone before
+    for (const Instance& inst : instances_) {
+        Module& m = modules_[inst.module];
+        if (m.signal_order.size() != m.num_signals) SignalOrder(m);
+        std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
+        const bool top = &inst == &instances_.front() && !m.pad_only.empty();
+        if (top) {
+            auto root_of = [&](uint32_t s) { return Find(inst.base + static_cast<uint32_t>(m.signal_bit[s])); };
+            for (uint32_t s : m.signal_order) {
+                if (!m.port_kind[s] || m.pad_only[s] || m.signal_bit[s] < 0) continue;
+                auto [it, fresh] = keeper.try_emplace(root_of(s), s);
+                if (!fresh && m.port_kind[it->second] == 1 && m.port_kind[s] == 2) it->second = s;
+            }
+            for (uint32_t s : m.signal_order)
+                if (m.port_kind[s] && !m.pad_only[s] && m.signal_bit[s] >= 0 && keeper[root_of(s)] != s)
+                    split_bits.emplace(m.signal_bit[s], kNone);
+        }
+        for (uint32_t s : m.signal_order) {
+            int32_t bit = m.signal_bit[s];
+            if (bit < 0) continue;
+            if (top && m.pad_only[s]) {
+                view->CreateNetwork()->AddSignal(signals[s]);
+                continue;
+            }
+            if (top && !split_bits.empty()) {
+                if (auto it = split_bits.find(bit); it != split_bits.end()) {
+                    if (it->second == kNone) {
+                        it->second = static_cast<uint32_t>(view->GetNumNetworks());
+                        view->CreateNetwork();
+                    }
+                    view->GetNetworkItr()[it->second]->AddSignal(signals[s]);
+                    continue;
+                }
+            }
+            uint32_t root = Find(inst.base + static_cast<uint32_t>(bit));
+            uint32_t& index = network_of_root[root];
+            if (index == kNone) {
+                index = static_cast<uint32_t>(view->GetNumNetworks());
+                view->CreateNetwork();
+            }
+            view->GetNetworkItr()[index]->AddSignal(signals[s]);
+        }
+    }
+}
+
+// The pad boundary of the top module: each top-level port bit is a pad of its own. When one
+// local bit carries several port bits (assign y = x), one keeps the net: the first input (or
+// inout) port bit, else the first port bit, in stored order. The others are marked in
+// m.pad_only and will each get a network holding only their own signal, so that the pad
+// constraints given to each port (LOC, IOSTANDARD, ...) stay its own; cell pins on the bit
+// connect to the signal that keeps the net.
+void Reader::PadBoundary(Module& m) {
+    std::vector<uint8_t>& kind = m.port_kind;
+    kind.assign(m.num_signals, 0);
+    for (size_t n = 0; n < m.nets.size(); ++n) {
+        const Port* p = FindPort(m, m.nets[n].name);
+        if (!p) continue;
+        uint8_t k = p->dir == Ndm_Dir::Input || p->dir == Ndm_Dir::Inout ? 2 : 1;
+        for (uint32_t i = 0; i < m.nets[n].bits.count; ++i) kind[m.net_first_signal[n] + i] = k;
+    }
+    std::vector<int32_t> keeper(m.num_bits, -1);
+    bool shared = false;
+    for (uint32_t s = 0; s < m.num_signals; ++s) {
+        int32_t bit = m.signal_bit[s];
+        if (!kind[s] || bit < 0) continue;
+        int32_t& k = keeper[bit];
+        if (k >= 0) shared = true;
+        if (k < 0 || (kind[k] == 1 && kind[s] == 2)) k = static_cast<int32_t>(s);
+    }
+    m.pad_only.assign(m.num_signals, 0);
+    if (!shared) return;
+    for (uint32_t s = 0; s < m.num_signals; ++s) {
+        int32_t bit = m.signal_bit[s];
+        if (!kind[s] || bit < 0 || keeper[bit] == static_cast<int32_t>(s)) continue;
+        m.pad_only[s] = 1;
+        if (m.bit_signal[bit] == static_cast<int32_t>(s)) m.bit_signal[bit] = keeper[bit];
+    }
+}
+
+// Signals of a module in the order they join networks: port names, other public names,
+// generated names, each group in stored order.
+void Reader::SignalOrder(Module& m) {
+    Ndm_PtrMap ports;
+    for (const Port& port : m.ports) ports.InsertIfAbsent(port.name, const_cast<char*>(port.name));
+    m.signal_order.clear();
+    m.signal_order.reserve(m.num_signals);
+    for (int rank = 0; rank < 3; ++rank) {
+        for (size_t n = 0; n < m.nets.size(); ++n) {
+            const Net& net = m.nets[n];
+            int r = ports.Find(net.name) ? 0 : (net.name[0] == '$' ? 2 : 1);
+            if (r != rank) continue;
+            for (uint32_t i = 0; i < net.bits.count; ++i) m.signal_order.push_back(m.net_first_signal[n] + i);
+        }
+    }
+}
+
+bool Reader::Build(const char* top_module) {
+    uint32_t top = 0;
+    if (!ResolveTypes() || !ChooseTop(top_module, top)) return false;
+    std::vector<uint32_t> stack;
+    if (!CheckCycles(top, stack)) return false;
+    // The JSON input and the parser's buffers are no longer needed.
+    doc_ = od::document();
+    parser_ = od::parser();
+    buf_.Release();
+
+    const Module& m = modules_[top];
+    design_.SetName(m.name);
+    Ndm_View* view = design_.CreateView("EXPANDED");
+    Ndm_Block* block = view->CreateTopBlock(m.name);
+    block->SetTypeName(m.name);
+    PadBoundary(modules_[top]);
+    if (!Expand(block, top, Alloc(m.num_bits))) return false;
+    TopPins(block, top);
+    Networks(view);
+    return true;
+}
+
+}  // namespace ndm_yosys

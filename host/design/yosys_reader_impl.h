@@ -1,0 +1,199 @@
+// The Yosys netlist reader's own types (internal to host/design): the modules as read, and
+// the reader that parses them (yosys_reader.cpp) and builds the design (yosys_netlist.cpp).
+#pragma once
+
+#include <simdjson.h>
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <type_traits>
+#include <unordered_map>
+#include <utility>
+#include <vector>
+
+#include "host/design/json_input.h"
+#include "host/design/name_pool.h"
+#include "host/design/ndm.h"
+
+namespace ndm_yosys {
+
+namespace od = simdjson::ondemand;
+using simdjson::error_code;
+
+using Ndm_JsonInput::Msg;
+
+// Constant bits are stored as negative numbers.
+constexpr int32_t kConst0 = -1;
+constexpr int32_t kConst1 = -2;
+constexpr int32_t kConstX = -3;
+constexpr int32_t kConstZ = -4;
+
+// A run of bits in Module::bits.
+struct Range {
+    uint32_t first = 0;
+    uint32_t count = 0;
+};
+
+struct Port {
+    const char* name;
+    Ndm_Dir dir = Ndm_Dir::None;
+    bool upto = false;
+    int32_t offset = 0;
+    Range bits;
+};
+
+struct Net {
+    const char* name;
+    bool upto = false;
+    int32_t offset = 0;
+    Range bits;
+};
+
+struct Conn {
+    const char* name;
+    Ndm_Dir dir = Ndm_Dir::None;
+    Range bits;
+};
+
+struct Cell {
+    const char* name;
+    const char* type = nullptr;
+    uint32_t first_conn = 0;
+    uint32_t num_conns = 0;
+    int32_t sub = -1;  // module the cell instantiates, or -1 for a leaf
+};
+
+// One module as read from the file; names are interned in the design.
+struct Module {
+    const char* name = "";
+    size_t offset = 0;  // byte offset of the module in the file, for messages
+    bool top_attr = false;
+    bool box = false;  // a blackbox or whitebox library cell: its instances stay leaves
+    std::vector<Port> ports;
+    std::vector<Net> nets;
+    std::vector<Cell> cells;
+    std::vector<Conn> conns;
+    std::vector<int32_t> bits;  // local bit ids 0..num_bits-1 once finished, constants < 0
+    int64_t max_bit = -1;
+    uint32_t num_bits = 0;
+    uint32_t num_signals = 0;
+    std::vector<uint32_t> net_first_signal;  // per netname: index of its first signal
+    std::vector<int32_t> signal_bit;         // per signal: local bit id, or -1 for a constant
+    std::vector<int32_t> bit_signal;         // per local bit id: first signal carrying it, or -1
+    std::vector<uint32_t> signal_order;      // signals in the order they join networks
+    std::vector<uint8_t> port_kind;          // top module, per signal: 1 port bit, 2 input/inout port bit
+    std::vector<uint8_t> pad_only;           // top module: port bits that get a network of their own
+    Ndm_PtrMap port_index;                   // port name -> index + 1
+    int state = 0;                           // for the instantiation cycle check
+    bool instantiated = false;
+};
+
+// Describes the value being read, for messages; built only when a message is issued.
+class What {
+public:
+    template <class F>
+        requires std::is_invocable_r_v<std::string, const F&>
+    What(const F& f)  // NOLINT: implicit on purpose
+        : obj_(&f), call_([](const void* o) { return std::string((*static_cast<const F*>(o))()); }) {}
+    What(const char* text)  // NOLINT
+        : obj_(text), call_([](const void* o) { return std::string(static_cast<const char*>(o)); }) {}
+    std::string operator()() const { return call_(obj_); }
+
+private:
+    const void* obj_;
+    std::string (*call_)(const void*);
+};
+
+struct Instance {
+    Ndm_Block* block;
+    uint32_t module;
+    uint32_t base;  // global id of local bit 0
+};
+
+inline std::string_view StripEscape(std::string_view name) {
+    if (!name.empty() && name.front() == '\\') name.remove_prefix(1);
+    return name;
+}
+
+inline void* AsValue(size_t index) { return reinterpret_cast<void*>(index + 1); }
+inline size_t FromValue(void* value) { return reinterpret_cast<uintptr_t>(value) - 1; }
+
+class Reader {
+public:
+    Reader(const char* path, Ndm_Design& design) : path_(path), design_(design) {}
+
+    bool Load();
+    bool Build(const char* top_module);
+
+private:
+    // ---- messages ----
+    bool Error(const std::string& text) {
+        Msg().issueError("%s", text.c_str());
+        return false;
+    }
+    size_t Where() { return Ndm_JsonInput::Offset(doc_, buf_); }
+    bool AtEnd() { return doc_.current_location().error() == simdjson::OUT_OF_BOUNDS; }
+    // A simdjson error while reading `what`: a syntax error, or a value of the wrong kind.
+    bool JsonError(error_code e, const std::string& what) {
+        if (Ndm_JsonInput::IsSyntaxError(e)) return SyntaxError(e, Where());
+        return ShapeError(what);
+    }
+    bool SyntaxError(error_code e, size_t offset) {
+        return Error(Port_Format("'%s' is not valid JSON: %s at byte %zu.", path_,
+                                 Ndm_JsonInput::SyntaxReason(e), offset));
+    }
+    bool ShapeError(const std::string& what) {
+        return Error(Port_Format("'%s' is not a Yosys JSON netlist: %s (at byte %zu).", path_,
+                                 what.c_str(), Where()));
+    }
+    std::string InModule() const { return Port_Format(" in module '%s'", module_name_); }
+
+    // ---- parsing ----
+    bool Key(od::field& field, std::string_view& out);
+    bool String(od::value value, std::string_view& out, const What& what);
+    bool Int(od::value value, int64_t& out, const What& what);
+    bool Bits(od::value value, Module& m, Range& range, const What& what);
+    bool Direction(od::value value, Ndm_Dir& dir, const What& what);
+    bool ParseRoot();
+    bool ParseModule(od::object object, Module& m);
+    bool ParseAttributes(od::value value, Module& m);
+    bool ParsePorts(od::value value, Module& m);
+    bool ParseCells(od::value value, Module& m);
+    bool ParseCell(od::object object, Module& m, Cell& cell);
+    bool ParseNets(od::value value, Module& m);
+    void Finish(Module& m);
+
+    // ---- building ----
+    bool ResolveTypes();
+    void BoxDirections(Module& m, const Cell& cell, Module& box);
+    bool ChooseTop(const char* top_module, uint32_t& top);
+    bool CheckCycles(uint32_t module, std::vector<uint32_t>& stack);
+    const Port* FindPort(Module& m, const char* name);
+    const char* BitName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i);
+    uint32_t Alloc(uint32_t count);
+    uint32_t Find(uint32_t id);
+    void Union(uint32_t a, uint32_t b);
+    bool Expand(Ndm_Block* block, uint32_t module, uint32_t base);
+    void TopPins(Ndm_Block* block, uint32_t module);
+    void Networks(Ndm_View* view);
+    void PadBoundary(Module& m);
+    void SignalOrder(Module& m);
+
+    const char* path_;
+    Ndm_Design& design_;
+    Ndm_JsonInput::Input buf_;
+    od::parser parser_;
+    od::document doc_;
+    std::string scratch_;
+    std::string name_buf_;
+    const char* module_name_ = "";
+
+    std::vector<Module> modules_;
+    Ndm_PtrMap module_index_;  // module name -> index + 1
+    std::vector<std::pair<const char*, Ndm_Dir>> dirs_;  // port_directions of the current cell
+    std::vector<uint32_t> parent_;                        // union-find over global bit ids
+    std::vector<Instance> instances_;                     // expanded blocks in preorder
+};
+
+}  // namespace ndm_yosys
