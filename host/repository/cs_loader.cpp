@@ -70,7 +70,7 @@ Cs_Constraint& Cs_Loader::Add(const Cs_ConstraintType& type, Cs_Scope scope, con
     c->target_ = mgr_.Text(target ? target : "");
     c->key_ = mgr_.Text(key ? key : "");
     c->value_ = mgr_.Text(value);
-    c->statement_ = mgr_.Text(handle ? Folded(handle->return_ascii()) : std::string());
+    c->statement_ = StatementText(handle);
     c->source_ = Cs_ConstraintSourceInfo(Cs_SourceFile(file_, handle ? handle->getline() : 0));
     out_.push_back(std::move(c));
     return *out_.back();
@@ -80,6 +80,16 @@ template <class T>
 Cs_Constraint& Cs_Loader::Add(Cs_Scope scope, const char* target, const char* key, std::string_view value,
                               const Handle* handle, bool flag) {
     return Add(T::Type(), scope, target, key, value, handle, flag);
+}
+
+const char* Cs_Loader::StatementText(const Handle* handle) {
+    // The constraints of one statement come one after the other: fold its text once.
+    const char* raw = handle ? handle->return_ascii() : "";
+    if (raw != last_raw_) {
+        last_raw_ = raw;
+        last_statement_ = mgr_.Text(Folded(raw));
+    }
+    return last_statement_;
 }
 
 std::string Cs_Loader::AfterEquals(const Handle* handle) const {
@@ -92,9 +102,9 @@ std::string Cs_Loader::AfterEquals(const Handle* handle) const {
 
 void Cs_Loader::Invalid(int line, const std::string& message, const Handle* statement) {
     const Handle* h = statement ? statement : failed_statement();
-    Add<Cs_Constraint_Unsupported>(Cs_Scope::Design, "", "INVALID_CONSTRAINT:",
-                                   h ? Folded(h->return_ascii()) : std::string(), h);
-    if (!out_.empty() && !h) out_.back()->source_ = Cs_ConstraintSourceInfo(Cs_SourceFile(file_, line));
+    Cs_Constraint& c =
+        Add<Cs_Constraint_Unsupported>(Cs_Scope::Design, "", "INVALID_CONSTRAINT:", StatementText(h), h);
+    if (!h) c.source_ = Cs_ConstraintSourceInfo(Cs_SourceFile(file_, line));
     outcome_.Add(std::make_shared<Cs_Status_Parse>(Cs_StatusID::PARSE_ERROR, 10, message,
                                                    file_ ? file_ : "", line));
 }

@@ -70,6 +70,8 @@ private:
     bool Objects(Cs_Scope scope, const Defn& defn, const Handle* handle);
     bool Attributes(Cs_Scope scope, const Defn& defn, const Handle* handle);
     void Invalid(int line, const std::string& message, const Handle* statement);
+    // The statement's text, blanks folded, owned by the repository.
+    const char* StatementText(const Handle* handle);
     // The statement's text after its first "=", blanks folded.
     std::string AfterEquals(const Handle* handle) const;
     Cs_Constraint& TimingEntry(const char* target, const char* key, const Handle* handle,
@@ -80,4 +82,6 @@ private:
     bool ucf_;
     std::vector<std::unique_ptr<Cs_Constraint>> out_;
     Cs_ReturnCode outcome_;
+    std::string last_raw_;             // the statement text folded last
+    const char* last_statement_ = "";  // and its folded form
 };
