@@ -103,17 +103,17 @@ Ta_LunCSHelper::Ta_LunCSHelper(const Port::StringBase<char>& ovi_file, const Por
     m_oviFlow = flow.str() == "ovi";
     m_attachBufferType = true;
 
-    if (!ovi_file.IsEmpty()) {
-        std::string dir = ovi_file.str();
-        dir.resize(dir.size() >= 4 ? dir.size() - 4 : 0);
-        dir += "_qdb";
-        if (!Port::File::exist(dir.c_str())) Port::File::mkdir(dir.c_str(), false);
-        m_bcdPath = Port::StringBase<char>(dir + "/cst.qbcd");
-        Port_MsgManData::debugStub("BCD Path: %s\n", m_bcdPath.c_str());
-    } else {
-        if (!Port::File::exist("zepk_auto_0_qdb")) Port::File::mkdir("zepk_auto_0_qdb", false);
-        m_bcdPath = "zepk_auto_0_qdb/cst.qbcd";
-    }
+    m_bcdPath = RepositoryPath(ovi_file);
+    const std::string dir = m_bcdPath.str().substr(0, m_bcdPath.str().rfind('/'));
+    if (!Port::File::exist(dir.c_str())) Port::File::mkdir(dir.c_str(), false);
+    if (!ovi_file.IsEmpty()) Port_MsgManData::debugStub("BCD Path: %s\n", m_bcdPath.c_str());
+}
+
+Port::StringBase<char> Ta_LunCSHelper::RepositoryPath(const Port::StringBase<char>& ovi_file) {
+    if (ovi_file.IsEmpty()) return Port::StringBase<char>("zepk_auto_0_qdb/cst.qbcd");
+    std::string dir = ovi_file.str();
+    dir.resize(dir.size() >= 4 ? dir.size() - 4 : 0);
+    return Port::StringBase<char>(dir + "_qdb/cst.qbcd");
 }
 
 void Ta_LunCSHelper::Share(const Ta_LunCSHelper& other) {

@@ -51,6 +51,10 @@ public:
     bool Commit();
     // Where the repository file lives.
     const Port::StringBase<char>& GetBcdPath() const { return m_bcdPath; }
+    // Where the repository file of a project file lives (the constructor's rule, without
+    // creating anything): the path less its last four characters, "_qdb/cst.qbcd"; for an empty
+    // path "zepk_auto_0_qdb/cst.qbcd".
+    static Port::StringBase<char> RepositoryPath(const Port::StringBase<char>& ovi_file);
 
     // ---- diagnostics
     static void AssociationDrc(const Cs_ReturnCode& outcome, bool allowUnmatchedIO, bool allowUnmatchedMaxDelay);

@@ -38,6 +38,7 @@ int QuillmapMain(int argc, char** argv) {
     AddPartCommand(app, run, options);
     AddDesignCommands(app, run);
     AddExtractCommand(app, run);
+    AddRepoCommand(app, run);
 
     // The top-level list shows the first line of each description; the rest belongs to the
     // subcommand's own help.

@@ -55,4 +55,21 @@ struct QuillmapPartSource {
 // keeps in the end (none given: files read on their own).
 void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts, const std::vector<std::string>& kept);
 
+// The repository road of annotate (repository_road.cpp).
+struct QuillmapRoadRequest {
+    std::string design;
+    std::string top;
+    std::vector<std::string> ucf;  // in the order given
+    bool has_ncf = false;
+    std::string project;           // the project file; the repository lives beside it
+    std::string drc;               // the DRC level for the run; empty: ZEP_QUILLMAP_CONSTRAINT_DRC
+    bool allow_unmatched_io = false;
+    bool allow_unmatched_maxdelay = false;
+    std::string output;
+};
+// Runs the constraint files through the repository bridge by its mode; modes that do not use
+// the repository run file_road, the annotators as without a project.
+int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::function<int()>& file_road);
+void AddRepoCommand(CLI::App& app, QuillmapAction& run);
+
 int QuillmapMain(int argc, char** argv);

@@ -24,6 +24,9 @@ struct AnnotateArgs {
     std::string best_effort;
     bool allow_unmatched_locs = false;
     std::string output;
+    std::string project;
+    std::string drc;
+    bool allow_unmatched_maxdelay = false;
     CLI::Option* ucf_opt = nullptr;
     CLI::Option* ncf_opt = nullptr;
     CLI::Option* best_effort_opt = nullptr;
@@ -46,7 +49,7 @@ std::vector<ConstraintFile> FilesInOrder(const AnnotateArgs& args) {
     return files;
 }
 
-int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
+int RunFileRoad(const AnnotateArgs& args, const QuillmapOptions& options) {
     auto design = QuillmapLoadDesign(args.design, args.top);
     if (!design) return kStatusErrors;
     Ndm_View* view = QuillmapWorkView(*design, args.design, "annotate");
@@ -85,6 +88,13 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
     return kStatusOk;
 }
 
+int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
+    if (args.project.empty()) return RunFileRoad(args, options);
+    QuillmapRoadRequest request{args.design, args.top, args.ucf, !args.ncf.empty(), args.project, args.drc,
+                                args.allow_unmatched_locs, args.allow_unmatched_maxdelay, args.output};
+    return QuillmapRepositoryRoad(request, [&] { return RunFileRoad(args, options); });
+}
+
 }  // namespace
 
 void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options) {
@@ -102,7 +112,22 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
         "the first CONFIG block it finds (the UCF's, when a UCF came first), replacing a part there.\n"
         "When the files (or the design) name different parts, a warning names them all and the\n"
         "parts the design keeps; a second CONFIG PART in one UCF, or in a UCF annotated onto a\n"
-        "design that holds a UCF part, is a fatal error. --second-pass reads no part.");
+        "design that holds a UCF part, is a fatal error. --second-pass reads no part.\n"
+        "\n"
+        "With --project, the UCF files go through the constraint repository, kept in the folder named\n"
+        "by the project file without its extension plus \"_qdb\" (blinky.qpf: blinky_qdb/cst.qbcd).\n"
+        "The environment variable ZEP_QUILLMAP_CS chooses what is done:\n"
+        "  unset or 2  write-back: the files are read into the repository and checked, the attributes\n"
+        "              it has no type for are attached, unmatched names and overrides are reported by\n"
+        "              the DRC level, the repository file is written, and then its constraints are\n"
+        "              written onto the design (which -o saves);\n"
+        "  1           the same without the write-back: the repository file is the result;\n"
+        "  0 or 3      the repository is not used: the files are annotated as without --project.\n"
+        "A later run with the same project and the same files restores the repository instead of\n"
+        "reading the files, and says so; a file changed since is read again and its findings\n"
+        "reported. `quillmap repo PROJECT` lists what the repository holds. Another value of\n"
+        "ZEP_QUILLMAP_CS or ZEP_QUILLMAP_CONSTRAINT_DRC is a fatal error (exit status 2) and nothing is\n"
+        "written. See docs/repository-road.md.");
     args.cmd = cmd;
     cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
     cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");
@@ -125,5 +150,14 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
                   "Location constraints (LOC, IOSTANDARD, DRIVE, SLEW) on names that match nothing\n"
                   "give an information message instead of an error");
     cmd->add_option("-o,--output", args.output, "Save the annotated design as a native design file");
+    cmd->add_option("--project", args.project,
+                    "Project file (for example blinky.qpf): read the UCF files through the constraint\n"
+                    "repository kept beside it (see above)");
+    cmd->add_option("--drc", args.drc,
+                    "With --project: how strictly findings are reported, NONE, WARN_ONLY, NORMAL or STRICT\n"
+                    "(default: ZEP_QUILLMAP_CONSTRAINT_DRC, else NORMAL)")
+        ->check(CLI::IsMember({"NONE", "WARN_ONLY", "NORMAL", "STRICT"}));
+    cmd->add_flag("--allow-unmatched-maxdelay", args.allow_unmatched_maxdelay,
+                  "With --project: a MAXDELAY on a name that matches nothing gives an information message");
     cmd->callback([&run, &options] { run = [&options] { return RunAnnotate(args, options); }; });
 }

@@ -221,6 +221,9 @@ public:
     uint64_t GetHash() const { return hash_; }
     uint64_t GetSize() const { return size_; }
     bool WasRead() const { return read_; }
+    // True when this repository read the file itself; false for a source restored from a
+    // repository file and not read again since.
+    bool ReadHere() const { return read_here_; }
 
 private:
     friend class Cs_ConstraintMgr;
@@ -230,6 +233,7 @@ private:
     uint64_t hash_ = 0;
     uint64_t size_ = 0;
     bool read_ = false;
+    bool read_here_ = false;
 };
 
 // Syntaxes a file can be read in.

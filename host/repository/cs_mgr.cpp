@@ -66,18 +66,19 @@ Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const
     source.info->hash_ = ContentHash(*text);
     source.info->size_ = text->size();
     source.info->read_ = true;
+    source.info->read_here_ = true;
     source.parse = loader.outcome();
     outcome.Append(loader.outcome());
     return outcome;
 }
 
-Cs_ReturnCode Cs_ConstraintMgr::Changed() {
+void Cs_ConstraintMgr::Changed() {
     if (bulk_) {
         bulk_changed_ = true;
-        return {};
+        return;
     }
     bulk_changed_ = false;
-    return Resolve();
+    Resolve();
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::LoadConstraints(const Port::StringBase<char>& file, int syntax) {
@@ -86,7 +87,7 @@ Cs_ReturnCode Cs_ConstraintMgr::LoadConstraints(const Port::StringBase<char>& fi
 
 Cs_ReturnCode Cs_ConstraintMgr::ReplaceConstraintsFromFile(const Port::StringBase<char>& file, int syntax) {
     Cs_ReturnCode outcome = ReadSource(AddSource(file.str(), syntax));
-    outcome.Append(Changed());
+    Changed();
     return outcome;
 }
 
@@ -100,7 +101,8 @@ Cs_ReturnCode Cs_ConstraintMgr::RemoveConstraintSource(const Port::StringBase<ch
                            [&](const Source& s) { return file.str() == s.info->GetFileName(); });
     if (it == sources_.end()) return {};
     sources_.erase(it);
-    return Changed();
+    Changed();
+    return {};
 }
 
 void Cs_ConstraintMgr::SetBulkConstraintMode(bool on) {
@@ -117,7 +119,7 @@ Cs_ReturnCode Cs_ConstraintMgr::UpdateConstraintsFromSource() {
         outcome.Append(ReadSource(s, text));
         bulk_changed_ = true;
     }
-    if (!bulk_ && bulk_changed_) outcome.Append(Changed());
+    if (!bulk_ && bulk_changed_) Changed();
     return outcome;
 }
 
@@ -151,9 +153,8 @@ Cs_ReturnCode Cs_ConstraintMgr::CreateConstraints(const Port::StringBase<char>& 
         c->parent_ = parent;
         loose_.push_back(std::move(c));
     }
-    Cs_ReturnCode outcome = loader.outcome();
-    outcome.Append(Changed());
-    return outcome;
+    Changed();
+    return loader.outcome();
 }
 
 Cs_SharedContainerT<Cs_Constraint*> Cs_ConstraintMgr::GetConstraints(int effective) const {

@@ -56,6 +56,9 @@ public:
     const Ndm_Design* GetDesign() const { return design_; }
 
     // ---- sources
+    // The operations on sources answer what reading the files found (unreadable files,
+    // statements the parser cannot read); what the resolution that follows found is
+    // GetFindings' to tell.
     // Registers file as a source and reads it, adding its constraints after the others.
     Cs_ReturnCode LoadConstraints(const Port::StringBase<char>& file, int syntax);
     // Replaces the constraints read from file by its current content (registering it when new).
@@ -95,6 +98,9 @@ public:
     // Replaces the repository by the content of file; on failure the repository is left as it
     // was and the status names the file and the reason.
     Cs_ReturnCode Restore(const Port::StringBase<char>& file);
+    // The outcome of the last Commit or Restore: a host that only learns whether they worked
+    // finds the reason here.
+    const Cs_ReturnCode& GetStoreOutcome() const { return store_outcome_; }
 
     // ---- write-back and take-in
     // Writes every constraint resolved to objects of the region's view onto them as properties.
@@ -122,7 +128,7 @@ private:
     // Whether a source differs from what was read; text gets its current content.
     static bool IsStale(const Source& source, std::shared_ptr<const Pr_FileText>& text);
     // After sources changed: resolves again unless in bulk mode.
-    Cs_ReturnCode Changed();
+    void Changed();
     // Resolution of every constraint (cs_resolve.cpp).
     Cs_ReturnCode Resolve();
     template <class F>
@@ -139,4 +145,5 @@ private:
     std::unique_ptr<Ndm_NamePool> texts_;
     bool bulk_ = false;
     bool bulk_changed_ = false;
+    mutable Cs_ReturnCode store_outcome_;
 };

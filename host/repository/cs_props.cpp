@@ -108,6 +108,6 @@ Cs_ConstraintMgr::PropReplaceResults Cs_ConstraintMgr::ReplaceConstraintsFromPro
         for (size_t i = children.size(); i-- > 0;) stack.push_back(children[i]);
     }
     for (Ndm_Network* n : view->GetNetworkItr()) take(n, Cs_Scope::Net, n->GetName());
-    results.outcome_ = Changed();
+    Changed();
     return results;
 }

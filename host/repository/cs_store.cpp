@@ -529,6 +529,10 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     return outcome;
 }
 
-Cs_ReturnCode Cs_ConstraintMgr::Commit(const Port::StringBase<char>& file) const { return Cs_Store::Commit(*this, file.str()); }
+Cs_ReturnCode Cs_ConstraintMgr::Commit(const Port::StringBase<char>& file) const {
+    return store_outcome_ = Cs_Store::Commit(*this, file.str());
+}
 
-Cs_ReturnCode Cs_ConstraintMgr::Restore(const Port::StringBase<char>& file) { return Cs_Store::Restore(*this, file.str()); }
+Cs_ReturnCode Cs_ConstraintMgr::Restore(const Port::StringBase<char>& file) {
+    return store_outcome_ = Cs_Store::Restore(*this, file.str());
+}

@@ -229,7 +229,8 @@ TEST_F(Bridge, DiagnosticsByLevel) {
         Ta_LunCSHelper b(project.c_str(), "make");
         Port_MsgCapture quiet;
         b.Init(design.get());
-        Cs_ReturnCode outcome = b.GetConstraintsMgr()->ReplaceConstraintsFromFile(ucf.c_str(), 4);
+        b.GetConstraintsMgr()->ReplaceConstraintsFromFile(ucf.c_str(), 4);
+        Cs_ReturnCode outcome = b.GetConstraintsMgr()->GetFindings();
         Port_MsgCapture capture;
         Ta_LunCSHelper::AssociationDrc(outcome, r.allow_io, false);
         auto all = b.GetConstraintsMgr()->GetConstraints(Cs_ConstraintMgr::ACTIVE);

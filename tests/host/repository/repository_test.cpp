@@ -97,7 +97,7 @@ TEST_F(Repo, LoadsEachStatementAsTypedConstraints) {
     ASSERT_NE(probe, nullptr);
     EXPECT_TRUE(probe->GetAssociatedDesignObjs().empty());
     int unmatched = 0;
-    for (const auto& st : rc) {
+    for (const auto& st : mgr.GetFindings()) {
         if (st->GetID() != Cs_StatusID::NO_DESIGN_MATCH) continue;
         ++unmatched;
         EXPECT_EQ(st->GetSeverity(), Cs_Status::WARNING);
@@ -107,10 +107,9 @@ TEST_F(Repo, LoadsEachStatementAsTypedConstraints) {
     EXPECT_EQ(unmatched, 1);
 
     // messages are bytes: the wide form converts back to the same bytes
-    Cs_ReturnCode latin = mgr.LoadConstraints(dir.Write("l.ucf", "NET \"n\xe9t\" LOC = P1;\n").c_str(),
-                                              Cs_ConstraintSyntax::UCF);
+    mgr.LoadConstraints(dir.Write("l.ucf", "NET \"n\xe9t\" LOC = P1;\n").c_str(), Cs_ConstraintSyntax::UCF);
     const Cs_Status* last = nullptr;
-    for (const auto& st : latin) last = st.get();
+    for (const auto& st : mgr.GetFindings()) last = st.get();
     ASSERT_NE(last, nullptr);
     std::unique_ptr<char[]> narrow(Port::wcstombs(last->GetLocalizedMsg().c_str()));
     ASSERT_TRUE(narrow);

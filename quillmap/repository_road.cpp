@@ -1,0 +1,148 @@
+// quillmap annotate --project: the constraint files go through the constraint repository and
+// its bridge, which keeps them in a repository file beside the project file. docs/repository-road.md
+// tells the whole road.
+#include <unistd.h>
+
+#include <cstdlib>
+#include <optional>
+#include <string>
+
+#include "bridge/luncshelper.h"
+#include "host/design/native_format.h"
+#include "host/design/ndm.h"
+#include "host/port/file.h"
+#include "host/port/msgman.h"
+#include "host/util/shared_resource.h"
+#include "quillmap/app.h"
+
+namespace {
+
+Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
+
+// The repository's folder, removed again when the run wrote nothing into it.
+class RepositoryFolder {
+public:
+    explicit RepositoryFolder(std::string file) : file_(std::move(file)) {}
+    ~RepositoryFolder() {
+        if (Port::File::exist(file_.c_str())) return;
+        size_t slash = file_.rfind('/');
+        if (slash != std::string::npos) ::rmdir(file_.substr(0, slash).c_str());  // only when empty
+    }
+
+private:
+    std::string file_;
+};
+
+// A project file name ends in a three-letter extension: the bridge keeps the repository in
+// the folder named by the rest.
+bool HasExtension(const std::string& project) {
+    if (project.size() < 5 || project[project.size() - 4] != '.') return false;
+    for (size_t i = project.size() - 3; i < project.size(); ++i)
+        if (project[i] == '.' || project[i] == '/') return false;
+    return project[project.size() - 5] != '/';
+}
+
+// The findings of the last resolution (no design match, groups nobody defines): the parse
+// statuses are reported where the files are read.
+Cs_ReturnCode ResolutionFindings(const Cs_ConstraintMgr& mgr) {
+    Cs_ReturnCode findings;
+    for (const auto& status : mgr.GetFindings())
+        if (!dynamic_cast<const Cs_Status_Parse*>(status.get())) findings.Add(status);
+    return findings;
+}
+
+// Whether the repository restored by Init holds exactly the given files, in their order.
+bool SameSources(const Cs_ConstraintMgr& mgr, const std::vector<std::string>& files) {
+    std::vector<Cs_FileInfo*> sources = mgr.GetConstraintSources();
+    if (sources.size() != files.size()) return false;
+    for (size_t i = 0; i < files.size(); ++i)
+        if (files[i] != sources[i]->GetFileName()) return false;
+    return true;
+}
+
+std::string Count(size_t n, const char* noun) {
+    return std::to_string(n) + " " + noun + (n == 1 ? "" : "s");
+}
+
+}  // namespace
+
+int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::function<int()>& file_road) {
+    if (!HasExtension(request.project)) {
+        Msg(__LINE__).issueError(
+            "The project file name '%s' must end in a three-letter extension such as .qpf: the constraint "
+            "repository is kept in the folder named by the rest of it.\n",
+            request.project.c_str());
+        return kStatusFatal;
+    }
+    if (!request.drc.empty()) ::setenv("ZEP_QUILLMAP_CONSTRAINT_DRC", request.drc.c_str(), 1);
+    Ta_LunCSHelper::GetDrcLevel();  // a bad level is fatal before anything is written
+
+    std::optional<Ta_LunCSHelper> bridge;
+    try {
+        bridge.emplace(Port::StringBase<char>(request.project), Port::StringBase<char>("ovi"));
+    } catch (const Util::IllegalMethodCalledException&) {
+        Msg(__LINE__).issueInternal("A constraint repository bridge exists already.\n");
+        return kStatusErrors;
+    }
+    const std::string bcd = bridge->GetBcdPath().str();
+    RepositoryFolder folder(bcd);
+    const Ta_LunCSHelper::MODE mode = bridge->GetMode();
+    if (mode != Ta_LunCSHelper::CREATE_BCD && mode != Ta_LunCSHelper::WRITE_BACK) {
+        bridge.reset();
+        return file_road();
+    }
+    if (request.has_ncf) {
+        Msg(__LINE__).issueError(
+            "NCF files cannot be read through the constraint repository: give them without --project, or set "
+            "ZEP_QUILLMAP_CS to 0 to read every file without the repository.\n");
+        return kStatusFatal;
+    }
+
+    auto design = QuillmapLoadDesign(request.design, request.top);
+    if (!design) return kStatusErrors;
+    if (!QuillmapWorkView(*design, request.design, "annotate")) return kStatusErrors;
+    Cs_ConstraintMgr& mgr = *bridge->GetConstraintsMgr();
+
+    const bool had_repository = Port::File::exist(bcd.c_str());
+    bridge->Init(design.get());
+    bool restored = false;
+    if (had_repository && !mgr.GetStoreOutcome()) {
+        // A damaged or foreign file is replaced by the next commit; the files are read instead.
+        Cs_ReturnCode why = mgr.GetStoreOutcome();
+        for (const auto& status : why) {
+            std::unique_ptr<Cs_Status> copy(status->Clone());
+            copy->SetSeverity(Cs_Status::WARNING);
+            copy->Report();
+        }
+        Msg(__LINE__).issueStatus("The constraints are read from the constraint files again.\n");
+        mgr.DeleteAllConstraints();
+    } else if (had_repository && SameSources(mgr, request.ucf)) {
+        size_t again = 0;
+        for (const Cs_FileInfo* source : mgr.GetConstraintSources()) again += source->ReadHere();
+        Msg(__LINE__).issueStatus("Restored the constraint repository '%s': %zu constraints of %s, %s.\n", bcd.c_str(),
+                                  mgr.GetNumConstraints(), Count(request.ucf.size(), "file").c_str(),
+                                  again == 0 ? "none changed" : (Count(again, "file") + " read again").c_str());
+        restored = true;
+    } else if (had_repository) {
+        Msg(__LINE__).issueStatus(
+            "The constraint files differ from those of the constraint repository '%s': every file is read again.\n",
+            bcd.c_str());
+        mgr.DeleteAllConstraints();
+    }
+
+    // Read the files (unless restored), then attach what the repository keeps as plain attributes.
+    Util_FNameGroup files;
+    if (!restored)
+        for (const std::string& file : request.ucf) files.add_fname(file.c_str());
+    bridge->Annotate(&files, files.num_fnames(), true);
+
+    Ta_LunCSHelper::AssociationDrc(ResolutionFindings(mgr), request.allow_unmatched_io,
+                                   request.allow_unmatched_maxdelay);
+    bridge->ReportConflicts();
+    if (!bridge->Commit())
+        for (const auto& status : mgr.GetStoreOutcome()) status->Report();
+    if (mode == Ta_LunCSHelper::WRITE_BACK) bridge->WriteConstraintsToNgd(true);
+
+    if (!request.output.empty() && !Ndm_WriteNative(*design, request.output.c_str())) return kStatusErrors;
+    return kStatusOk;
+}
