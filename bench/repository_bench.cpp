@@ -9,7 +9,6 @@
 #include <chrono>
 #include <cstdio>
 #include <fstream>
-#include <random>
 #include <string>
 
 #include "bench_designs.h"
@@ -18,24 +17,6 @@
 
 namespace {
 
-// 10,000 exact-name statements, two constraints each.
-std::string WriteConstraints(int cells) {
-    std::string path = "/tmp/lun_repository_bench_" + std::to_string(cells) + ".ucf";
-    std::ofstream out(path);
-    std::mt19937 rng(11);
-    std::uniform_int_distribution<int> pick(0, cells - 1);
-    for (int i = 0; i < 10000; ++i) {
-        int k = pick(rng);
-        if (i % 2)
-            out << "INST cell_" << k << " LOC = SITE_X" << (k % 97) << "Y" << (k % 89) << " | TNM = grp" << (k % 7)
-                << ";\n";
-        else
-            out << "NET n_" << k << " IOSTANDARD = LVCMOS33 | TNM_NET = ngrp" << (k % 13) << ";\n";
-    }
-    out << "TIMESPEC TS_a = FROM grp1 TO ngrp2 5 ns;\n";
-    return path;
-}
-
 double Seconds(std::chrono::steady_clock::time_point since) {
     return std::chrono::duration<double>(std::chrono::steady_clock::now() - since).count();
 }
@@ -43,7 +24,7 @@ double Seconds(std::chrono::steady_clock::time_point since) {
 void BM_Repository(benchmark::State& state) {
     const int cells = static_cast<int>(state.range(0));
     auto design = MakeFlatDesign(cells);
-    std::string file = WriteConstraints(cells);
+    std::string file = WriteExactStatements(cells, "/tmp/lun_repository_bench_" + std::to_string(cells) + ".ucf");
     std::string db = file + ".qbcd";
     Port_MsgCapture quiet;
     // The name indexes of the design are built by the first lookup that needs them, once per
