@@ -21,6 +21,35 @@ struct RepoArgs {
     size_t names = 3;
 };
 
+// What one constraint resolved to and what overrides it: from the bound design, else from the
+// names the repository was committed with.
+struct Resolved {
+    bool shown = false;  // not for design-wide constraints
+    std::vector<std::string> objects;
+    size_t count = 0;
+    std::vector<std::pair<const Cs_Constraint*, std::string>> overrides;  // by, on which object ("": none)
+};
+
+Resolved ResolvedOf(const Cs_ConstraintMgr& mgr, const Cs_Constraint& c, size_t names) {
+    Resolved r;
+    r.shown = !c.IsAssociationExempt();
+    const auto& objects = c.GetAssociatedDesignObjs();
+    const Cs_ConstraintMgr::CommittedNames* committed = mgr.GetDesign() ? nullptr : mgr.GetCommittedNames(c);
+    if (committed) {
+        r.count = committed->objects.size();
+        for (size_t i = 0; i < r.count && i < names; ++i) r.objects.push_back(committed->objects[i]);
+        r.overrides = committed->overrides;
+    } else {
+        r.count = objects.size();
+        for (size_t i = 0; i < r.count && i < names; ++i) r.objects.push_back(objects[i]->GetFullName());
+    }
+    for (const Cs_Conflict& k : c.GetConflicts())
+        if (k.GetType() == Cs_Conflict::OVERRIDE && k.GetConflictingConstraint())
+            r.overrides.emplace_back(k.GetConflictingConstraint(),
+                                     k.GetDesignEntity() ? k.GetDesignEntity()->GetFullName() : std::string());
+    return r;
+}
+
 std::string Where(const Cs_Constraint& c) {
     const Cs_SourceFile* source = c.GetSourceInfo()->GetSourceFile();
     if (!source || !source->GetFile()) return "(no file)";
@@ -32,31 +61,34 @@ std::string Setting(const Cs_Constraint& c) {
     return std::string(c.GetAttribute()) + " = " + c.GetValueText();
 }
 
-void PrintText(const Cs_Constraint& c, const RepoArgs& args, bool bound, std::string& out) {
+void PrintText(const Cs_Constraint& c, const Resolved& r, std::string& out) {
     out += Where(c) + "  " + c.GetType().GetName() + "  " + Setting(c) + "  [" + c.GetStatementText() + "]";
-    const auto& objects = c.GetAssociatedDesignObjs();
-    if (bound && !c.IsAssociationExempt()) {
-        out += "  objects " + std::to_string(objects.size());
-        for (size_t i = 0; i < objects.size() && i < args.names; ++i)
-            out += (i ? ", " : ": ") + objects[i]->GetFullName();
-        if (objects.size() > args.names) out += ", ...";
+    if (r.shown) {
+        out += "  objects " + std::to_string(r.count);
+        for (size_t i = 0; i < r.objects.size(); ++i) out += (i ? ", " : ": ") + r.objects[i];
+        if (r.count > r.objects.size()) out += ", ...";
     }
-    for (const Cs_Conflict& k : c.GetConflicts()) {
-        if (k.GetType() != Cs_Conflict::OVERRIDE || !k.GetConflictingConstraint()) continue;
-        out += "  overridden by " + Where(*k.GetConflictingConstraint());
-        if (k.GetDesignEntity()) out += " on " + k.GetDesignEntity()->GetFullName();
+    for (const auto& [by, object] : r.overrides) {
+        out += "  overridden by " + (by ? Where(*by) : std::string("(unknown)"));
+        if (!object.empty()) out += " on " + object;
     }
     out += '\n';
 }
 
-void PrintJson(const Cs_Constraint& c, const RepoArgs& args, bool bound, std::string& out) {
-    const Cs_SourceFile* source = c.GetSourceInfo()->GetSourceFile();
-    out += "{\"file\":";
+void AppendLocation(const Cs_Constraint* c, std::string& out) {
+    const Cs_SourceFile* source = c ? c->GetSourceInfo()->GetSourceFile() : nullptr;
+    out += "\"file\":";
     if (source && source->GetFile())
         Port_AppendJsonString(out, source->GetFile());
     else
         out += "null";
-    out += ",\"line\":" + std::to_string(source ? source->GetLine() : 0) + ",\"type\":";
+    out += ",\"line\":" + std::to_string(source ? source->GetLine() : 0);
+}
+
+void PrintJson(const Cs_Constraint& c, const Resolved& r, std::string& out) {
+    out += '{';
+    AppendLocation(&c, out);
+    out += ",\"type\":";
     Port_AppendJsonString(out, c.GetType().GetName());
     out += ",\"attribute\":";
     Port_AppendJsonString(out, c.GetAttribute());
@@ -64,32 +96,23 @@ void PrintJson(const Cs_Constraint& c, const RepoArgs& args, bool bound, std::st
     Port_AppendJsonString(out, c.GetValueText());
     out += ",\"statement\":";
     Port_AppendJsonString(out, c.GetStatementText());
-    if (bound && !c.IsAssociationExempt()) {
-        const auto& objects = c.GetAssociatedDesignObjs();
-        out += ",\"object_count\":" + std::to_string(objects.size()) + ",\"objects\":[";
-        for (size_t i = 0; i < objects.size() && i < args.names; ++i) {
+    if (r.shown) {
+        out += ",\"object_count\":" + std::to_string(r.count) + ",\"objects\":[";
+        for (size_t i = 0; i < r.objects.size(); ++i) {
             if (i) out += ',';
-            Port_AppendJsonString(out, objects[i]->GetFullName());
+            Port_AppendJsonString(out, r.objects[i]);
         }
         out += ']';
     }
     out += ",\"overridden_by\":[";
-    bool first = true;
-    for (const Cs_Conflict& k : c.GetConflicts()) {
-        const Cs_Constraint* by = k.GetConflictingConstraint();
-        if (k.GetType() != Cs_Conflict::OVERRIDE || !by) continue;
-        const Cs_SourceFile* at = by->GetSourceInfo()->GetSourceFile();
-        out += first ? "{\"file\":" : ",{\"file\":";
-        first = false;
-        if (at && at->GetFile())
-            Port_AppendJsonString(out, at->GetFile());
-        else
+    for (size_t i = 0; i < r.overrides.size(); ++i) {
+        out += i ? ",{" : "{";
+        AppendLocation(r.overrides[i].first, out);
+        out += ",\"object\":";
+        if (r.overrides[i].second.empty())
             out += "null";
-        out += ",\"line\":" + std::to_string(at ? at->GetLine() : 0) + ",\"object\":";
-        if (k.GetDesignEntity())
-            Port_AppendJsonString(out, k.GetDesignEntity()->GetFullName());
         else
-            out += "null";
+            Port_AppendJsonString(out, r.overrides[i].second);
         out += '}';
     }
     out += "]}\n";
@@ -118,10 +141,11 @@ int RunRepo(const RepoArgs& args) {
     }
     std::string out;
     for (const Cs_Constraint* c : mgr.GetConstraints(Cs_ConstraintMgr::ACTIVE)) {
+        const Resolved resolved = ResolvedOf(mgr, *c, args.names);
         if (args.format == "jsonl")
-            PrintJson(*c, args, design != nullptr, out);
+            PrintJson(*c, resolved, out);
         else
-            PrintText(*c, args, design != nullptr, out);
+            PrintText(*c, resolved, out);
         if (out.size() > (1 << 16)) {
             std::fwrite(out.data(), 1, out.size(), stdout);
             out.clear();
@@ -140,15 +164,16 @@ void AddRepoCommand(CLI::App& app, QuillmapAction& run) {
         "List what a project's constraint repository holds.\n"
         "One constraint per line, in the order of the files and lines it was read from:\n"
         "  FILE:LINE  TYPE  ATTRIBUTE = VALUE  [STATEMENT]  objects N: NAME, ...  overridden by FILE:LINE on OBJECT\n"
-        "TYPE is the repository's class of the constraint (Locate, IOStandard, TimeSpec, ...; Unsupported for\n"
-        "attributes kept as plain text), STATEMENT the statement it came from with its blanks folded.\n"
-        "With --design the repository is bound to the design, and each constraint of an INST, NET or PIN\n"
-        "statement shows how many objects it resolved to and the full names of the first few; design-wide\n"
-        "constraints (timing, groups, CONFIG) show none. \"overridden by\" names each later statement that\n"
-        "sets the same attribute to another value, and the object it does so on. Without --design, only\n"
-        "design-wide overrides are shown. With --format jsonl each line is a JSON object with the fields\n"
-        "file, line, type, attribute, value, statement, object_count and objects (with --design), and\n"
-        "overridden_by (a list of file, line, object).");
+        "TYPE is the repository's class of the constraint (Locate, IOStandard, TimeSpec, ...; Unsupported\n"
+        "for attributes kept as plain text), STATEMENT the statement it came from, blanks folded.\n"
+        "A constraint of an INST, NET or PIN statement shows how many objects it resolved to and the\n"
+        "full names of the first few (--names); design-wide constraints (timing, groups, CONFIG) show\n"
+        "none. \"overridden by\" names each later statement that sets the same attribute to another\n"
+        "value, and the object it does so on. With --design the names are resolved in that design;\n"
+        "without it, they are those the repository resolved when it was last written.\n"
+        "With --format jsonl each line is a JSON object with the fields file, line, type, attribute,\n"
+        "value, statement, object_count and objects (not for design-wide constraints), and\n"
+        "overridden_by (a list of objects with file, line and object).");
     cmd->add_option("PROJECT", args.project, "Project file given to annotate --project")->required();
     cmd->add_option("--design", args.design, "Yosys JSON netlist or native design file to resolve the names in");
     cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");

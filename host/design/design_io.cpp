@@ -1,5 +1,7 @@
 #include "host/design/design_io.h"
 
+#include <sys/stat.h>
+
 #include "host/design/json_input.h"
 
 #include <cerrno>
@@ -29,8 +31,18 @@ std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_mod
         Msg().issueError("%s", Port_Format("Cannot read design file '%s': %s.", path, std::strerror(errno)).c_str());
         return nullptr;
     }
-    if (!Ndm_IsNativeText(head, got)) return Ndm_ReadYosysJson(path, top_module);
-    auto design = Ndm_ReadNative(path);
+    struct stat st {};
+    const bool known = ::stat(path, &st) == 0 && S_ISREG(st.st_mode);
+    auto stamp = [&](std::unique_ptr<Ndm_Design> design) {
+        if (design && known)
+            design->SetSourceStamp(Port_Format("%llu:%llu:%lld:%lld.%09ld", static_cast<unsigned long long>(st.st_dev),
+                                               static_cast<unsigned long long>(st.st_ino),
+                                               static_cast<long long>(st.st_size),
+                                               static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec));
+        return design;
+    };
+    if (!Ndm_IsNativeText(head, got)) return stamp(Ndm_ReadYosysJson(path, top_module));
+    auto design = stamp(Ndm_ReadNative(path));
     if (design && top_module && std::strcmp(design->GetName(), top_module) != 0) {
         Msg().issueError("%s", Port_Format("Design file '%s' holds design '%s', not '%s'.", path,
                                            design->GetName(), top_module)

@@ -268,6 +268,12 @@ public:
     // Interned copy when the name is known to the design, else null.
     const char* FindInterned(std::string_view name) const;
 
+    // What the design was read from, for caches of what its names resolve to: the loader sets
+    // the identity of the file (device, inode, size, modification time). Empty for a design
+    // made in memory, which no such cache can trust.
+    const std::string& GetSourceStamp() const { return source_stamp_; }
+    void SetSourceStamp(std::string stamp) { source_stamp_ = std::move(stamp); }
+
     // Object counts and an estimate of the memory the design holds, for reports.
     struct Stats {
         size_t blocks = 0, signals = 0, pins = 0, networks = 0, name_bytes = 0;
@@ -282,6 +288,7 @@ private:
 
     std::unique_ptr<Ndm_NamePool> names_;
     const char* name_;
+    std::string source_stamp_;
     std::deque<Ndm_View> view_pool_;
     std::vector<Ndm_View*> views_;
     std::deque<Ndm_Block> block_pool_;

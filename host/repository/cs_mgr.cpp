@@ -37,6 +37,7 @@ Cs_ReturnCode Cs_ConstraintMgr::GetFindings() const {
 
 Cs_ReturnCode Cs_ConstraintMgr::SetDesign(const Ndm_Design* design) {
     design_ = design;
+    committed_.clear();
     return Resolve();
 }
 
@@ -179,6 +180,7 @@ void Cs_ConstraintMgr::DeleteAllConstraints() {
     sources_.clear();
     loose_.clear();
     resolution_ = Cs_ReturnCode();
+    committed_.clear();
     texts_ = std::make_unique<Ndm_NamePool>();
     bulk_changed_ = false;
 }

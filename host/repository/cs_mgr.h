@@ -6,6 +6,7 @@
 
 #include <memory>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 #include "host/design/name_pool.h"
@@ -96,7 +97,9 @@ public:
     // one and renamed into place when complete and synced.
     Cs_ReturnCode Commit(const Port::StringBase<char>& file) const;
     // Replaces the repository by the content of file; on failure the repository is left as it
-    // was and the status names the file and the reason.
+    // was and the status names the file and the reason. What the constraints resolved to is
+    // taken from the file when the bound design is the one it was committed for (the same
+    // Ndm_Design::GetSourceStamp, not empty); otherwise every constraint is resolved again.
     Cs_ReturnCode Restore(const Port::StringBase<char>& file);
     // The outcome of the last Commit or Restore: a host that only learns whether they worked
     // finds the reason here.
@@ -107,6 +110,20 @@ public:
     Cs_ReturnCode WriteConstraintProps(const Cs_DesignRegion& region) const;
     // Takes the constraint properties of the region's objects into the repository.
     PropReplaceResults ReplaceConstraintsFromProps(const Cs_DesignRegion& region);
+
+    // ---- what was committed
+    // The full names of the objects a constraint resolved to, and of those later constraints
+    // override it on, as committed. Restore keeps them while no design is bound (a bound
+    // design answers with its objects), so that a repository can be listed without its design;
+    // null for a constraint without any.
+    struct CommittedNames {
+        std::vector<std::string> objects;                                      // full names
+        std::vector<std::pair<const Cs_Constraint*, std::string>> overrides;  // by, on which object
+    };
+    const CommittedNames* GetCommittedNames(const Cs_Constraint& c) const {
+        auto it = committed_.find(&c);
+        return it == committed_.end() ? nullptr : &it->second;
+    }
 
     // Interned copy of a text, owned by the repository.
     const char* Text(std::string_view text) { return texts_->Intern(text); }
@@ -146,4 +163,5 @@ private:
     bool bulk_ = false;
     bool bulk_changed_ = false;
     mutable Cs_ReturnCode store_outcome_;
+    std::unordered_map<const Cs_Constraint*, CommittedNames> committed_;
 };

@@ -353,6 +353,9 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
              db.Insert("INSERT INTO meta VALUES (?,?)",
                        {std::string("design"), std::string(design && design->GetName() ? design->GetName() : "")},
                        nullptr, error) &&
+             db.Insert("INSERT INTO meta VALUES (?,?)",
+                       {std::string("design_stamp"), design ? design->GetSourceStamp() : std::string()}, nullptr,
+                       error) &&
              db.Insert("INSERT INTO meta VALUES (?,?)", {std::string("content_checksum"), std::string(hex)}, nullptr,
                        error);
         if (!ok) return fail(error.empty() ? "writing was interrupted" : error);
@@ -484,11 +487,19 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     Ndm_View* view = mgr.design_ ? mgr.design_->GetWorkView() : nullptr;
     for (const Row& r : paths)
         if (Cs_Constraint* c = constraint(r[0])) c->paths_.push_back(staged.Text(Str(r[1])));
+    // What the constraints resolved to counts only for the design it was committed for; with no
+    // design bound the names are kept for listings.
+    const std::string& stamp = mgr.design_ ? mgr.design_->GetSourceStamp() : info["design_stamp"];
+    const bool same_design = !stamp.empty() && stamp == info["design_stamp"];
     for (const Row& r : assocs) {
         Cs_Constraint* c = constraint(r[0]);
         if (!c) return fail("it is damaged (an association of an unknown constraint)");
         if (Str(r[1]) == "constraint") {
             if (Cs_Constraint* other = constraint(r[3])) c->constraints_.push_back(other);
+        } else if (!view) {
+            staged.committed_[c].objects.push_back(Str(r[2]));
+        } else if (!same_design) {
+            continue;
         } else if (Ndm_PropertyHolder* o = FindObject(view, Str(r[1]), Str(r[2]))) {
             c->objects_.push_back(o);
         }
@@ -496,6 +507,11 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     for (const Row& r : conflicts) {
         Cs_Constraint* c = constraint(r[0]);
         if (!c) return fail("it is damaged (a conflict of an unknown constraint)");
+        if (!IsNull(r[2]) && !view) {
+            staged.committed_[c].overrides.emplace_back(constraint(r[4]), Str(r[3]));
+            continue;
+        }
+        if (!IsNull(r[2]) && !same_design) continue;
         Ndm_PropertyHolder* entity = IsNull(r[2]) ? nullptr : FindObject(view, Str(r[2]), Str(r[3]));
         if (!IsNull(r[2]) && !entity) continue;  // an object the bound design no longer has
         c->conflicts_.emplace_back(static_cast<Cs_Conflict::CONFLICTTYPE>(Int(r[1])), entity, constraint(r[4]));
@@ -524,8 +540,10 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     mgr.sources_ = std::move(staged.sources_);
     mgr.loose_ = std::move(staged.loose_);
     mgr.resolution_ = std::move(staged.resolution_);
+    mgr.committed_ = std::move(staged.committed_);
     mgr.texts_ = std::move(staged.texts_);
     staged.texts_ = std::make_unique<Ndm_NamePool>();
+    if (view && !same_design) mgr.Resolve();
     return outcome;
 }
 

@@ -311,6 +311,32 @@ TEST_F(Repo, CommitThenRestoreGivesTheSameRepository) {
     third.SetDesign(design.get());
     ASSERT_TRUE(third.Restore(copy.c_str()));
     EXPECT_EQ(Snapshot(third), before);
+
+    // What the names resolved to is taken from the file only for the design it was committed
+    // for: a design that now has the missing net is resolved again; without a design the
+    // committed names are kept for listings.
+    for (bool same : {true, false}) {
+        auto grown = Ndm_LoadDesign((kBlinky + "blinky.json").c_str(), nullptr);
+        Ndm_Block* top = grown->GetWorkView()->GetBlock();
+        grown->GetWorkView()->CreateNetwork()->AddSignal(top->CreateSignal("dbg_probe"));
+        if (!same) grown->SetSourceStamp(grown->GetSourceStamp() + "+edited");
+        Cs_ConstraintMgr again;
+        again.SetDesign(grown.get());
+        ASSERT_TRUE(again.Restore(file.c_str()));
+        const Cs_Constraint* probe = nullptr;
+        for (const Cs_Constraint* c : again.GetConstraints(Cs_ConstraintMgr::ACTIVE))
+            if (std::string(c->GetTarget()) == "dbg_probe") probe = c;
+        ASSERT_NE(probe, nullptr);
+        EXPECT_EQ(probe->GetAssociatedDesignObjs().size(), same ? 0u : 1u);
+    }
+    Cs_ConstraintMgr unbound;
+    ASSERT_TRUE(unbound.Restore(file.c_str()));
+    std::string committed;
+    for (const Cs_Constraint* c : unbound.GetConstraints(Cs_ConstraintMgr::ACTIVE))
+        if (const auto* names = unbound.GetCommittedNames(*c))
+            for (const auto& [by, on] : names->overrides)
+                committed += std::string(c->GetStatementText()) + " on " + on + " by " + by->GetStatementText() + "\n";
+    EXPECT_EQ(committed, "NET \"clk\" LOC = P10 | IOSTANDARD = LVCMOS33 on clk by NET clk LOC = P13\n");
 }
 
 // The repository file is never torn: a failure at any step of a commit, or a process killed
