@@ -24,6 +24,7 @@ double Seconds(std::chrono::steady_clock::time_point since) {
 void BM_Repository(benchmark::State& state) {
     const int cells = static_cast<int>(state.range(0));
     auto design = MakeFlatDesign(cells);
+    design->SetSourceStamp("generated");  // restores trust what the file resolved
     std::string file = WriteExactStatements(cells, "/tmp/lun_repository_bench_" + std::to_string(cells) + ".ucf");
     std::string db = file + ".qbcd";
     Port_MsgCapture quiet;
