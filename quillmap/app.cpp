@@ -1,9 +1,13 @@
 #include "quillmap/app.h"
 
 #include <CLI/CLI.hpp>
+#include <cerrno>
 #include <cstdio>
+#include <cstring>
+#include <iostream>
 #include <exception>
 
+#include "host/port/atomic_file.h"
 #include "host/port/msgman.h"
 
 #ifndef LUN_VERSION
@@ -20,6 +24,18 @@ const char* kDescription =
     "error or bad usage.";
 
 }  // namespace
+
+bool QuillmapOutputIsNew(const std::string& output, const std::vector<std::string>& inputs) {
+    if (output.empty()) return true;
+    for (const std::string& input : inputs) {
+        if (input.empty() || !Port::SameFile(output, input)) continue;
+        Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+            .issueError("The output file '%s' is the input file '%s': give another output file.\n", output.c_str(),
+                        input.c_str());
+        return false;
+    }
+    return true;
+}
 
 int QuillmapMain(int argc, char** argv) {
     CLI::App app{kDescription, "quillmap"};
@@ -63,6 +79,13 @@ int QuillmapMain(int argc, char** argv) {
 
     try {
         int status = run ? run() : kStatusFatal;
+        // Output lost on a full device or a closed pipe is an error the user must see.
+        std::cout.flush();
+        if (std::fflush(stdout) != 0 || std::ferror(stdout) || !std::cout) {
+            Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+                .issueError("Cannot write to the standard output: %s.\n", std::strerror(errno ? errno : EIO));
+            if (status == kStatusOk) status = kStatusErrors;
+        }
         // An internal error is an error the library found in its own state: it counts as one.
         if (status == kStatusOk && (Port_MsgManData::Count(Port_Severity::Error) > 0 ||
                                     Port_MsgManData::Count(Port_Severity::Internal) > 0))

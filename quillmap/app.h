@@ -24,6 +24,10 @@ struct QuillmapOptions {
     bool debug = false;
 };
 
+// False, after an error naming both, when output (if given) is the same file as one of the
+// inputs: quillmap never writes over what it reads.
+bool QuillmapOutputIsNew(const std::string& output, const std::vector<std::string>& inputs);
+
 // Reads a design file (Yosys JSON netlist or native design file); null after a message.
 std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top);
 

@@ -4,6 +4,7 @@
 #include <string>
 #include <vector>
 
+#include "bridge/luncshelper.h"
 #include "host/design/native_format.h"
 #include "host/design/ndm.h"
 #include "host/port/msgman.h"
@@ -89,6 +90,11 @@ int RunFileRoad(const AnnotateArgs& args, const QuillmapOptions& options) {
 }
 
 int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
+    std::vector<std::string> inputs{args.design, args.filter, args.project};
+    inputs.insert(inputs.end(), args.ucf.begin(), args.ucf.end());
+    inputs.insert(inputs.end(), args.ncf.begin(), args.ncf.end());
+    if (!args.project.empty()) inputs.push_back(Ta_LunCSHelper::RepositoryPath(args.project.c_str()).str());
+    if (!QuillmapOutputIsNew(args.output, inputs)) return kStatusFatal;
     if (args.project.empty()) return RunFileRoad(args, options);
     QuillmapRoadRequest request{args.design, args.top, args.ucf, !args.ncf.empty(), args.project, args.drc,
                                 args.allow_unmatched_locs, args.allow_unmatched_maxdelay, args.output};

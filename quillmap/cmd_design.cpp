@@ -54,6 +54,7 @@ static void AddDumpCommand(CLI::App& app, QuillmapAction& run) {
     cmd->add_option("-o,--output", args.output, "Write the dump to this file instead of stdout");
     cmd->callback([&run] {
         run = [] {
+            if (!QuillmapOutputIsNew(args.output, {args.design})) return static_cast<int>(kStatusFatal);
             auto design = QuillmapLoadDesign(args.design, args.top);
             if (!design) return static_cast<int>(kStatusErrors);
             if (args.output.empty()) {
@@ -93,6 +94,7 @@ static void AddConvertCommand(CLI::App& app, QuillmapAction& run) {
                   "Rewrite netlist-form properties into their constraint-file form before saving");
     cmd->callback([&run] {
         run = [] {
+            if (!QuillmapOutputIsNew(args.output, {args.design})) return static_cast<int>(kStatusFatal);
             auto design = QuillmapLoadDesign(args.design, args.top);
             if (!design) return static_cast<int>(kStatusErrors);
             if (args.normalize) {

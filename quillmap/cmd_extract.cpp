@@ -22,6 +22,7 @@ struct ExtractArgs {
 Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
 
 int RunExtract(const ExtractArgs& args) {
+    if (!QuillmapOutputIsNew(args.output, {args.design})) return kStatusFatal;
     auto design = QuillmapLoadDesign(args.design, args.top);
     if (!design) return kStatusErrors;
     Ndm_View* view = QuillmapWorkView(*design, args.design, "extract from");

@@ -36,45 +36,6 @@ bool File::mkdir(const char* path, bool parents) {
     return ::mkdir(path, 0777) == 0 || (errno == EEXIST && parents);
 }
 
-AtomicFile::AtomicFile(std::string path) : path_(std::move(path)) {
-    temp_ = path_ + ".tmp." + std::to_string(::getpid());
-    file_ = std::fopen(temp_.c_str(), "wb");
-    if (!file_) error_ = std::string("cannot create '") + temp_ + "': " + std::strerror(errno);
-}
-
-AtomicFile::~AtomicFile() {
-    if (file_) {
-        std::fclose(static_cast<FILE*>(file_));
-        std::remove(temp_.c_str());
-    }
-}
-
-bool AtomicFile::Write(const char* data, size_t size) {
-    if (!file_ || !error_.empty()) return false;
-    if (size && std::fwrite(data, 1, size, static_cast<FILE*>(file_)) != size) {
-        error_ = std::string("cannot write '") + temp_ + "': " + std::strerror(errno);
-        return false;
-    }
-    return true;
-}
-
-bool AtomicFile::Commit() {
-    if (!file_) return false;
-    FILE* f = static_cast<FILE*>(file_);
-    file_ = nullptr;
-    bool ok = error_.empty() && std::fflush(f) == 0;
-    if (std::fclose(f) != 0) ok = false;
-    if (ok && std::rename(temp_.c_str(), path_.c_str()) != 0) {
-        error_ = std::string("cannot rename to '") + path_ + "': " + std::strerror(errno);
-        ok = false;
-    }
-    if (!ok) {
-        if (error_.empty()) error_ = std::string("cannot write '") + path_ + "'";
-        std::remove(temp_.c_str());
-    }
-    return ok;
-}
-
 char* wcstombs(const wchar_t* text) {
     if (!text) return nullptr;
     std::string out;

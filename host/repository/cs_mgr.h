@@ -19,8 +19,8 @@ class Ndm_Design;
 class Pr_FileText;
 class Ndm_Property;
 
-// For tests: called at each step of a commit ("open", "write", "sync", "rename"); false makes
-// that step fail as an I/O error would. Null (the default) for normal runs.
+// For tests: called at each step of a commit ("open", "write", "sync", "close", "rename"); false
+// makes that step fail as an I/O error would. Null (the default) for normal runs.
 using Cs_CommitFaultHook = bool (*)(const char* step);
 void Cs_SetCommitFaultHook(Cs_CommitFaultHook hook);
 
@@ -94,7 +94,7 @@ public:
 
     // ---- persistence (cs_store.cpp)
     // Writes the whole repository to file, atomically: the new file is built beside the old
-    // one and renamed into place when complete and synced.
+    // one and renamed into place when complete and synced (Port::AtomicFile).
     Cs_ReturnCode Commit(const Port::StringBase<char>& file) const;
     // Replaces the repository by the content of file; on failure the repository is left as it
     // was and the status names the file and the reason. What the constraints resolved to is

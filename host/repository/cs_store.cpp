@@ -16,6 +16,7 @@
 
 #include "host/design/ndm.h"
 #include "host/design/ndm_lookup.h"
+#include "host/port/atomic_file.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
 
@@ -219,30 +220,16 @@ std::shared_ptr<Cs_Status> Problem(const char* verb, const std::string& path, co
 
 bool Step(const char* step) { return !g_fault_hook || g_fault_hook(step); }
 
-bool SyncFile(const std::string& path) {
-    int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
-    if (fd < 0) return false;
-    bool ok = ::fsync(fd) == 0;
-    ::close(fd);
-    return ok;
-}
-
-void SyncDirectoryOf(const std::string& path) {
-    size_t slash = path.rfind('/');
-    std::string dir = slash == std::string::npos ? "." : (slash == 0 ? "/" : path.substr(0, slash));
-    int fd = ::open(dir.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    if (fd < 0) return;
-    ::fsync(fd);
-    ::close(fd);
-}
-
 int64_t Int(const Value& v) { return std::holds_alternative<int64_t>(v) ? std::get<int64_t>(v) : 0; }
 std::string Str(const Value& v) { return std::holds_alternative<std::string>(v) ? std::get<std::string>(v) : ""; }
 bool IsNull(const Value& v) { return std::holds_alternative<std::monostate>(v); }
 
 }  // namespace
 
-void Cs_SetCommitFaultHook(Cs_CommitFaultHook hook) { g_fault_hook = hook; }
+void Cs_SetCommitFaultHook(Cs_CommitFaultHook hook) {
+    g_fault_hook = hook;
+    Port::SetSaveFaultHook(hook);  // the steps of the save itself
+}
 
 class Cs_Store {
 public:
@@ -252,13 +239,14 @@ public:
 
 Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& path) {
     Cs_ReturnCode outcome;
-    const std::string temp = path + ".new";
+    // SQLite writes the new file under the temporary name; the save moves it into place.
+    Port::AtomicFile file(path, Port::AtomicFile::kByCaller);
+    const std::string& temp = file.temp_path();
     auto fail = [&](const std::string& why) {
-        std::remove(temp.c_str());
         outcome.Add(Problem("write", path, why));
         return outcome;
     };
-    std::remove(temp.c_str());
+    if (!file.error().empty()) return fail(file.error());
     std::string error;
     {
         Db db;
@@ -361,10 +349,7 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
         if (!ok) return fail(error.empty() ? "writing was interrupted" : error);
         if (!db.Exec("COMMIT", error)) return fail(error);
     }
-    if (!Step("sync") || !SyncFile(temp)) return fail(std::string("cannot sync the new file: ") + std::strerror(errno));
-    if (!Step("rename") || std::rename(temp.c_str(), path.c_str()) != 0)
-        return fail(std::string("cannot rename the new file into place: ") + std::strerror(errno));
-    SyncDirectoryOf(path);
+    if (!file.Commit()) return fail(file.error());
     return outcome;
 }
 
