@@ -1,6 +1,7 @@
 // Ta_LunCSHelper: annotation through the repository, and the attachment of the attributes it
 // keeps as plain key and value.
 #include <memory>
+#include <span>
 #include <string>
 
 #include "bridge/bridge_messages.h"
@@ -25,6 +26,16 @@ bool IsRange(const std::string& key) {
     if (key.find("INIT_") != std::string::npos) return dots(7);
     if (key.find("INITP_") != std::string::npos) return dots(8);
     return false;
+}
+
+// The objects an attribute kept as text goes on: the constraint block of a design-wide one (a
+// CONFIG PART on the CONFIG block, as the annotators store it; block holds it), else the
+// objects it names.
+std::span<Ndm_PropertyHolder* const> Targets(const Cs_ConstraintMgr& mgr, const Cs_Constraint& c,
+                                             Cs_ConstraintMgr::ConstraintBlocks& blocks, Ndm_PropertyHolder*& block) {
+    block = mgr.GetConstraintBlock(c, nullptr, blocks);
+    if (block) return {&block, 1};
+    return c.GetAssociatedDesignObjs();
 }
 
 // Loads several files into mgr: each is removed and added again inside one bulk bracket, then
@@ -68,10 +79,12 @@ bool Ta_LunCSHelper::Annotate(Util_FNameGroup* files, int count, bool useFilter)
 
     Port_MsgManData::debugStub("Using property filter for attributes\n");
     Cs_Filter_ConstraintType filter(Cs_Constraint_Unsupported::Type());
+    Cs_ConstraintMgr::ConstraintBlocks blocks;
+    Ndm_PropertyHolder* block = nullptr;
     for (Cs_Constraint* c : m_cmgr->GetConstraints(filter, Cs_ConstraintMgr::ACTIVE)) {
         auto* u = static_cast<Cs_Constraint_Unsupported*>(c);
         if (InvalidConstraintDrc(u)) continue;
-        const auto& objects = u->GetAssociatedDesignObjs();
+        const auto objects = Targets(*m_cmgr, *u, blocks, block);
         if (objects.empty())
             Msg(__LINE__).issueError("Could not find any associations for the following constraint:\n    '%s'\n",
                                      u->GetMsgName().c_str());
@@ -100,13 +113,15 @@ bool Ta_LunCSHelper::AnnotateSpecificUnsupportedType(Util_FNameGroup* files, int
     }
     m_attachBufferType = true;
     Cs_Filter_ConstraintType filter(Cs_Constraint_Unsupported::Type());
+    Cs_ConstraintMgr::ConstraintBlocks blocks;
+    Ndm_PropertyHolder* block = nullptr;
     for (Cs_Constraint* c : scratch->GetConstraints(filter, Cs_ConstraintMgr::ACTIVE)) {
         auto* u = static_cast<Cs_Constraint_Unsupported*>(c);
         if (!(u->GetKey() == key)) {
             Port_MsgManData::debugStub("Skipping %s\n", u->GetKey().c_str());
             continue;
         }
-        for (Ndm_PropertyHolder* object : u->GetAssociatedDesignObjs()) {
+        for (Ndm_PropertyHolder* object : Targets(*scratch, *u, blocks, block)) {
             const Cs_SourceFile* where = u->GetSourceInfo()->GetSourceFile();
             if (where)
                 Port_MsgManData::debugStub("%s was read from file %s line: %i\n", u->GetType().GetName(),

@@ -24,7 +24,8 @@ Ta_LunBase::Ta_LunBase(const char* filename, CP_FILE_TYPE type, const char* filt
       case_sensitive(type != CP_UCF),
       debug_callbacks(false),
       file_from_csttrans(false),
-      second_pass(false) {
+      second_pass(false),
+      blocks_(type == CP_UCF) {
     Port_MsgManData::debugStub("Debugging the Data Driven Parser\n");
     if (!filename) Msg(__LINE__).issueFatal(2, "No filename supplied!\n");
     constraint_filename = UT_STR::Dup(filename);
@@ -46,7 +47,7 @@ void Ta_LunBase::CopyFrom(const Ta_LunBase& other) {
     debug_callbacks = other.debug_callbacks;
     file_from_csttrans = other.file_from_csttrans;
     second_pass = other.second_pass;
-    std::memcpy(block_cache_, other.block_cache_, sizeof block_cache_);
+    blocks_ = other.blocks_;
 }
 
 void Ta_LunBase::Release() {
@@ -73,7 +74,7 @@ Ta_LunBase::~Ta_LunBase() { Release(); }
 unsigned char Ta_LunBase::annotate(Ndm_View* design_view) {
     if (!design_view) Msg(__LINE__).issueFatal(2, "No design supplied!\n");
     view = design_view;
-    for (Ndm_Block*& cached : block_cache_) cached = nullptr;
+    blocks_ = Ndm_ConstraintBlocks(file_type == CP_UCF);
     // A second run replaces the filter of the first rather than leaking it.
     delete prop_filter;
     prop_filter = new Ndh_PropInFilter(filter_filename ? filter_filename : kDefaultFilter, nullptr);

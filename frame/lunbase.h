@@ -8,6 +8,7 @@
 #include <string>
 
 #include "host/design/ndm.h"
+#include "host/design/ndm_constraint_blocks.h"
 #include "host/parser/pr_logical.h"
 
 class Ndh_PropInFilter;
@@ -87,13 +88,11 @@ private:
     template <class MakeEntry>
     unsigned char Attach(const char* name, Ndm_PropertyHolder* object,
                          const Pr_Logical_ConstraintHandle* handle, MakeEntry make_entry);
-    bool IsUsable(Ndm_Block* block, const char* type) const;
     void CopyFrom(const Ta_LunBase& other);
     void Release();
 
-    // Constraint blocks handed out in this run, by type, so that later statements do not
-    // search the hierarchy again; a cached block is checked before it is reused.
-    Ndm_Block* block_cache_[3] = {nullptr, nullptr, nullptr};
+    // The constraint blocks of this kind of file; those handed out in this run are remembered.
+    Ndm_ConstraintBlocks blocks_{true};
 };
 
 // Turns a filter verdict for the constraint name into the messages of an attachment, located

@@ -5,6 +5,8 @@
 
 #include <string>
 
+#include "host/design/ndm_constraint_blocks.h"
+#include "host/parser/pr_block_texts.h"
 #include "host/port/env.h"
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
@@ -64,20 +66,8 @@ bool Ta_LunMgr::cb_config(const char* name, const char* value, const Pr_Logical_
             "\"PART\" value is %s. Please remove one of the \"CONFIG PART\" statements from the %s file.\n",
             constraint_filename, first ? first : "NONE", value, constraint_filename);
     }
-    if (UT_STR::INCompare(name, "INTERNAL_VREF_BANK", 18) == 0) {
-        // Bank reference voltages go straight onto the block; a repeated one replaces the first,
-        // whatever the letter case it was written in.
-        for (bool again = true; again;) {
-            again = false;
-            for (Ndm_Property* p : block->GetPropertyItr()) {
-                if (UT_STR::ICompare(p->GetName(), name) == 0) {
-                    block->DeleteProperty(p);
-                    again = true;
-                    break;
-                }
-            }
-        }
-        block->CreatePropertyString(name, value);
+    if (Pr_IsBankVoltage(name)) {
+        Ndm_ReplaceSetting(block, name, value);
         return true;
     }
     if (UT_STR::ICompare(name, "DCI_CASCADE") == 0) return DCI_Cascade_Hack(block, value, handle) != 0;
@@ -86,34 +76,30 @@ bool Ta_LunMgr::cb_config(const char* name, const char* value, const Pr_Logical_
 
 unsigned char Ta_LunMgr::DCI_Cascade_Hack(Ndm_Block* block, const char* value,
                                           const Pr_Logical_ConstraintHandle* handle) {
-    auto words = Port::StringBase<char>::Split(Port::StringBase<char>(value), " ", true, "", "");
-    if (words.empty()) Port_MsgManData::debugStub("Unable to extract substrings for DCI_CASCADE\n");
-    std::string joined;
-    for (size_t i = 0; i < words.size(); ++i) {
-        if (i) joined += ',';
-        joined += words[i].str();
-    }
+    std::string joined = Pr_DciCascadeText(value);
+    if (joined.empty()) Port_MsgManData::debugStub("Unable to extract substrings for DCI_CASCADE\n");
     AttachConstraint("DCI_CASCADE", joined.c_str(), block, handle);
     return 1;
 }
 
 // Voltage and temperature settings: the value with three decimals and its unit letter on the
 // CONFIG block, whatever the filter says of it.
-bool Ta_LunMgr::AttachOperatingCondition(const char* trace, const char* name, const char* format, double value,
+bool Ta_LunMgr::AttachOperatingCondition(const char* trace, const char* name, const std::string& value,
                                          const Pr_Logical_ConstraintHandle* handle) {
     Trace(trace, handle);
     if (second_pass) return true;
     Ndm_Block* block = GetConstraintBlock("CONFIG");
-    AttachConstraint(name, Port_Format(format, value).c_str(), block, handle);
+    AttachConstraint(name, value.c_str(), block, handle);
     return true;
 }
 
 bool Ta_LunMgr::cb_voltage(double volts, const Pr_Logical_ConstraintHandle* handle) {
-    return AttachOperatingCondition("MGR::Voltage: Line %I: %s", "VOLTAGE", "%0.3fV", volts, handle);
+    return AttachOperatingCondition("MGR::Voltage: Line %I: %s", "VOLTAGE", Pr_VoltageText(volts), handle);
 }
 
 bool Ta_LunMgr::cb_temperature(double celsius, const Pr_Logical_ConstraintHandle* handle) {
-    return AttachOperatingCondition("MGR::temperature: Line %I: %s", "TEMPERATURE", "%0.3fC", celsius, handle);
+    return AttachOperatingCondition("MGR::temperature: Line %I: %s", "TEMPERATURE", Pr_TemperatureText(celsius),
+                                    handle);
 }
 
 bool Ta_LunMgr::cb_model(const Pr_Logical_ConstraintDefn&, const Pr_Logical_ConstraintHandle* handle) {

@@ -112,7 +112,7 @@ protected:
     // is none or every style was tried.
     bool change_bus_delimiters(char* name);
 
-    bool AttachOperatingCondition(const char* trace, const char* name, const char* format, double value,
+    bool AttachOperatingCondition(const char* trace, const char* name, const std::string& value,
                                   const Pr_Logical_ConstraintHandle* handle);
     // Writes the trace line of a statement when tracing is on.
     void Trace(const char* format, const Pr_Logical_ConstraintHandle* handle) const;

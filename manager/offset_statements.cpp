@@ -1,21 +1,12 @@
 // Ta_LunMgr: the four OFFSET statement forms, stored as entries of the TIMESPEC block.
 #include <string>
 
+#include "host/parser/pr_block_texts.h"
 #include "host/port/msgman.h"
 #include "manager/lunmgr.h"
 #include "manager/statement_messages.h"
 
-using lunmgr::LineOf;
 using lunmgr::Msg;
-using lunmgr::TextOf;
-
-namespace {
-
-std::string ValidPart(const double* valid) {
-    return valid ? Port_Format(" %s %f %s", "VALID", *valid, "pS") : std::string();
-}
-std::string LevelPart(const char* level) { return level ? Port_Format(" %s", level) : std::string(); }
-}  // namespace
 
 void Ta_LunMgr::RecordOffset(const char* entry, const std::string& value, bool generated, bool with_line,
                              const Pr_Logical_ConstraintHandle* handle) {
@@ -39,10 +30,8 @@ bool Ta_LunMgr::cb_offset(bool in, double time, const double* valid, bool before
                           const char* level, const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::offset:line %I: %s", handle);
     if (second_pass) return true;
-    RecordOffset("OFFSET",
-                 Port_Format("%s %f %s%s %s %s%s", in ? "IN" : "OUT", time, "pS", ValidPart(valid).c_str(),
-                             before ? "BEFORE" : "AFTER", clock, LevelPart(level).c_str()),
-                 false, false, handle);
+    Pr_BlockEntry entry = Pr_OffsetEntry(nullptr, in, time, valid, before, clock, nullptr, level);
+    RecordOffset(entry.name.c_str(), entry.value, false, false, handle);
     return true;
 }
 
@@ -50,11 +39,8 @@ bool Ta_LunMgr::cb_roffset(bool in, double time, const double* valid, bool befor
                            const char* regs, const char* level, const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::roffset: line %I: %s", handle);
     if (second_pass) return true;
-    RecordOffset("OFFSET",
-                 Port_Format("%s %f %s%s %s %s TIMEGRP %s%s", in ? "IN" : "OUT", time, "pS",
-                             ValidPart(valid).c_str(), before ? "BEFORE" : "AFTER", clock, regs,
-                             LevelPart(level).c_str()),
-                 false, false, handle);
+    Pr_BlockEntry entry = Pr_OffsetEntry(nullptr, in, time, valid, before, clock, regs, level);
+    RecordOffset(entry.name.c_str(), entry.value, false, false, handle);
     return true;
 }
 
@@ -62,12 +48,8 @@ bool Ta_LunMgr::cb_toffset(const char* group, bool in, double time, const double
                            const char* clock, const char* level, const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::toffset:line %I: %s", handle);
     if (second_pass) return true;
-    std::string entry = Port_Format("TSO_%s_%s_%s", group, in ? "in" : "out", clock);
-    RecordOffset(entry.c_str(),
-                 Port_Format("TIMEGRP %s OFFSET = %s %f %s%s %s %s%s", group, in ? "IN" : "OUT", time, "pS",
-                             ValidPart(valid).c_str(), before ? "BEFORE" : "AFTER", clock,
-                             LevelPart(level).c_str()),
-                 true, true, handle);
+    Pr_BlockEntry entry = Pr_OffsetEntry(group, in, time, valid, before, clock, nullptr, level);
+    RecordOffset(entry.name.c_str(), entry.value, true, true, handle);
     return true;
 }
 
@@ -76,11 +58,7 @@ bool Ta_LunMgr::cb_troffset(const char* group, bool in, double time, const doubl
                             const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::troffset:line %I; %s", handle);
     if (second_pass) return true;
-    std::string entry = Port_Format("TSO_%s_%s_%s_%s", group, in ? "in" : "out", clock, regs);
-    RecordOffset(entry.c_str(),
-                 Port_Format("TIMEGRP %s OFFSET = %s %f %s%s %s %s TIMEGRP %s%s", group, in ? "IN" : "OUT", time,
-                             "pS", ValidPart(valid).c_str(), before ? "BEFORE" : "AFTER", clock, regs,
-                             LevelPart(level).c_str()),
-                 true, false, handle);
+    Pr_BlockEntry entry = Pr_OffsetEntry(group, in, time, valid, before, clock, regs, level);
+    RecordOffset(entry.name.c_str(), entry.value, true, false, handle);
     return true;
 }

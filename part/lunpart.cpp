@@ -1,5 +1,6 @@
 #include "part/lunpart.h"
 
+#include "host/parser/pr_block_texts.h"
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 
@@ -34,7 +35,7 @@ bool Ta_LunPart::cb_config(const char* name, const char* value, const Pr_Logical
             "value is %s. Please remove one of the \"CONFIG PART\" statements from the %s file.\n",
             constraint_filename, first ? first : "NONE", value, constraint_filename);
     }
-    if (UT_STR::INCompare(name, "INTERNAL_VREF_BANK", 18) == 0) return true;
+    if (Pr_IsBankVoltage(name)) return true;
     if (UT_STR::ICompare(name, "DCI_CASCADE") == 0) return true;
     return AttachConstraint(name, value, block, handle) != 0;
 }

@@ -88,6 +88,16 @@ const char* Cs_ScopeWord(Cs_Scope scope) {
     return "";
 }
 
+const char* Cs_BlockWord(Cs_Block block) {
+    switch (block) {
+        case Cs_Block::TimeSpec: return "TIMESPEC";
+        case Cs_Block::TimeGroup: return "TIMEGRP";
+        case Cs_Block::Config: return "CONFIG";
+        case Cs_Block::None: break;
+    }
+    return "";
+}
+
 Cs_Constraint::~Cs_Constraint() = default;
 
 std::string Cs_Constraint::GetMsgName() const {

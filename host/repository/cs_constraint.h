@@ -100,6 +100,13 @@ enum class Cs_Scope : uint8_t {
 // The statement word of a scope ("INST", "NET", ...).
 const char* Cs_ScopeWord(Cs_Scope scope);
 
+// The constraint block a design-wide constraint is stored on: TIMESPEC and TIMEGRP blocks keep
+// timing entries, the CONFIG block settings.
+enum class Cs_Block : uint8_t { None, TimeSpec, TimeGroup, Config };
+
+// The block's TYPE ("TIMESPEC", "TIMEGRP", "CONFIG"; "" for None).
+const char* Cs_BlockWord(Cs_Block block);
+
 class Cs_Constraint {
 public:
     virtual ~Cs_Constraint();
@@ -119,6 +126,14 @@ public:
     bool IsFlag() const { return flag_; }
     // The whole statement it came from, blanks folded.
     const char* GetStatementText() const { return statement_; }
+    // Where the file-reading road stores a design-wide constraint: the constraint block, and
+    // the name and value text of the timing entry or setting it gets there. None (and empty
+    // texts) for the constraints of objects, for comments, and for what the annotator stores
+    // nothing of (a statement it refuses, the later values of an AREA_GROUP or SET attribute,
+    // which the first value's text carries).
+    Cs_Block GetBlock() const { return block_; }
+    const char* GetEntryName() const { return entry_; }
+    const char* GetStoredText() const { return stored_; }
 
     const Cs_ConstraintSourceInfo* GetSourceInfo() const { return &source_; }
     // The constraint as a user recognises it, with its file and line:
@@ -146,10 +161,13 @@ private:
 
     Cs_Scope scope_ = Cs_Scope::Design;
     bool flag_ = false;
+    Cs_Block block_ = Cs_Block::None;
     const char* target_ = "";  // texts are owned by the repository
     const char* key_ = "";
     const char* value_ = "";
     const char* statement_ = "";
+    const char* entry_ = "";
+    const char* stored_ = "";
     Cs_ConstraintSourceInfo source_;
     std::vector<Ndm_PropertyHolder*> objects_;
     std::vector<const Cs_Constraint*> constraints_;

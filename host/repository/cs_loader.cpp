@@ -2,6 +2,7 @@
 
 #include <cstring>
 
+#include "host/parser/pr_block_texts.h"
 #include "host/parser/pr_property_texts.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
@@ -24,12 +25,6 @@ std::string Folded(std::string_view text) {
         out += c;
     }
     while (!out.empty() && (out.back() == ';' || out.back() == ' ')) out.pop_back();
-    return out;
-}
-
-std::string Joined(const std::vector<const char*>& words, const char* separator) {
-    std::string out;
-    for (const char* w : words) (out += out.empty() ? "" : separator) += w;
     return out;
 }
 
@@ -82,6 +77,18 @@ Cs_Constraint& Cs_Loader::Add(Cs_Scope scope, const char* target, const char* ke
     return Add(T::Type(), scope, target, key, value, handle, flag);
 }
 
+void Cs_Loader::Store(Cs_Constraint& c, Cs_Block block, std::string_view entry, std::string_view stored) {
+    c.block_ = block;
+    c.entry_ = mgr_.Text(entry);
+    c.stored_ = mgr_.Text(stored);
+}
+
+template <class T>
+void Cs_Loader::Setting(const char* key, std::string_view value, const char* entry, std::string_view stored,
+                        const Handle* handle) {
+    Store(Add<T>(Cs_Scope::Design, "", key, value, handle), Cs_Block::Config, entry, stored);
+}
+
 const char* Cs_Loader::StatementText(const Handle* handle) {
     // The constraints of one statement come one after the other: fold its text once.
     const char* raw = handle ? handle->return_ascii() : "";
@@ -125,8 +132,10 @@ bool Cs_Loader::cb_comment(const char* text, const Handle* handle) {
 }
 
 bool Cs_Loader::cb_enable(bool enable, const char* name, const Handle* handle) {
-    Add<Cs_Constraint_TimeSpec>(Cs_Scope::TimeSpec, "", enable ? "ENABLE" : "DISABLE", name, handle).paths_ = {
-        mgr_.Text(name)};
+    const char* key = enable ? "ENABLE" : "DISABLE";
+    Cs_Constraint& c = Add<Cs_Constraint_TimeSpec>(Cs_Scope::TimeSpec, "", key, name, handle);
+    c.paths_ = {mgr_.Text(name)};
+    Store(c, Cs_Block::TimeSpec, key, name);
     return true;
 }
 
@@ -144,7 +153,10 @@ bool Cs_Loader::Objects(Cs_Scope scope, const Defn& defn, const Handle* handle) 
         }
         if (c.get_type() == Pr_Logical_Constraint::STRING && Is(key, "PART")) {
             auto* s = dynamic_cast<const Pr_Logical_StringConstraint*>(&c);
-            Add<Cs_Constraint_Unsupported>(scope, target, "PART", s ? s->get_value() : "", handle);
+            const char* part = s ? s->get_value() : "";
+            Cs_Constraint& k = Add<Cs_Constraint_Unsupported>(scope, target, "PART", part, handle);
+            // A UCF's part is the design's, whatever statement names it.
+            if (ucf_) Store(k, Cs_Block::Config, "PART", part);
             continue;
         }
         Pr_PropertyPlan plan = Pr_PlanProperties(c, key, ucf_);
@@ -175,16 +187,26 @@ bool Cs_Loader::cb_comp(const Defn& defn, const Handle* handle) { return Objects
 bool Cs_Loader::cb_net(const Defn& defn, const Handle* handle) { return Objects(Cs_Scope::Net, defn, handle); }
 bool Cs_Loader::cb_pin(const Defn& defn, const Handle* handle) { return Objects(Cs_Scope::Pin, defn, handle); }
 
-// AREA_GROUP and SET attributes: "<name> = <value>" as the CONFIG block keeps them.
+// AREA_GROUP and SET attributes: one constraint per value, as object statements give them; the
+// first value of an attribute carries what the CONFIG block keeps of the whole attribute
+// ("<name> = <value>"), unless the annotator refuses it or an attribute before it.
 bool Cs_Loader::Attributes(Cs_Scope scope, const Defn& defn, const Handle* handle) {
     const char* target = defn.get_object_name();
+    bool stopped = false;
     for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
-        Pr_PropertyPlan plan = Pr_PlanProperties(**it, (*it)->get_name(), ucf_);
-        for (const Pr_PropertyText& p : plan.texts) {
-            if (scope == Cs_Scope::Set)
-                Add<Cs_Constraint_Set>(scope, target, p.name.c_str(), p.value, handle, p.flag);
-            else
-                Add<Cs_Constraint_AreaGroup>(scope, target, p.name.c_str(), p.value, handle, p.flag);
+        const char* name = (*it)->get_name();
+        Pr_AttributeText stored;
+        if (!stopped) stored = scope == Cs_Scope::Set ? Pr_SetText(target, **it) : Pr_AreaGroupText(target, **it);
+        stopped = stopped || Pr_StopsStatement(stored.rule);
+        const bool attach = stored.rule == Pr_AttributeRule::Attach;
+        Pr_PropertyPlan plan = Pr_PlanProperties(**it, name, ucf_);
+        if (plan.texts.empty() && attach)  // a value the object statements pass over
+            plan.texts.push_back({name, stored.value.substr(std::strlen(target) + 3)});
+        for (size_t i = 0; i < plan.texts.size(); ++i) {
+            const Pr_PropertyText& p = plan.texts[i];
+            Cs_Constraint& c = Add(scope == Cs_Scope::Set ? Cs_Constraint_Set::Type() : Cs_Constraint_AreaGroup::Type(),
+                                   scope, target, p.name.c_str(), p.value, handle, p.flag);
+            if (i == 0 && attach) Store(c, Cs_Block::Config, name, stored.value);
         }
     }
     return true;
@@ -209,32 +231,41 @@ bool Cs_Loader::cb_end_model(const Handle* handle) {
 }
 
 bool Cs_Loader::cb_config(const char* name, const char* value, const Handle* handle) {
-    if (Port::StringBase<char>(name).Compare("PART", Port::StringBase<char>::IGNORE_CASE) == 0)
-        Add<Cs_Constraint_Unsupported>(Cs_Scope::Design, "", "PART", value, handle);
-    else if (Port::StringBase<char>(name).Compare("STEPPING", Port::StringBase<char>::IGNORE_CASE) == 0)
-        Add<Cs_Constraint_Stepping>(Cs_Scope::Design, "", "STEPPING", value, handle);
+    auto is = [name](const char* word) {
+        return Port::StringBase<char>(name).Compare(word, Port::StringBase<char>::IGNORE_CASE) == 0;
+    };
+    if (is("PART"))
+        Setting<Cs_Constraint_Unsupported>("PART", value, "PART", value, handle);
+    else if (is("STEPPING"))
+        Setting<Cs_Constraint_Stepping>("STEPPING", value, "STEPPING", value, handle);
+    else if (is("DCI_CASCADE"))
+        Setting<Cs_Constraint_Global>(name, value, "DCI_CASCADE", Pr_DciCascadeText(value), handle);
     else
-        Add<Cs_Constraint_Global>(Cs_Scope::Design, "", name, value, handle);
+        Setting<Cs_Constraint_Global>(name, value, name, value, handle);
     return true;
 }
 
 bool Cs_Loader::cb_prohibit(const std::vector<const char*>& sites, const Handle* handle) {
-    Add<Cs_Constraint_Prohibit>(Cs_Scope::Design, "", "PROHIBIT", Joined(sites, ", "), handle);
+    std::string text = Pr_SiteListText(sites);
+    Setting<Cs_Constraint_Prohibit>("PROHIBIT", text, "PROHIBIT", text, handle);
     return true;
 }
 
 bool Cs_Loader::cb_vref(const std::vector<const char*>& sites, const Handle* handle) {
-    Add<Cs_Constraint_Global>(Cs_Scope::Design, "", "VREF", Joined(sites, ", "), handle);
+    std::string text = Pr_SiteListText(sites);
+    Setting<Cs_Constraint_Global>("VREF", text, "VREF", text, handle);
     return true;
 }
 
 bool Cs_Loader::cb_temperature(double celsius, const Handle* handle) {
-    Add<Cs_Constraint_Global>(Cs_Scope::Design, "", "TEMPERATURE", Port_Format("%0.3fC", celsius), handle);
+    std::string text = Pr_TemperatureText(celsius);
+    Setting<Cs_Constraint_Global>("TEMPERATURE", text, "TEMPERATURE", text, handle);
     return true;
 }
 
 bool Cs_Loader::cb_voltage(double volts, const Handle* handle) {
-    Add<Cs_Constraint_Global>(Cs_Scope::Design, "", "VOLTAGE", Port_Format("%0.3fV", volts), handle);
+    std::string text = Pr_VoltageText(volts);
+    Setting<Cs_Constraint_Global>("VOLTAGE", text, "VOLTAGE", text, handle);
     return true;
 }
 
@@ -248,54 +279,70 @@ Cs_Constraint& Cs_Loader::TimingEntry(const char* target, const char* key, const
     return c;
 }
 
-bool Cs_Loader::cb_offset(bool, double, const double*, bool, const char*, const char*, const Handle* handle) {
-    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, "", "OFFSET", AfterEquals(handle), handle);
+// The OFFSET forms, named as the annotator names their timing entries.
+Cs_Constraint& Cs_Loader::Offset(const char* group, bool in, double time, const double* valid, bool before,
+                                 const char* clock, const char* regs, const char* level, const Handle* handle) {
+    Pr_BlockEntry entry = Pr_OffsetEntry(group, in, time, valid, before, clock, regs, level);
+    Cs_Constraint& c = Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, group ? group : "", entry.name.c_str(),
+                                                 AfterEquals(handle), handle);
+    Store(c, Cs_Block::TimeSpec, entry.name, entry.value);
+    for (const char* g : {group, regs})
+        if (g) c.paths_.push_back(mgr_.Text(g));
+    return c;
+}
+
+bool Cs_Loader::cb_offset(bool in, double time, const double* valid, bool before, const char* clock,
+                          const char* level, const Handle* handle) {
+    Offset(nullptr, in, time, valid, before, clock, nullptr, level, handle);
     return true;
 }
 
-bool Cs_Loader::cb_roffset(bool, double, const double*, bool, const char*, const char* regs, const char*,
-                           const Handle* handle) {
-    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, "", "OFFSET", AfterEquals(handle), handle).paths_ = {
-        mgr_.Text(regs)};
+bool Cs_Loader::cb_roffset(bool in, double time, const double* valid, bool before, const char* clock,
+                           const char* regs, const char* level, const Handle* handle) {
+    Offset(nullptr, in, time, valid, before, clock, regs, level, handle);
     return true;
 }
 
-bool Cs_Loader::cb_toffset(const char* group, bool in, double, const double*, bool, const char* clock,
-                           const char*, const Handle* handle) {
-    std::string key = Port_Format("TSO_%s_%s_%s", group, in ? "in" : "out", clock);
-    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, group, key.c_str(), AfterEquals(handle), handle).paths_ = {
-        mgr_.Text(group)};
+bool Cs_Loader::cb_toffset(const char* group, bool in, double time, const double* valid, bool before,
+                           const char* clock, const char* level, const Handle* handle) {
+    Offset(group, in, time, valid, before, clock, nullptr, level, handle);
     return true;
 }
 
-bool Cs_Loader::cb_troffset(const char* group, bool in, double, const double*, bool, const char* clock,
-                            const char* regs, const char*, const Handle* handle) {
-    std::string key = Port_Format("TSO_%s_%s_%s_%s", group, in ? "in" : "out", clock, regs);
-    Add<Cs_Constraint_Offset>(Cs_Scope::TimeSpec, group, key.c_str(), AfterEquals(handle), handle).paths_ = {
-        mgr_.Text(group), mgr_.Text(regs)};
+bool Cs_Loader::cb_troffset(const char* group, bool in, double time, const double* valid, bool before,
+                            const char* clock, const char* regs, const char* level, const Handle* handle) {
+    Offset(group, in, time, valid, before, clock, regs, level, handle);
     return true;
 }
 
-bool Cs_Loader::cb_tspec_maxdelay(const char* name, bool, bool, const std::vector<const char*>& points,
-                                  const char*, bool, double, bool, int, bool, const Handle* handle) {
-    TimingEntry(name, name, handle, points);
+bool Cs_Loader::cb_tspec_maxdelay(const char* name, bool has_from, bool has_to,
+                                  const std::vector<const char*>& points, const char* reference, bool multiply,
+                                  double value, bool is_time, int priority, bool datapathonly, const Handle* handle) {
+    Cs_Constraint& c = TimingEntry(name, name, handle, points);
+    if (!points.empty())  // the annotator refuses a delay of no path
+        Store(c, Cs_Block::TimeSpec, name,
+              Pr_PathDelayText(has_from, has_to, points, reference, multiply, value, is_time, priority, datapathonly));
     return true;
 }
 
-bool Cs_Loader::cb_tspec_period(const char* name, const char* group, const char*, bool, double, bool, bool,
-                                double, bool, double, double, const double*, int, const Handle* handle) {
-    TimingEntry(name, name, handle, {group});
+bool Cs_Loader::cb_tspec_period(const char* name, const char* group, const char* reference, bool multiply,
+                                double value, bool is_time, bool phase_plus, double phase, bool low, double duration,
+                                double percent, const double* jitter, int priority, const Handle* handle) {
+    Store(TimingEntry(name, name, handle, {group}), Cs_Block::TimeSpec, name,
+          Pr_PeriodText(group, reference, multiply, value, is_time, phase_plus, phase, low, duration, percent, jitter,
+                        priority));
     return true;
 }
 
-bool Cs_Loader::cb_tspec_tig(const char* name, bool, bool, const std::vector<const char*>& points, int,
-                             const Handle* handle) {
-    TimingEntry(name, name, handle, points);
+bool Cs_Loader::cb_tspec_tig(const char* name, bool has_from, bool has_to, const std::vector<const char*>& points,
+                             int priority, const Handle* handle) {
+    Store(TimingEntry(name, name, handle, points), Cs_Block::TimeSpec, name,
+          Pr_IgnoreText(has_from, has_to, points, priority));
     return true;
 }
 
 bool Cs_Loader::cb_tspec_drop_spec(const char* name, const Handle* handle) {
-    TimingEntry(name, name, handle, {});
+    Store(TimingEntry(name, name, handle, {}), Cs_Block::TimeSpec, name, "DROP_SPEC");
     return true;
 }
 
@@ -304,11 +351,15 @@ bool Cs_Loader::cb_timegrp(const char* group, const std::vector<std::pair<const 
     Cs_Constraint& c = Add<Cs_Constraint_TimeGrp>(Cs_Scope::TimeGroup, group, group, AfterEquals(handle), handle);
     for (const auto& m : members) c.paths_.push_back(mgr_.Text(m.first));
     for (const char* x : excluded) c.paths_.push_back(mgr_.Text(x));
+    if (!members.empty())  // the annotator refuses a group of no members
+        Store(c, Cs_Block::TimeGroup, group, Pr_TimeGroupText(members, excluded));
     return true;
 }
 
 bool Cs_Loader::cb_timegrp_areagroup(const char* group, const char* areagroup, const Handle* handle) {
     Cs_Constraint& c = Add<Cs_Constraint_TimeGrp>(Cs_Scope::TimeGroup, group, "AREA_GROUP", areagroup, handle);
     c.paths_.push_back(mgr_.Text(group));
+    Pr_BlockEntry entry = Pr_GroupAreaEntry(group, areagroup);
+    Store(c, Cs_Block::TimeSpec, entry.name, entry.value);
     return true;
 }

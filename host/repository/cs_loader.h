@@ -76,6 +76,16 @@ private:
     std::string AfterEquals(const Handle* handle) const;
     Cs_Constraint& TimingEntry(const char* target, const char* key, const Handle* handle,
                                std::vector<const char*> groups);
+    // The OFFSET forms: global (group null) or of a group, of every register or of regs.
+    Cs_Constraint& Offset(const char* group, bool in, double time, const double* valid, bool before,
+                          const char* clock, const char* regs, const char* level, const Handle* handle);
+    // Records where the annotator stores c: on the block, as entry = stored.
+    void Store(Cs_Constraint& c, Cs_Block block, std::string_view entry, std::string_view stored);
+    // CONFIG settings and the other design-wide settings: one constraint of the given class,
+    // stored on the CONFIG block as entry = stored.
+    template <class T>
+    void Setting(const char* key, std::string_view value, const char* entry, std::string_view stored,
+                 const Handle* handle);
 
     Cs_ConstraintMgr& mgr_;
     const char* file_;  // interned, or null

@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "host/design/name_pool.h"
+#include "host/design/ndm_constraint_blocks.h"
 #include "host/port/string_base.h"
 #include "host/repository/cs_constraint.h"
 #include "host/repository/cs_region.h"
@@ -106,8 +107,19 @@ public:
     const Cs_ReturnCode& GetStoreOutcome() const { return store_outcome_; }
 
     // ---- write-back and take-in
-    // Writes every constraint resolved to objects of the region's view onto them as properties.
+    // Writes every typed constraint onto the region's view as the annotators store it: the
+    // constraints of objects as properties of the objects they resolved to, design-wide ones
+    // as timing entries and settings of the constraint blocks (made when missing).
     Cs_ReturnCode WriteConstraintProps(const Cs_DesignRegion& region) const;
+    // The constraint blocks handed out during one write, for the constraints of UCFs and of NCFs.
+    struct ConstraintBlocks {
+        Ndm_ConstraintBlocks ucf{true};
+        Ndm_ConstraintBlocks ncf{false};
+    };
+    // The constraint block of view (null: the bound design's work view) that a design-wide
+    // constraint is stored on (Cs_Constraint::GetBlock), found or made as the annotator of its
+    // source's file kind finds or makes it; null for other constraints and without a view.
+    Ndm_Block* GetConstraintBlock(const Cs_Constraint& c, const Ndm_View* view, ConstraintBlocks& blocks) const;
     // Takes the constraint properties of the region's objects into the repository.
     PropReplaceResults ReplaceConstraintsFromProps(const Cs_DesignRegion& region);
 
@@ -148,6 +160,8 @@ private:
     void Changed();
     // Resolution of every constraint (cs_resolve.cpp).
     Cs_ReturnCode Resolve();
+    // Whether c was read from an NCF (the others are read as UCFs).
+    bool IsFromNcf(const Cs_Constraint& c) const;
     template <class F>
     void ForEach(F&& f) const {
         for (const Source& s : sources_)

@@ -1,9 +1,12 @@
-// Write-back of the repository's typed constraints onto a view as properties, and take-in of
-// constraint properties found on a view.
+// Write-back of the repository's typed constraints onto a view (properties of objects, timing
+// entries and settings of the constraint blocks), and take-in of constraint properties found
+// on a view.
 #include <cstring>
 
 #include "host/design/ndm.h"
+#include "host/design/ndm_constraint_blocks.h"
 #include "host/filter/prop_attach.h"
+#include "host/parser/pr_block_texts.h"
 #include "host/parser/pr_logical.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
@@ -34,6 +37,17 @@ bool Attach(Ndh_PropInFilter& filter, Ndm_PropertyHolder* object, const char* na
     return true;
 }
 
+// The view that holds a design object.
+const Ndm_View* ViewOf(const Ndm_PropertyHolder* object) {
+    switch (object->GetKind()) {
+        case Ndm_ObjKind::Block: return static_cast<const Ndm_Block*>(object)->GetView();
+        case Ndm_ObjKind::Network: return static_cast<const Ndm_Network*>(object)->GetView();
+        case Ndm_ObjKind::Signal: return static_cast<const Ndm_Signal*>(object)->GetBlock()->GetView();
+        case Ndm_ObjKind::Pin: return static_cast<const Ndm_Pin*>(object)->GetBlock()->GetView();
+        default: return nullptr;
+    }
+}
+
 }  // namespace
 
 Cs_ReturnCode Cs_ConstraintMgr::WriteConstraintProps(const Cs_DesignRegion& region) const {
@@ -41,24 +55,42 @@ Cs_ReturnCode Cs_ConstraintMgr::WriteConstraintProps(const Cs_DesignRegion& regi
     const Ndm_View* view = region.GetView();
     if (!view) return outcome;
     Ndh_PropInFilter filter("ucf.prp", nullptr);
-    ForEach([&](const Cs_Constraint& c) {
-        // Attributes without a class are the bridge's to attach; design-wide constraints stay
-        // in the repository.
-        if (c.GetType() == Cs_Constraint_Unsupported::Type() || c.IsAssociationExempt()) return;
-        for (Ndm_PropertyHolder* object : c.GetAssociatedDesignObjs()) {
-            const Ndm_View* owner = nullptr;
-            switch (object->GetKind()) {
-                case Ndm_ObjKind::Block: owner = static_cast<Ndm_Block*>(object)->GetView(); break;
-                case Ndm_ObjKind::Network: owner = static_cast<Ndm_Network*>(object)->GetView(); break;
-                case Ndm_ObjKind::Signal: owner = static_cast<Ndm_Signal*>(object)->GetBlock()->GetView(); break;
-                case Ndm_ObjKind::Pin: owner = static_cast<Ndm_Pin*>(object)->GetBlock()->GetView(); break;
-                default: break;
-            }
-            if (owner != view) continue;
-            Attach(filter, object, c.GetAttribute(), c.IsFlag() ? nullptr : c.GetValueText(), outcome, c);
+    ConstraintBlocks blocks;
+    auto write = [&](const Cs_Constraint& c) {
+        // Attributes without a class are the bridge's to attach.
+        if (c.GetType() == Cs_Constraint_Unsupported::Type()) return;
+        if (Ndm_Block* block = GetConstraintBlock(c, view, blocks)) {
+            if (c.GetBlock() != Cs_Block::Config)
+                Ndm_AddTimingEntry(block, c.GetEntryName(), c.GetStoredText());
+            else if (Pr_IsBankVoltage(c.GetEntryName()))
+                Ndm_ReplaceSetting(block, c.GetEntryName(), c.GetStoredText());
+            else
+                Attach(filter, block, c.GetEntryName(), c.GetStoredText(), outcome, c);
+            return;
         }
-    });
+        if (c.IsAssociationExempt()) return;
+        for (Ndm_PropertyHolder* object : c.GetAssociatedDesignObjs())
+            if (ViewOf(object) == view)
+                Attach(filter, object, c.GetAttribute(), c.IsFlag() ? nullptr : c.GetValueText(), outcome, c);
+    };
+    ForEach(write);
     return outcome;
+}
+
+bool Cs_ConstraintMgr::IsFromNcf(const Cs_Constraint& c) const {
+    const Cs_SourceFile* where = c.GetSourceInfo()->GetSourceFile();
+    if (!where) return false;
+    for (const Source& s : sources_)
+        if (std::strcmp(s.info->GetFileName(), where->GetFile()) == 0)
+            return s.info->GetSyntax() == Cs_ConstraintSyntax::NCF;
+    return false;
+}
+
+Ndm_Block* Cs_ConstraintMgr::GetConstraintBlock(const Cs_Constraint& c, const Ndm_View* view,
+                                                ConstraintBlocks& blocks) const {
+    if (!view) view = design_ ? design_->GetWorkView() : nullptr;
+    if (!view || c.GetBlock() == Cs_Block::None) return nullptr;
+    return (IsFromNcf(c) ? blocks.ncf : blocks.ucf).Get(view->GetBlock(), Cs_BlockWord(c.GetBlock()));
 }
 
 Cs_ConstraintMgr::PropReplaceResults Cs_ConstraintMgr::ReplaceConstraintsFromProps(const Cs_DesignRegion& region) {

@@ -79,11 +79,6 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
     const Cs_Constraint* previous = nullptr;
     for (Cs_Constraint* c : all) {
         const bool object = !c->IsAssociationExempt();
-        // A design-wide attribute kept as text (CONFIG PART) belongs to the whole design: its
-        // object is the top block.
-        if (view && c->scope_ == Cs_Scope::Design && c->GetType() == Cs_Constraint_Unsupported::Type() &&
-            std::strcmp(c->key_, "INVALID_CONSTRAINT:") != 0)
-            c->objects_.push_back(view->GetBlock());
         if (object && view) {
             const Cs_SourceFile* where = c->source_.GetSourceFile();
             const bool ncf = where && ncf_file[where->GetFile()];

@@ -26,7 +26,7 @@ std::unique_ptr<Cs_Constraint> Cs_MakeConstraint(const Cs_ConstraintType& type);
 namespace {
 
 constexpr const char* kFormat = "lun-repository";
-constexpr int kVersion = 1;
+constexpr int kVersion = 2;
 
 Cs_CommitFaultHook g_fault_hook = nullptr;
 
@@ -36,7 +36,8 @@ CREATE TABLE source (id INTEGER PRIMARY KEY, file TEXT, syntax INTEGER, hash INT
                      was_read INTEGER);
 CREATE TABLE constraints (id INTEGER PRIMARY KEY, source_id INTEGER REFERENCES source(id), line INTEGER,
                           type TEXT, scope TEXT, target TEXT, attribute TEXT, value TEXT, flag INTEGER,
-                          statement TEXT, parent_id INTEGER REFERENCES constraints(id));
+                          statement TEXT, parent_id INTEGER REFERENCES constraints(id), block TEXT,
+                          entry TEXT, stored TEXT);
 CREATE TABLE path (constraint_id INTEGER REFERENCES constraints(id), grp TEXT);
 CREATE TABLE association (constraint_id INTEGER REFERENCES constraints(id), object_kind TEXT, object TEXT,
                           other_id INTEGER REFERENCES constraints(id));
@@ -78,6 +79,15 @@ bool ScopeFrom(const std::string& word, Cs_Scope& out) {
                        Cs_Scope::TimeGroup, Cs_Scope::AreaGroup, Cs_Scope::Set, Cs_Scope::Comment})
         if (word == Cs_ScopeWord(s)) {
             out = s;
+            return true;
+        }
+    return false;
+}
+
+bool BlockFrom(const std::string& word, Cs_Block& out) {
+    for (Cs_Block b : {Cs_Block::TimeSpec, Cs_Block::TimeGroup, Cs_Block::Config})
+        if (word == Cs_BlockWord(b)) {
+            out = b;
             return true;
         }
     return false;
@@ -281,11 +291,17 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
             Value src;
             if (where && source_ids.count(where->GetFile())) src.emplace<int64_t>(source_ids[where->GetFile()]);
             int64_t id = ids[&c];
-            ok = db.Insert("INSERT INTO constraints VALUES (?,?,?,?,?,?,?,?,?,?,?)",
+            Value block, entry, stored;
+            if (c.GetBlock() != Cs_Block::None) {
+                block = std::string(Cs_BlockWord(c.GetBlock()));
+                entry = std::string(c.GetEntryName());
+                stored = std::string(c.GetStoredText());
+            }
+            ok = db.Insert("INSERT INTO constraints VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?)",
                            {id, src, int64_t{where ? where->GetLine() : 0}, std::string(c.GetType().GetName()),
                             std::string(ScopeName(c.GetScope())), std::string(c.GetTarget()),
                             std::string(c.GetAttribute()), std::string(c.GetValueText()), int64_t{c.IsFlag()},
-                            std::string(c.GetStatementText()), id_of(c.parent_)},
+                            std::string(c.GetStatementText()), id_of(c.parent_), block, entry, stored},
                            &sum, error);
             for (const char* g : c.GetAssociatedPaths())
                 ok = ok && db.Insert("INSERT INTO path VALUES (?,?)", {id, std::string(g)}, &sum, error);
@@ -388,11 +404,14 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         return fail(Port_Format("it was written in format %d by a newer version; this program reads format %d",
                                 version, kVersion));
     if (version < 1) return fail("its format version is missing");
+    if (version < kVersion)
+        return fail(Port_Format("it was written in format %d by an older version; this program reads format %d",
+                                version, kVersion));
     // No structure check of its own: a damaged page fails the reads below, and the checksum of
     // every row read finds any other change.
     std::vector<Row> sources, constraints, paths, assocs, conflicts, statuses;
     if (!db.Select("SELECT * FROM source ORDER BY rowid", 6, nullptr, sources, error) ||
-        !db.Select("SELECT * FROM constraints ORDER BY rowid", 11, nullptr, constraints, error))
+        !db.Select("SELECT * FROM constraints ORDER BY rowid", 14, nullptr, constraints, error))
         return fail("it is damaged (" + error + ")");
     // Rows of the per-constraint tables come back in the order they were written, which
     // interleaves them per constraint; read them that way so that the checksum agrees.
@@ -444,6 +463,9 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         c->value_ = staged.Text(Str(r[7]));
         c->flag_ = Int(r[8]) != 0;
         c->statement_ = staged.Text(Str(r[9]));
+        if (!IsNull(r[11]) && !BlockFrom(Str(r[11]), c->block_)) return fail("it is damaged (unknown constraint block)");
+        c->entry_ = staged.Text(Str(r[12]));
+        c->stored_ = staged.Text(Str(r[13]));
         const char* file = nullptr;
         Cs_ConstraintMgr::Constraints* list = &staged.loose_;
         if (!IsNull(r[1])) {

@@ -9,6 +9,7 @@
 
 #include "bridge/luncshelper.h"
 #include "host/design/design_io.h"
+#include "host/design/ndm_constraint_blocks.h"
 #include "host/design/ndm.h"
 #include "host/port/file.h"
 #include "host/port/msgman.h"
@@ -282,7 +283,8 @@ TEST_F(Bridge, AnnotateAttachesUnsupportedAttributes) {
     EXPECT_EQ(lun_test::PropText(top->GetSignalByName("clk")->GetNetwork(), "ROUTE"), "{3;1;fg256;abc}");
     Ndm_Block* ff = top->GetBlockByName("count_$_SDFF_PP0__Q");
     for (const char* name : {"INIT_00", "INIT_01", "INIT_02"}) EXPECT_EQ(lun_test::PropText(ff, name), "1234");
-    EXPECT_EQ(lun_test::PropText(top, "PART"), "qx200-ff1-1");  // design-wide: on the top block
+    EXPECT_EQ(lun_test::PropText(Ndm_ConstraintBlocks(true).Find(top, "CONFIG"), "PART"), "qx200-ff1-1");
+    EXPECT_EQ(top->GetPropertyByName("PART"), nullptr);  // design-wide: on the CONFIG block
     EXPECT_EQ(capture.Texts(Port_Severity::Error),
               (std::vector<std::string>{
                   "BUFFER_TYPE attribute on AUTOBUF instance <tx0> is being modified in UCF file " + ucf +
@@ -331,32 +333,45 @@ TEST_F(Bridge, AnnotateAttachesUnsupportedAttributes) {
 
 // ---------------------------------------------------------------- write-back
 
-// Mode 3 on the example: unsupported attributes through Annotate, typed constraints through
-// the write-back, and the same constraint properties on every object as the file road gives.
-TEST_F(Bridge, RepositoryRoadGivesTheFileRoadsProperties) {
-    std::string ucf = kBlinky + "blinky.ucf";
-    {
-        Ta_LunCSHelper b(project.c_str(), "make");
-        Port_MsgCapture quiet;
-        b.Init(design.get());
-        Util_FNameGroup files;
-        files.add_fname(ucf.c_str());
-        b.Annotate(&files, 1, true);
-        EXPECT_TRUE(b.WriteConstraintsToNgd(true));
-        EXPECT_TRUE(b.WriteConstraintsToNgd(false));  // no view SOURCE: nothing happens
+// Mode 3 on the example: unsupported attributes through Annotate, typed constraints through the
+// write-back, and the whole design as the file road (quillmap annotate) leaves it: the same
+// properties on every object and the same constraint blocks with the same timing entries and
+// settings; the same again from the repository file, over the board file and over a file of
+// every design-wide form (and a part named by a NET statement).
+TEST_F(Bridge, RepositoryRoadGivesTheFileRoadsDesign) {
+    auto not_bookkeeping = [](const std::string& name) {
+        for (const char* b : {"FROM_UCF", "FROM_NCF", "TA_LUN_NEW_OBJ", "EXPANDED_OVI_FILE", "EXPANDED_BCD_FILE"})
+            if (name == b) return false;
+        return true;
+    };
+    std::unique_ptr<Ndm_Design> file_road;
+    const std::string every = std::string(lun_test::kEveryDesignWideForm) + "NET clk PART = qx200-ff1-1;\n";
+    for (const std::string& ucf : {Ucf("all.ucf", every), kBlinky + "blinky.ucf"}) {
+        const std::string saved = dir.path() + "/file_road.qdf";
+        lun_test::Quillmap("annotate " + kBlinky + "blinky.json --ucf " + ucf + " -o " + saved);  // errors: the probe
+        file_road = Ndm_LoadDesign(saved.c_str(), nullptr);
+        ASSERT_TRUE(file_road);
+        const std::set<std::string> expected =
+            lun_test::DesignProperties(file_road->GetViewByName("EXPANDED"), not_bookkeeping);
+        std::filesystem::remove(dir.path() + "/proj_qdb/cst.qbcd");
+        for (bool restored : {false, true}) {
+            auto design = Ndm_LoadDesign((kBlinky + "blinky.json").c_str(), nullptr);
+            Ta_LunCSHelper b(project.c_str(), "ovi");
+            Port_MsgCapture quiet;
+            b.Init(design.get());  // restores the repository file the first pass committed
+            Util_FNameGroup files;
+            files.add_fname(ucf.c_str());
+            b.Annotate(&files, restored ? 0 : 1, true);
+            EXPECT_TRUE(b.WriteConstraintsToNgd(true));
+            EXPECT_TRUE(b.WriteConstraintsToNgd(false));  // no view SOURCE: nothing happens
+            EXPECT_EQ(lun_test::DesignProperties(design->GetViewByName("EXPANDED"), not_bookkeeping), expected)
+                << ucf << (restored ? " restored" : "");
+            EXPECT_TRUE(b.Commit());
+        }
     }
-    auto file_road = Ndm_LoadDesign((kBlinky + "blinky.json").c_str(), nullptr);
-    {
-        Port_MsgCapture quiet;
-        Ta_LunMgr annotator(ucf.c_str(), CP_UCF, nullptr);
-        annotator.annotate(file_road->GetViewByName("EXPANDED"));
-    }
-    // bookkeeping aside; constraint blocks stay in the repository
-    auto not_bookkeeping = [](const std::string& name) { return name != "FROM_UCF"; };
-    EXPECT_EQ(lun_test::ObjectProperties(design->GetViewByName("EXPANDED"), not_bookkeeping),
-              lun_test::ObjectProperties(file_road->GetViewByName("EXPANDED"), not_bookkeeping));
 
-    // take-in: with deletion the properties taken are gone, the others stay
+    // take-in (of the board file's design): with deletion the properties taken are gone, the
+    // others stay
     Ta_LunCSHelper b(project.c_str(), "make");
     Port_MsgCapture quiet;
     b.Init(file_road.get());

@@ -37,7 +37,8 @@ private:
 };
 
 // Text of a property for comparisons: a string as it is, the texts of a string list joined
-// with " | ", a number in decimal; "<none>" for a missing property.
+// with " | ", the entries of a list as "name = text" joined with " | ", a number in decimal, a
+// flag as true or false; "<none>" for a missing property.
 std::string PropText(const Ndm_PropertyHolder* holder, const char* name);
 
 // Every object a constraint can sit on: blocks that are not constraint blocks (the top block
@@ -47,6 +48,16 @@ void ForEachObject(Ndm_View* view, const std::function<void(Ndm_PropertyHolder*)
 // The properties of those objects but the top block, as "full name: NAME text" (PropText), for
 // the names that keep says yes to.
 std::set<std::string> ObjectProperties(Ndm_View* view, const std::function<bool(const std::string&)>& keep);
+
+// The properties of the whole view as "kind full name: NAME text" (PropText): the view's own,
+// every block's (the top block and the constraint blocks too), every signal's, pin's and
+// network's, for the names that keep says yes to.
+std::set<std::string> DesignProperties(Ndm_View* view, const std::function<bool(const std::string&)>& keep);
+
+// A UCF with every design-wide statement form: CONFIG settings, operating conditions,
+// prohibited sites, reference pins, every TIMESPEC, ENABLE, DISABLE and OFFSET form, timing
+// groups, area groups and sets.
+extern const char* const kEveryDesignWideForm;
 
 // Runs the built quillmap with args (a shell command line; redirections allowed).
 int Quillmap(const std::string& args, std::string* out = nullptr, std::string* err = nullptr);
