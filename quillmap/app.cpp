@@ -9,10 +9,7 @@
 
 #include "host/port/atomic_file.h"
 #include "host/port/msgman.h"
-
-#ifndef LUN_VERSION
-#define LUN_VERSION "0.0.0"
-#endif
+#include "host/port/version.h"
 
 namespace {
 
@@ -39,7 +36,8 @@ bool QuillmapOutputIsNew(const std::string& output, const std::vector<std::strin
 
 int QuillmapMain(int argc, char** argv) {
     CLI::App app{kDescription, "quillmap"};
-    app.set_version_flag("--version", std::string("quillmap ") + LUN_VERSION);
+    // The tool's version is the one it was built as; the library's is the one it loaded.
+    app.set_version_flag("--version", std::string("quillmap ") + LUN_VERSION + " (liblun " + lun_version() + ")");
     app.require_subcommand(1);
     app.fallthrough();
 

@@ -18,10 +18,6 @@
 #include "host/port/msgman.h"
 #include "host/port/ut_str.h"
 
-#ifndef LUN_DATA_DIR
-#define LUN_DATA_DIR ""
-#endif
-
 namespace ndh_filter {
 
 enum class ValueType { Bool, Int, Float, String, StringList, FlagString };
@@ -396,8 +392,7 @@ Ndh_PropInFilter::Ndh_PropInFilter(const char* definition_file, const PM_SPEC* /
     if (!given.empty() && IsFile(given)) {
         path_ = given;
     } else if (!given.empty() && given.find('/') == std::string::npos) {
-        const char* env = Port_Env::GetEnv("LUN_DATA_DIR");
-        where = (env && *env) ? env : LUN_DATA_DIR;
+        where = Port_Env::DataDir();
         if (!where.empty()) {
             std::string candidate = where + "/" + given;
             if (IsFile(candidate)) path_ = candidate;

@@ -53,9 +53,9 @@ struct Definitions;
 class Ndh_PropInFilter {
 public:
     // Reads (or takes from the process-wide cache) the definitions of definition_file. A bare
-    // name that does not exist as given is looked up in $LUN_DATA_DIR, else in the data folder
-    // compiled in. Failures are reported once through the message manager and leave the filter
-    // invalid: it then answers BadPropName for every property.
+    // name that does not exist as given is looked up in Port_Env::DataDir() ($LUN_DATA_DIR,
+    // else the installation's data folder). Failures are reported once through the message
+    // manager and leave the filter invalid: it then answers BadPropName for every property.
     Ndh_PropInFilter(const char* definition_file, const PM_SPEC* spec);
     ~Ndh_PropInFilter();
     Ndh_PropInFilter(const Ndh_PropInFilter&) = default;

@@ -1,3 +1,4 @@
+#include <dlfcn.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -8,13 +9,34 @@
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
+#include <filesystem>
 #include <string>
 
 #include "host/port/env.h"
 #include "host/port/file.h"
 #include "host/port/stream.h"
 
+// The data folder relative to the folder of the library (set by the build from the install
+// layout).
+#ifndef LUN_DATA_FROM_LIB
+#define LUN_DATA_FROM_LIB "../share/lun"
+#endif
+
 const char* Port_Env::GetEnv(const char* name) { return name ? std::getenv(name) : nullptr; }
+
+std::string Port_Env::DataDir() {
+    const char* env = GetEnv("LUN_DATA_DIR");
+    if (env && *env) return env;
+    // The file this object was loaded from: the shared library (or the program it is linked
+    // into), found wherever it was installed or moved to.
+    static const char anchor = 0;
+    Dl_info info{};
+    if (!::dladdr(&anchor, &info) || !info.dli_fname || !*info.dli_fname) return "";
+    std::error_code ec;
+    std::filesystem::path library = std::filesystem::weakly_canonical(info.dli_fname, ec);
+    if (ec) return "";
+    return (library.parent_path() / LUN_DATA_FROM_LIB).lexically_normal().string();
+}
 
 namespace Port {
 

@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include "host/port/file.h"
+#include "host/port/version.h"
 #include "support/test_support.h"
 
 namespace {
@@ -15,7 +16,7 @@ using lun_test::Quillmap;
 TEST(Cli, UsageAndVersion) {
     std::string out, err;
     EXPECT_EQ(Quillmap("--version", &out), 0);
-    EXPECT_EQ(out.rfind("quillmap ", 0), 0u);
+    EXPECT_EQ(out, "quillmap " LUN_VERSION " (liblun " + std::string(lun_version()) + ")\n");
     EXPECT_EQ(Quillmap("", &out, &err), 2);  // a subcommand is required
     EXPECT_EQ(Quillmap("annotate --no-such-option x", &out, &err), 2);
     EXPECT_EQ(Quillmap("annotate --help", &out), 0);

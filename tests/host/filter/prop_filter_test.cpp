@@ -10,6 +10,7 @@
 
 #include "host/design/ndm.h"
 #include "host/port/msgman.h"
+#include "support/test_support.h"
 
 namespace {
 
@@ -245,19 +246,23 @@ TEST(FilterDefinitions, MissingFileRefusesEveryName) {
 TEST(FilterDefinitions, BareNamesResolveThroughDataDirAndParseOnce) {
     FilterDir dir;
     dir.Write("mine.pfd", "ONLY_HERE string net\n");
-    const char* saved = std::getenv("LUN_DATA_DIR");
-    std::string saved_value = saved ? saved : "";
-    ::setenv("LUN_DATA_DIR", dir.dir.c_str(), 1);
     Port_MsgCapture capture;
-    EXPECT_EQ(Ndh_PropInFilter("mine.pfd", nullptr).CanonicalName("only_here"), "ONLY_HERE");
-    // The environment directory replaces the shipped folder.
-    EXPECT_NE(Ndh_PropInFilter("ucf.pfd", nullptr).GetError().find(dir.dir.string()),
-              std::string::npos);
-    ::unsetenv("LUN_DATA_DIR");
-    Ndh_PropInFilter shipped("ucf.pfd", nullptr);
-    EXPECT_TRUE(shipped.IsValid()) << shipped.GetError();
-    EXPECT_EQ(shipped.GetPath(), std::string(LUN_SOURCE_DIR) + "/data/ucf.pfd");
-    if (saved) ::setenv("LUN_DATA_DIR", saved_value.c_str(), 1);
+    {
+        lun_test::ScopedEnv env("LUN_DATA_DIR", dir.dir.c_str());
+        EXPECT_EQ(Ndh_PropInFilter("mine.pfd", nullptr).CanonicalName("only_here"), "ONLY_HERE");
+        // The environment directory replaces the shipped folder.
+        EXPECT_NE(Ndh_PropInFilter("ucf.pfd", nullptr).GetError().find(dir.dir.string()),
+                  std::string::npos);
+    }
+    {
+        // Without it, the data folder beside the library's folder: in the build tree, the copy
+        // made there, not the sources.
+        lun_test::ScopedEnv env("LUN_DATA_DIR", nullptr);
+        Ndh_PropInFilter shipped("ucf.pfd", nullptr);
+        ASSERT_TRUE(shipped.IsValid()) << shipped.GetError();
+        EXPECT_TRUE(fs::equivalent(shipped.GetPath(), fs::path(LUN_BUILD_DATA_DIR) / "ucf.pfd"))
+            << shipped.GetPath();
+    }
 
     // A file changed after its first use is not read again.
     std::string path = dir.Write("once.pfd", "FIRST string net\n");

@@ -1,0 +1,3 @@
+#include "host/port/version.h"
+
+const char* lun_version() { return LUN_VERSION; }
