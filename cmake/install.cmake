@@ -15,6 +15,7 @@ set(LUN_PUBLIC_HEADERS
   host/design/design_io.h
   host/design/dump.h
   host/design/name_pool.h
+  host/design/ndm_constraint_blocks.h
   host/design/native_format.h
   host/design/ndm.h
   host/design/ndm_lookup.h
@@ -22,6 +23,7 @@ set(LUN_PUBLIC_HEADERS
   host/design/yosys_reader.h
   host/filter/prop_filter.h
   host/parser/pr_logical.h
+  host/port/atomic_file.h
   host/port/msgman.h
   host/port/stream.h
   host/port/string_base.h
