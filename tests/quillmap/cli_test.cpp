@@ -76,11 +76,27 @@ TEST(Cli, BadInputNamesTheFile) {
          1,
          {"bad.pfd", "line 1", "strng"}},
     };
-    for (const Case& c : cases) {
+    // quillmap never writes over what it reads, and says when its output is lost
+    const std::string copy = dir.path() + "/copy.json", ucf = dir.path() + "/copy.ucf";
+    lun_test::RunCommand("cp " + kExample + "blinky.json " + copy + " && cp " + kExample + "blinky.ucf " + ucf);
+    const std::string same = "is the input file";
+    std::vector<Case> more = {
+        {"annotate " + copy + " -o " + copy, 2, {same}},
+        {"annotate " + copy + " --ucf " + ucf + " -o " + ucf, 2, {same, "copy.ucf"}},
+        {"extract " + copy + " -o " + copy, 2, {same}},
+        {"convert " + copy + " -o " + copy, 2, {same}},
+        {"dump " + copy + " > /dev/full", 1, {"Cannot write to the standard output: No space left on device."}},
+        {"part " + ucf + " > /dev/full", 1, {"Cannot write to the standard output"}},
+        {"convert " + copy + " -o " + dir.path(), 1, {"is not a regular file"}},
+    };
+    for (const Case& c : cases) more.push_back(c);
+    for (const Case& c : more) {
         std::string out, err;
         EXPECT_EQ(Quillmap(c.args, &out, &err), c.status) << c.args << "\n" << err;
         for (const std::string& word : c.words) EXPECT_NE(err.find(word), std::string::npos) << c.args << "\n" << err;
     }
+    EXPECT_EQ(lun_test::ReadFile(copy), lun_test::ReadFile(kExample + "blinky.json"));
+    EXPECT_EQ(lun_test::ReadFile(ucf), lun_test::ReadFile(kExample + "blinky.ucf"));
 }
 
 TEST(Cli, FatalLeavesNoOutputBehind) {

@@ -123,7 +123,7 @@ const char* const kEveryDesignWideForm =
     "SET set1 RLOC_RANGE = X0Y0:X3Y3 | RLOC_ORIGIN = X0Y0;\n";
 
 int Quillmap(const std::string& args, std::string* out, std::string* err) {
-    return RunCommand(std::string(QUILLMAP_EXE) + " " + args, out, err);
+    return RunCommand("(" + std::string(QUILLMAP_EXE) + " " + args + ")", out, err);  // args may redirect
 }
 
 ScopedEnv::ScopedEnv(const char* name, const char* value) : name_(name) {

@@ -1,13 +1,17 @@
 // Portability layer: string helpers, formatting, the host string, messages, atomic files.
 #include <gtest/gtest.h>
 #include <simdjson.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <csignal>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <memory>
 
+#include "host/port/atomic_file.h"
 #include "host/port/env.h"
 #include "host/port/file.h"
 #include "host/port/json_text.h"
@@ -200,30 +204,84 @@ TEST(JsonTextTest, AnyBytesGiveValidJson) {
     EXPECT_EQ(back, all);
 }
 
-TEST(FileTest, AtomicFileLeavesNothingHalfWritten) {
-    auto dir = std::filesystem::temp_directory_path() / ("lun_port_" + std::to_string(getpid()));
-    std::filesystem::create_directories(dir);
-    std::string target = (dir / "out.txt").string();
+// Saving: nothing half-written is ever seen, a failure at any step keeps the old file, and
+// only a regular, writable file (or what a link names) is replaced, keeping its mode.
+TEST(FileTest, SavesReplaceOnlyWhatTheyMay) {
+    namespace fs = std::filesystem;
+    const fs::path dir = fs::temp_directory_path() / ("lun_port_" + std::to_string(getpid()));
+    fs::create_directories(dir);
+    const std::string target = (dir / "out.txt").string();
+    auto save = [](const std::string& path, const std::string& text) {
+        Port::AtomicFile f(path);
+        return f.Write(text) && f.Commit() ? std::string() : f.error();
+    };
+    auto content = [](const std::string& path) {
+        std::ifstream in(path);
+        return std::string(std::istreambuf_iterator<char>(in), {});
+    };
     {
         Port::AtomicFile f(target);
         ASSERT_TRUE(f.Write("partial"));
-        // destroyed without Commit: neither target nor temporary remains
+    }  // destroyed without Commit: neither target nor temporary remains
+    EXPECT_TRUE(fs::is_empty(dir));
+    ASSERT_EQ(save(target, "old"), "");
+
+    static std::string fail_at;
+    Port::SetSaveFaultHook([](const char* step) { return fail_at != step; });
+    for (const char* step : {"open", "write", "sync", "close", "rename"}) {
+        fail_at = step;
+        EXPECT_NE(save(target, "new"), "") << step;
+        EXPECT_EQ(content(target), "old") << step;
+        EXPECT_EQ(std::distance(fs::directory_iterator(dir), {}), 1) << step;  // no temporary left
     }
-    EXPECT_FALSE(Port::File::exist(target.c_str()));
-    EXPECT_TRUE(std::filesystem::is_empty(dir));
-    {
+    Port::SetSaveFaultHook(nullptr);
+
+    fs::permissions(target, fs::perms::owner_read | fs::perms::owner_write);
+    ASSERT_EQ(save(target, "private"), "");
+    EXPECT_EQ(fs::status(target).permissions() & fs::perms::all, fs::perms::owner_read | fs::perms::owner_write);
+    fs::create_symlink(target, dir / "link");
+    ASSERT_EQ(save((dir / "link").string(), "through"), "");
+    EXPECT_TRUE(fs::is_symlink(dir / "link"));
+    EXPECT_EQ(content(target), "through");
+    // a leftover of a process that is gone is removed by the next save of the same file
+    std::ofstream(dir / ".out.txt.999999999.partial") << "stale";
+    ASSERT_EQ(save(target, "again"), "");
+    EXPECT_FALSE(fs::exists(dir / ".out.txt.999999999.partial"));
+
+    // a save stopped by SIGTERM takes its temporary with it
+    if (pid_t child = ::fork(); child == 0) {
         Port::AtomicFile f(target);
-        ASSERT_TRUE(f.Write("done"));
-        ASSERT_TRUE(f.Commit());
+        f.Write("half");
+        ::raise(SIGTERM);
+        ::_exit(0);
+    } else {
+        int status = 0;
+        ::waitpid(child, &status, 0);
+        EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == SIGTERM);
+        EXPECT_EQ(std::distance(fs::directory_iterator(dir), {}), 2);  // the file and the link
+        EXPECT_EQ(content(target), "again");
     }
-    std::ifstream in(target);
-    std::string content;
-    in >> content;
-    EXPECT_EQ(content, "done");
-    Port::AtomicFile bad((dir / "missing" / "x").string());
-    EXPECT_FALSE(bad.Commit());
-    EXPECT_FALSE(bad.error().empty());
-    std::filesystem::remove_all(dir);
+
+    ASSERT_EQ(::mkfifo((dir / "fifo").c_str(), 0600), 0);
+    fs::create_symlink(dir / "nowhere", dir / "dangling");
+    std::ofstream(dir / "ro") << "keep";
+    fs::permissions(dir / "ro", fs::perms::owner_read);
+    struct Refused {
+        fs::path path;
+        const char* why;
+    } refused[] = {{dir / "fifo", "is not a regular file"},
+                   {dir, "is not a regular file"},
+                   {dir / "dangling", "is a symbolic link to nothing"},
+                   {dir / "ro", "is read-only"},
+                   {dir / "missing" / "x", "No such file or directory"}};
+    for (const Refused& r : refused) {
+        std::string why = save(r.path.string(), "x");
+        EXPECT_NE(why.find(r.why), std::string::npos) << r.path << ": " << why;
+    }
+    EXPECT_EQ(content((dir / "ro").string()), "keep");
+    EXPECT_TRUE(Port::SameFile(target, (dir / "link").string()));
+    EXPECT_FALSE(Port::SameFile(target, (dir / "ro").string()));
+    fs::remove_all(dir);
 }
 
 TEST(FileTest, EnvAndDirectories) {
