@@ -73,8 +73,91 @@ struct Checksum {
     }
 };
 
+// Rows read back: their cells in one array and their texts in one buffer, so that reading
+// costs no allocation per row or text.
+class Table {
+public:
+    struct Cell {
+        int64_t number = 0;
+        uint32_t offset = 0, size = 0;
+        uint8_t kind = 0;  // the index a Value of the cell would have: 0 null, 1 number, 2 text
+    };
+    struct CellRef {
+        const Table* table;
+        const Cell* cell;
+    };
+    class RowRef {
+    public:
+        RowRef(const Table* table, size_t row) : table_(table), row_(row) {}
+        CellRef operator[](size_t column) const { return {table_, &table_->cells_[row_ * table_->columns_ + column]}; }
+        size_t size() const { return table_->columns_; }
+
+    private:
+        const Table* table_;
+        size_t row_;
+    };
+    struct Iterator {
+        const Table* table;
+        size_t row;
+        RowRef operator*() const { return {table, row}; }
+        Iterator& operator++() {
+            ++row;
+            return *this;
+        }
+        bool operator!=(const Iterator& other) const { return row != other.row; }
+    };
+
+    explicit Table(size_t columns) : columns_(columns) {}
+    size_t size() const { return columns_ ? cells_.size() / columns_ : 0; }
+    RowRef operator[](size_t row) const { return {this, row}; }
+    Iterator begin() const { return {this, 0}; }
+    Iterator end() const { return {this, size()}; }
+    std::string_view Text(const Cell& c) const { return {texts_.data() + c.offset, c.size}; }
+    // Appends the current row of a statement.
+    void Add(sqlite3_stmt* st) {
+        for (size_t i = 0; i < columns_; ++i) {
+            const int col = static_cast<int>(i);
+            Cell cell;
+            switch (sqlite3_column_type(st, col)) {
+                case SQLITE_NULL: break;
+                case SQLITE_INTEGER:
+                    cell.kind = 1;
+                    cell.number = sqlite3_column_int64(st, col);
+                    break;
+                default: {
+                    const char* text = reinterpret_cast<const char*>(sqlite3_column_text(st, col));
+                    cell.kind = 2;
+                    cell.offset = static_cast<uint32_t>(texts_.size());
+                    cell.size = static_cast<uint32_t>(sqlite3_column_bytes(st, col));
+                    if (text) texts_.append(text, cell.size);
+                }
+            }
+            cells_.push_back(cell);
+        }
+    }
+
+private:
+    size_t columns_;
+    std::vector<Cell> cells_;
+    std::string texts_;
+};
+
+int64_t Int(Table::CellRef v) { return v.cell->kind == 1 ? v.cell->number : 0; }
+std::string_view Str(Table::CellRef v) { return v.cell->kind == 2 ? v.table->Text(*v.cell) : std::string_view(); }
+bool IsNull(Table::CellRef v) { return v.cell->kind == 0; }
+
+void AddToChecksum(Checksum& sum, Table::RowRef row) {
+    for (size_t i = 0; i < row.size(); ++i) {
+        Table::CellRef v = row[i];
+        sum.Mix(v.cell->kind);
+        if (v.cell->kind == 1) sum.Mix(static_cast<uint64_t>(v.cell->number));
+        if (v.cell->kind == 2) sum.Mix(Ndm_NamePool::Hash(Str(v)) ^ v.cell->size);
+    }
+    sum.Mix(0xff);
+}
+
 const char* ScopeName(Cs_Scope s) { return Cs_ScopeWord(s); }
-bool ScopeFrom(const std::string& word, Cs_Scope& out) {
+bool ScopeFrom(std::string_view word, Cs_Scope& out) {
     for (Cs_Scope s : {Cs_Scope::Instance, Cs_Scope::Net, Cs_Scope::Pin, Cs_Scope::Design, Cs_Scope::TimeSpec,
                        Cs_Scope::TimeGroup, Cs_Scope::AreaGroup, Cs_Scope::Set, Cs_Scope::Comment})
         if (word == Cs_ScopeWord(s)) {
@@ -84,7 +167,7 @@ bool ScopeFrom(const std::string& word, Cs_Scope& out) {
     return false;
 }
 
-bool BlockFrom(const std::string& word, Cs_Block& out) {
+bool BlockFrom(std::string_view word, Cs_Block& out) {
     for (Cs_Block b : {Cs_Block::TimeSpec, Cs_Block::TimeGroup, Cs_Block::Config})
         if (word == Cs_BlockWord(b)) {
             out = b;
@@ -108,10 +191,11 @@ std::pair<const char*, std::string> ObjectName(const Ndm_PropertyHolder* o) {
 }
 
 // The object of the view named (kind, full name), or null.
-Ndm_PropertyHolder* FindObject(Ndm_View* view, const std::string& kind, const std::string& name) {
+Ndm_PropertyHolder* FindObject(Ndm_View* view, std::string_view kind, std::string_view full_name) {
     if (!view || !view->GetBlock()) return nullptr;
     Ndm_Block* top = view->GetBlock();
     Ndm_LookupReport silent;
+    const std::string name(full_name);
     const std::string path = std::string(top->GetName()) + "/" + name;
     if (kind == "block") return name.empty() ? top : Ndm_Lookup::FindBlockPath(top, path, true, silent);
     if (kind == "network" || kind == "signal") {
@@ -185,26 +269,12 @@ public:
         if (sum) sum->Add(row);
         return true;
     }
-    // Reads every row of a query; the checksum sees each.
-    bool Select(const char* sql, int columns, Checksum* sum, std::vector<Row>& rows, std::string& error) {
+    // Reads every row of a query.
+    bool Select(const char* sql, Table& rows, std::string& error) {
         sqlite3_stmt* st = Prepare(sql, error);
         if (!st) return false;
         int rc;
-        while ((rc = sqlite3_step(st)) == SQLITE_ROW) {
-            Row row(static_cast<size_t>(columns));
-            for (int c = 0; c < columns; ++c) {
-                switch (sqlite3_column_type(st, c)) {
-                    case SQLITE_NULL: break;
-                    case SQLITE_INTEGER: row[static_cast<size_t>(c)] = static_cast<int64_t>(sqlite3_column_int64(st, c)); break;
-                    default: {
-                        const char* text = reinterpret_cast<const char*>(sqlite3_column_text(st, c));
-                        row[static_cast<size_t>(c)] = std::string(text ? text : "", static_cast<size_t>(sqlite3_column_bytes(st, c)));
-                    }
-                }
-            }
-            if (sum) sum->Add(row);
-            rows.push_back(std::move(row));
-        }
+        while ((rc = sqlite3_step(st)) == SQLITE_ROW) rows.Add(st);
         if (rc != SQLITE_DONE) {
             error = sqlite3_errmsg(db_);
             code_ = rc;
@@ -230,9 +300,6 @@ std::shared_ptr<Cs_Status> Problem(const char* verb, const std::string& path, co
 
 bool Step(const char* step) { return !g_fault_hook || g_fault_hook(step); }
 
-int64_t Int(const Value& v) { return std::holds_alternative<int64_t>(v) ? std::get<int64_t>(v) : 0; }
-std::string Str(const Value& v) { return std::holds_alternative<std::string>(v) ? std::get<std::string>(v) : ""; }
-bool IsNull(const Value& v) { return std::holds_alternative<std::monostate>(v); }
 
 }  // namespace
 
@@ -391,13 +458,13 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     }
     uri += "?immutable=1";
     if (!db.Open(uri, SQLITE_OPEN_READONLY | SQLITE_OPEN_URI, error)) return fail(error);
-    std::vector<Row> meta;
-    if (!db.Select("SELECT key, value FROM meta", 2, nullptr, meta, error)) {
+    Table meta(2);
+    if (!db.Select("SELECT key, value FROM meta", meta, error)) {
         if (db.code() == SQLITE_CORRUPT) return fail("it is damaged (" + error + ")");
         return fail("it is not a repository file (" + error + ")");
     }
     std::map<std::string, std::string> info;
-    for (const Row& r : meta) info[Str(r[0])] = Str(r[1]);
+    for (Table::RowRef r : meta) info[std::string(Str(r[0]))] = Str(r[1]);
     if (info["format"] != kFormat) return fail("it is not a repository file");
     int version = std::atoi(info["version"].c_str());
     if (version > kVersion)
@@ -409,31 +476,31 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
                                 version, kVersion));
     // No structure check of its own: a damaged page fails the reads below, and the checksum of
     // every row read finds any other change.
-    std::vector<Row> sources, constraints, paths, assocs, conflicts, statuses;
-    if (!db.Select("SELECT * FROM source ORDER BY rowid", 6, nullptr, sources, error) ||
-        !db.Select("SELECT * FROM constraints ORDER BY rowid", 14, nullptr, constraints, error))
+    Table sources(6), constraints(14), paths(2), assocs(4), conflicts(5), statuses(8);
+    if (!db.Select("SELECT * FROM source ORDER BY rowid", sources, error) ||
+        !db.Select("SELECT * FROM constraints ORDER BY rowid", constraints, error))
         return fail("it is damaged (" + error + ")");
     // Rows of the per-constraint tables come back in the order they were written, which
     // interleaves them per constraint; read them that way so that the checksum agrees.
-    if (!db.Select("SELECT * FROM path ORDER BY rowid", 2, nullptr, paths, error) ||
-        !db.Select("SELECT * FROM association ORDER BY rowid", 4, nullptr, assocs, error) ||
-        !db.Select("SELECT * FROM conflict ORDER BY rowid", 5, nullptr, conflicts, error) ||
-        !db.Select("SELECT * FROM status ORDER BY rowid", 8, nullptr, statuses, error))
+    if (!db.Select("SELECT * FROM path ORDER BY rowid", paths, error) ||
+        !db.Select("SELECT * FROM association ORDER BY rowid", assocs, error) ||
+        !db.Select("SELECT * FROM conflict ORDER BY rowid", conflicts, error) ||
+        !db.Select("SELECT * FROM status ORDER BY rowid", statuses, error))
         return fail("it is damaged (" + error + ")");
     // The checksum covers the rows in writing order: each constraint, then its paths,
     // associations and conflicts, then the statuses.
     {
         Checksum again;
-        for (const Row& r : sources) again.Add(r);
+        for (Table::RowRef r : sources) AddToChecksum(again, r);
         size_t p = 0, a = 0, k = 0;
-        for (const Row& c : constraints) {
-            again.Add(c);
+        for (Table::RowRef c : constraints) {
+            AddToChecksum(again, c);
             int64_t id = Int(c[0]);
-            while (p < paths.size() && Int(paths[p][0]) == id) again.Add(paths[p++]);
-            while (a < assocs.size() && Int(assocs[a][0]) == id) again.Add(assocs[a++]);
-            while (k < conflicts.size() && Int(conflicts[k][0]) == id) again.Add(conflicts[k++]);
+            while (p < paths.size() && Int(paths[p][0]) == id) AddToChecksum(again, paths[p++]);
+            while (a < assocs.size() && Int(assocs[a][0]) == id) AddToChecksum(again, assocs[a++]);
+            while (k < conflicts.size() && Int(conflicts[k][0]) == id) AddToChecksum(again, conflicts[k++]);
         }
-        for (const Row& r : statuses) again.Add(r);
+        for (Table::RowRef r : statuses) AddToChecksum(again, r);
         char hex[32];
         std::snprintf(hex, sizeof hex, "%016llx", static_cast<unsigned long long>(again.h));
         if (p != paths.size() || a != assocs.size() || k != conflicts.size() || info["content_checksum"] != hex)
@@ -443,8 +510,8 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     // Build the new content aside; the repository changes only when everything was read.
     Cs_ConstraintMgr staged;
     std::unordered_map<int64_t, size_t> source_index;
-    for (const Row& r : sources) {
-        Cs_ConstraintMgr::Source& s = staged.AddSource(Str(r[1]), static_cast<int>(Int(r[2])));
+    for (Table::RowRef r : sources) {
+        Cs_ConstraintMgr::Source& s = staged.AddSource(std::string(Str(r[1])), static_cast<int>(Int(r[2])));
         s.info->hash_ = static_cast<uint64_t>(Int(r[3]));
         s.info->size_ = static_cast<uint64_t>(Int(r[4]));
         s.info->read_ = Int(r[5]) != 0;
@@ -452,8 +519,8 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     }
     std::unordered_map<int64_t, Cs_Constraint*> by_id;
     std::vector<std::pair<Cs_Constraint*, int64_t>> parents;
-    for (const Row& r : constraints) {
-        const Cs_ConstraintType* type = Cs_FindConstraintType(Str(r[3]).c_str());
+    for (Table::RowRef r : constraints) {
+        const Cs_ConstraintType* type = Cs_FindConstraintType(std::string(Str(r[3])).c_str());
         Cs_Scope scope;
         if (!type || !ScopeFrom(Str(r[4]), scope)) return fail("it is damaged (unknown constraint kind)");
         std::unique_ptr<Cs_Constraint> c = Cs_MakeConstraint(*type);
@@ -480,39 +547,40 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         by_id[Int(r[0])] = c.get();
         list->push_back(std::move(c));
     }
-    auto constraint = [&](const Value& v) -> Cs_Constraint* {
+    auto constraint = [&](Table::CellRef v) -> Cs_Constraint* {
         auto it = IsNull(v) ? by_id.end() : by_id.find(Int(v));
         return it == by_id.end() ? nullptr : it->second;
     };
     for (auto& [c, parent] : parents) {
-        c->parent_ = constraint(parent);
+        auto it = by_id.find(parent);
+        c->parent_ = it == by_id.end() ? nullptr : it->second;
         if (c->parent_) c->constraints_.push_back(c->parent_);
     }
     Ndm_View* view = mgr.design_ ? mgr.design_->GetWorkView() : nullptr;
-    for (const Row& r : paths)
+    for (Table::RowRef r : paths)
         if (Cs_Constraint* c = constraint(r[0])) c->paths_.push_back(staged.Text(Str(r[1])));
     // What the constraints resolved to counts only for the design it was committed for; with no
     // design bound the names are kept for listings.
     const std::string& stamp = mgr.design_ ? mgr.design_->GetSourceStamp() : info["design_stamp"];
     const bool same_design = !stamp.empty() && stamp == info["design_stamp"];
-    for (const Row& r : assocs) {
+    for (Table::RowRef r : assocs) {
         Cs_Constraint* c = constraint(r[0]);
         if (!c) return fail("it is damaged (an association of an unknown constraint)");
         if (Str(r[1]) == "constraint") {
             if (Cs_Constraint* other = constraint(r[3])) c->constraints_.push_back(other);
         } else if (!view) {
-            staged.committed_[c].objects.push_back(Str(r[2]));
+            staged.committed_[c].objects.emplace_back(Str(r[2]));
         } else if (!same_design) {
             continue;
         } else if (Ndm_PropertyHolder* o = FindObject(view, Str(r[1]), Str(r[2]))) {
             c->objects_.push_back(o);
         }
     }
-    for (const Row& r : conflicts) {
+    for (Table::RowRef r : conflicts) {
         Cs_Constraint* c = constraint(r[0]);
         if (!c) return fail("it is damaged (a conflict of an unknown constraint)");
         if (!IsNull(r[2]) && !view) {
-            staged.committed_[c].overrides.emplace_back(constraint(r[4]), Str(r[3]));
+            staged.committed_[c].overrides.emplace_back(constraint(r[4]), std::string(Str(r[3])));
             continue;
         }
         if (!IsNull(r[2]) && !same_design) continue;
@@ -520,18 +588,19 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         if (!IsNull(r[2]) && !entity) continue;  // an object the bound design no longer has
         c->conflicts_.emplace_back(static_cast<Cs_Conflict::CONFLICTTYPE>(Int(r[1])), entity, constraint(r[4]));
     }
-    for (const Row& r : statuses) {
+    for (Table::RowRef r : statuses) {
         auto id = static_cast<Cs_StatusID>(Int(r[1]));
         auto severity = static_cast<Cs_Status::SEVERITY>(Int(r[2]));
         int number = static_cast<int>(Int(r[3]));
         std::shared_ptr<Cs_Status> st;
         if (IsNull(r[7])) {
             auto parse =
-                std::make_shared<Cs_Status_Parse>(id, number, Str(r[4]), Str(r[5]), static_cast<int>(Int(r[6])));
+                std::make_shared<Cs_Status_Parse>(id, number, std::string(Str(r[4])), std::string(Str(r[5])),
+                                                  static_cast<int>(Int(r[6])));
             parse->SetSeverity(severity);
             st = parse;
         } else {
-            st = std::make_shared<Cs_Status_Resolution>(id, severity, number, Str(r[4]), constraint(r[7]));
+            st = std::make_shared<Cs_Status_Resolution>(id, severity, number, std::string(Str(r[4])), constraint(r[7]));
         }
         if (!IsNull(r[0])) {
             auto it = source_index.find(Int(r[0]));
