@@ -54,6 +54,7 @@ Cs_ConstraintMgr::Source& Cs_ConstraintMgr::AddSource(const std::string& name, i
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const Pr_FileText> text) {
+    same_as_file_.clear();
     Cs_ReturnCode outcome;
     const std::string name = source.info->GetFileName();
     if (!text) text = Pr_FileText::Read(name.c_str());
@@ -74,6 +75,7 @@ Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const
 }
 
 void Cs_ConstraintMgr::Changed() {
+    same_as_file_.clear();
     if (bulk_) {
         bulk_changed_ = true;
         return;
@@ -93,6 +95,7 @@ Cs_ReturnCode Cs_ConstraintMgr::ReplaceConstraintsFromFile(const Port::StringBas
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::AddConstraintSource(const Port::StringBase<char>& file, int syntax) {
+    same_as_file_.clear();
     AddSource(file.str(), syntax);
     return {};
 }
@@ -102,6 +105,7 @@ Cs_ReturnCode Cs_ConstraintMgr::RemoveConstraintSource(const Port::StringBase<ch
                            [&](const Source& s) { return file.str() == s.info->GetFileName(); });
     if (it == sources_.end()) return {};
     sources_.erase(it);
+    same_as_file_.clear();
     Changed();
     return {};
 }
@@ -177,6 +181,7 @@ Cs_SharedContainerT<Cs_Constraint*> Cs_ConstraintMgr::GetConstraints(const Cs_Fi
 }
 
 void Cs_ConstraintMgr::DeleteAllConstraints() {
+    same_as_file_.clear();
     sources_.clear();
     loose_.clear();
     resolution_ = Cs_ReturnCode();

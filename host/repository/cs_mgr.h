@@ -95,7 +95,9 @@ public:
 
     // ---- persistence (cs_store.cpp)
     // Writes the whole repository to file, atomically: the new file is built beside the old
-    // one and renamed into place when complete and synced (Port::AtomicFile).
+    // one and renamed into place when complete and synced (Port::AtomicFile). Nothing is
+    // written when file holds what the repository holds already: it was restored from or
+    // committed to it, nothing changed since, and the file is the one seen then.
     Cs_ReturnCode Commit(const Port::StringBase<char>& file) const;
     // Replaces the repository by the content of file; on failure the repository is left as it
     // was and the status names the file and the reason. What the constraints resolved to is
@@ -177,5 +179,10 @@ private:
     bool bulk_ = false;
     bool bulk_changed_ = false;
     mutable Cs_ReturnCode store_outcome_;
+    // The repository file that holds exactly what the repository holds, with the identity
+    // (device, inode, size, time) it had then; empty after any change.
+    mutable std::string same_as_file_;
+    mutable std::string same_as_identity_;
+    void Unchanged(const std::string& file) const;
     std::unordered_map<const Cs_Constraint*, CommittedNames> committed_;
 };

@@ -45,6 +45,7 @@ std::string DefinedGroup(const char* value) {
 }  // namespace
 
 Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
+    same_as_file_.clear();
     Cs_ReturnCode outcome;
     std::vector<Cs_Constraint*> all;
     ForEach([&](Cs_Constraint& c) {

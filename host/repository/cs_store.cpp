@@ -2,6 +2,7 @@
 // into place, and that Restore reads back after checking its format, its structure and the
 // checksum of its content. docs/repository.md documents the schema.
 #include <fcntl.h>
+#include <sys/stat.h>
 #include <sqlite3.h>
 #include <unistd.h>
 
@@ -616,14 +617,39 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     mgr.committed_ = std::move(staged.committed_);
     mgr.texts_ = std::move(staged.texts_);
     staged.texts_ = std::make_unique<Ndm_NamePool>();
+    mgr.same_as_file_.clear();
     if (view && !same_design) mgr.Resolve();
     return outcome;
 }
 
+namespace {
+
+std::string FileIdentity(const std::string& path) {
+    struct stat st {};
+    if (::stat(path.c_str(), &st) != 0) return {};
+    return Port_Format("%llu:%llu:%lld:%lld.%09ld", static_cast<unsigned long long>(st.st_dev),
+                       static_cast<unsigned long long>(st.st_ino), static_cast<long long>(st.st_size),
+                       static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec);
+}
+
+}  // namespace
+
+void Cs_ConstraintMgr::Unchanged(const std::string& file) const {
+    same_as_file_ = file;
+    same_as_identity_ = FileIdentity(file);
+}
+
 Cs_ReturnCode Cs_ConstraintMgr::Commit(const Port::StringBase<char>& file) const {
-    return store_outcome_ = Cs_Store::Commit(*this, file.str());
+    const std::string path = file.str();
+    if (!same_as_file_.empty() && same_as_file_ == path && same_as_identity_ == FileIdentity(path))
+        return store_outcome_ = Cs_ReturnCode();
+    store_outcome_ = Cs_Store::Commit(*this, path);
+    if (store_outcome_) Unchanged(path);
+    return store_outcome_;
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::Restore(const Port::StringBase<char>& file) {
-    return store_outcome_ = Cs_Store::Restore(*this, file.str());
+    store_outcome_ = Cs_Store::Restore(*this, file.str());
+    if (store_outcome_ && same_as_file_.empty()) Unchanged(file.str());  // unless it had to resolve again
+    return store_outcome_;
 }

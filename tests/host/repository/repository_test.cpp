@@ -2,6 +2,7 @@
 // as the annotators resolve, overrides and associations, sources out of date, and the
 // repository file (commit, restore, faults, damage).
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -305,6 +306,14 @@ TEST_F(Repo, CommitThenRestoreGivesTheSameRepository) {
     EXPECT_TRUE(restored.Restore(file.c_str()));
     EXPECT_EQ(Snapshot(restored), before);
     EXPECT_TRUE(restored.GetOutOfDateConstraintSources().empty());
+    // committing what was restored, unchanged, leaves the file alone (the same inode)
+    auto inode = [](const std::string& path) {
+        struct stat st {};
+        return ::stat(path.c_str(), &st) == 0 ? st.st_ino : 0;
+    };
+    const auto was = inode(file);
+    EXPECT_TRUE(restored.Commit(file.c_str()));
+    EXPECT_EQ(inode(file), was);
     // a second commit of the restored repository writes the same content
     std::string copy = dir.path() + "/copy.qbcd";
     ASSERT_TRUE(restored.Commit(copy.c_str()));
