@@ -3,6 +3,7 @@
 #include <cstring>
 #include <utility>
 
+#include "host/parser/pr_block_texts.h"
 #include "host/port/msgman.h"
 #include "host/port/string_base.h"
 
@@ -173,8 +174,16 @@ void CstExtractor::WriteTimingLists(Ndm_Block* block, Port::Stream& out,
         if (prop->GetType() != NDM_PROP_LIST) Msg(__LINE__).issueFatal(2, fatal_format, name);
         for (Ndm_Property* entry : prop->GetListItr()) {
             if (entry->GetType() != NDM_PROP_STRING) Msg(__LINE__).issueFatal(2, fatal_format, name);
-            out << (timespec ? FormatTimespecLine(entry->GetName(), entry->GetValueString())
-                             : FormatTimegrpLine(entry->GetName(), entry->GetValueString()));
+            const std::string line = timespec ? FormatTimespecLine(entry->GetName(), entry->GetValueString())
+                                              : FormatTimegrpLine(entry->GetName(), entry->GetValueString());
+            // The stored texts keep names unquoted: a name holding a blank, ';', '#' or '"'
+            // was warned of when it was annotated; say which statement it spoils.
+            const std::string_view value = entry->GetValueString() ? entry->GetValueString() : "";
+            if (!Pr_NameReadsBack(entry->GetName()) || value.find_first_of(";#") != std::string_view::npos)
+                Msg(__LINE__).issueWarning("The statement '%s' will not read back as written: a name in it holds a "
+                                           "blank, ';', '#' or '\"'.\n",
+                                           line.substr(0, line.size() - 1).c_str());
+            out << line;
         }
     }
     out << "\n";

@@ -31,6 +31,9 @@ bool Ta_LunMgr::cb_timegrp(const char* group, const std::vector<std::pair<const 
                                  constraint_filename, group);
         return false;
     }
+    std::vector<const char*> names(excluded);
+    for (const auto& [member, edge] : members) names.push_back(member);
+    WarnNamesLost(handle, {group}, names);
     AttachTimeConstraint(group, Pr_TimeGroupText(members, excluded).c_str(), GetConstraintBlock("TIMEGRP"));
     return true;
 }
@@ -39,6 +42,7 @@ bool Ta_LunMgr::cb_timegrp_areagroup(const char* group, const char* areagroup,
                                      const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::timegrp_areagroup: Line %I:%s", handle);
     if (second_pass) return true;
+    WarnNamesLost(handle, {group, areagroup});
     Pr_BlockEntry entry = Pr_GroupAreaEntry(group, areagroup);
     AttachTimeConstraint(entry.name.c_str(), entry.value.c_str(), GetConstraintBlock("TIMESPEC"));
     return true;

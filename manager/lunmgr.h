@@ -6,6 +6,7 @@
 #pragma once
 
 #include <memory>
+#include <initializer_list>
 #include <string>
 #include <utility>
 #include <vector>
@@ -116,6 +117,10 @@ protected:
                                   const Pr_Logical_ConstraintHandle* handle);
     // Writes the trace line of a statement when tracing is on.
     void Trace(const char* format, const Pr_Logical_ConstraintHandle* handle) const;
+    // Warns, with the statement's line, of each name that a timing entry stores but extracted
+    // constraint text cannot give back (Pr_NameReadsBack).
+    void WarnNamesLost(const Pr_Logical_ConstraintHandle* handle, std::initializer_list<const char*> names,
+                       const std::vector<const char*>& more = {}) const;
     // Records one global or group offset entry, reporting a second entry of a generated name.
     void RecordOffset(const char* entry, const std::string& value, bool generated, bool with_line,
                       const Pr_Logical_ConstraintHandle* handle);

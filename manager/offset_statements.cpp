@@ -30,6 +30,7 @@ bool Ta_LunMgr::cb_offset(bool in, double time, const double* valid, bool before
                           const char* level, const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::offset:line %I: %s", handle);
     if (second_pass) return true;
+    WarnNamesLost(handle, {clock});
     Pr_BlockEntry entry = Pr_OffsetEntry(nullptr, in, time, valid, before, clock, nullptr, level);
     RecordOffset(entry.name.c_str(), entry.value, false, false, handle);
     return true;
@@ -39,6 +40,7 @@ bool Ta_LunMgr::cb_roffset(bool in, double time, const double* valid, bool befor
                            const char* regs, const char* level, const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::roffset: line %I: %s", handle);
     if (second_pass) return true;
+    WarnNamesLost(handle, {clock, regs});
     Pr_BlockEntry entry = Pr_OffsetEntry(nullptr, in, time, valid, before, clock, regs, level);
     RecordOffset(entry.name.c_str(), entry.value, false, false, handle);
     return true;
@@ -48,6 +50,7 @@ bool Ta_LunMgr::cb_toffset(const char* group, bool in, double time, const double
                            const char* clock, const char* level, const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::toffset:line %I: %s", handle);
     if (second_pass) return true;
+    WarnNamesLost(handle, {group, clock});
     Pr_BlockEntry entry = Pr_OffsetEntry(group, in, time, valid, before, clock, nullptr, level);
     RecordOffset(entry.name.c_str(), entry.value, true, true, handle);
     return true;
@@ -58,6 +61,7 @@ bool Ta_LunMgr::cb_troffset(const char* group, bool in, double time, const doubl
                             const Pr_Logical_ConstraintHandle* handle) {
     Trace("MGR::troffset:line %I; %s", handle);
     if (second_pass) return true;
+    WarnNamesLost(handle, {group, clock, regs});
     Pr_BlockEntry entry = Pr_OffsetEntry(group, in, time, valid, before, clock, regs, level);
     RecordOffset(entry.name.c_str(), entry.value, true, false, handle);
     return true;

@@ -47,6 +47,12 @@ Pr_AttributeText Rule(Pr_AttributeRule rule, std::string value = {}) { return {r
 
 }  // namespace
 
+bool Pr_NameReadsBack(std::string_view name) {
+    for (char c : name)
+        if (c == ';' || c == '#' || c == '"' || c == ' ' || c == '\t' || c == '\n' || c == '\r') return false;
+    return true;
+}
+
 const char* Pr_EdgeText(PR_EDGE edge) {
     static const char* const kEdges[] = {"RISING", "FALLING", "TRANSHI", "TRANSLO", ""};
     int i = static_cast<int>(edge);

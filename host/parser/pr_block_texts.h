@@ -5,6 +5,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -15,6 +16,10 @@ struct Pr_BlockEntry {
     std::string name;
     std::string value;
 };
+
+// Whether a name stored in these texts comes back the same from the constraint text written
+// from them: the texts keep names unquoted, so a blank, ';', '#' or '"' in a name is lost.
+bool Pr_NameReadsBack(std::string_view name);
 
 // "RISING", "FALLING", "TRANSHI", "TRANSLO", "" for 4, null otherwise.
 const char* Pr_EdgeText(PR_EDGE edge);

@@ -110,6 +110,25 @@ TEST(Fidelity, RepeatedSettingsAndGroupsKeepEveryValueInFileOrder) {
         << out;
 }
 
+// A group or clock name the stored texts cannot quote is kept as written, with a warning at
+// annotation (file and line) and one from extract naming each statement that will not read back.
+TEST(Fidelity, NamesThatExtractionCannotQuoteAreSaid) {
+    lun_test::ScratchDir dir;
+    std::string ucf = dir.Write("q.ucf",
+                                "TIMEGRP \"grp a;b\" = RISING \"uart regs;x\";\nOFFSET = OUT 12 ns AFTER \"c;lk\";\n"
+                                "TIMEGRP \"g#1\" = FALLING plain;\nTIMEGRP fine = RISING plain;\n");
+    std::string saved = dir.path() + "/q.qdf", out, err;
+    ASSERT_EQ(Quillmap("annotate " + kBlinky + " --ucf " + ucf + " -o " + saved, &out, &err), 0) << err;
+    for (const char* name : {"grp a;b", "uart regs;x", "c;lk", "g#1"})
+        EXPECT_NE(err.find(std::string("': The name '") + name + "' holds a blank"), std::string::npos) << err;
+    EXPECT_EQ(Count(err, "Line 1 in '" + ucf + "'"), 2u);
+    EXPECT_EQ(Count(err, "WARNING"), 4u);
+    ASSERT_EQ(Quillmap("extract " + saved, &out, &err), 0) << err;
+    EXPECT_NE(out.find("TIMEGRP grp a;b = RISING uart regs;x  ;"), std::string::npos) << out;  // as stored
+    EXPECT_EQ(Count(err, "will not read back as written"), 3u) << err;
+    EXPECT_EQ(err.find("fine"), std::string::npos) << err;
+}
+
 // A netlist where one net reaches the input x and the outputs y and z (assign y = x; assign
 // z = x;) and an internal net name.
 constexpr const char* kCopiedPorts = R"({"modules": {"top": {"attributes": {"top": 1},
