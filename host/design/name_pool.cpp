@@ -7,15 +7,29 @@ constexpr size_t kChunk = 1 << 20;
 }
 
 uint64_t Ndm_NamePool::Hash(std::string_view text) {
-    // FNV-1a, then a final mix so that low bits spread well.
-    uint64_t h = 1469598103934665603ull;
-    for (unsigned char c : text) {
-        h ^= c;
-        h *= 1099511628211ull;
+    // Eight bytes a step (names are short, file contents long), then a final mix so that low
+    // bits spread well.
+    auto step = [](uint64_t h, uint64_t word) {
+        h ^= word * 0xbf58476d1ce4e5b9ull;
+        h = (h << 27) | (h >> 37);
+        return h * 0x94d049bb133111ebull;
+    };
+    uint64_t h = 0x9e3779b97f4a7c15ull ^ (text.size() * 0xff51afd7ed558ccdull);
+    const char* p = text.data();
+    size_t n = text.size();
+    for (; n >= 8; p += 8, n -= 8) {
+        uint64_t word;
+        std::memcpy(&word, p, 8);
+        h = step(h, word);
     }
-    h ^= h >> 29;
+    if (n) {
+        uint64_t word = 0;
+        std::memcpy(&word, p, n);
+        h = step(h, word);
+    }
+    h ^= h >> 31;
     h *= 0xbf58476d1ce4e5b9ull;
-    h ^= h >> 32;
+    h ^= h >> 29;
     return h;
 }
 

@@ -406,14 +406,14 @@ TEST_F(Repo, CommitsAreAtomicAndDamageIsRefused) {
     ASSERT_NE(at, std::string::npos);
     flipped[at + 6] ^= 0x01;
     std::string older = committed;  // written in the format before constraint blocks were kept
-    size_t version = older.find("version2");
+    size_t version = older.find("version3");
     ASSERT_NE(version, std::string::npos);
     older[version + 7] = '1';
     struct Case {
         std::string content, reason;
     } cases[] = {
         {flipped, "its content does not match its checksum"},
-        {older, "it was written in format 1 by an older version; this program reads format 2"},
+        {older, "it was written in format 1 by an older version; this program reads format 3"},
         {committed.substr(0, committed.size() / 2), "damaged"},
         {committed.substr(0, 100), ""},
         {"not a database at all, just text\n", ""},
