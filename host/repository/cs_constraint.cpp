@@ -98,6 +98,8 @@ const char* Cs_BlockWord(Cs_Block block) {
     return "";
 }
 
+const Cs_Constraint::Extra Cs_Constraint::kNone{};
+
 Cs_Constraint::~Cs_Constraint() = default;
 
 std::string Cs_Constraint::GetMsgName() const {

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <deque>
 #include <memory>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -132,8 +133,8 @@ public:
     // nothing of (a statement it refuses, the later values of an AREA_GROUP or SET attribute,
     // which the first value's text carries).
     Cs_Block GetBlock() const { return block_; }
-    const char* GetEntryName() const { return entry_; }
-    const char* GetStoredText() const { return stored_; }
+    const char* GetEntryName() const { return extra_ ? extra_->entry : ""; }
+    const char* GetStoredText() const { return extra_ ? extra_->stored : ""; }
 
     const Cs_ConstraintSourceInfo* GetSourceInfo() const { return &source_; }
     // The constraint as a user recognises it, with its file and line:
@@ -145,11 +146,18 @@ public:
     bool IsAssociationExempt() const;
 
     // Resolution results (Cs_ConstraintMgr::SetDesign, UpdateConstraintsFromSource).
-    const std::vector<Ndm_PropertyHolder*>& GetAssociatedDesignObjs() const { return objects_; }
-    const std::vector<const Cs_Constraint*>& GetAssociatedConstraints() const { return constraints_; }
+    // The design objects: one is kept in the constraint, more in a list the constraints of one
+    // statement share.
+    std::span<Ndm_PropertyHolder* const> GetAssociatedDesignObjs() const {
+        if (many_) return *many_;
+        return one_ ? std::span<Ndm_PropertyHolder* const>(&one_, 1) : std::span<Ndm_PropertyHolder* const>();
+    }
+    const std::vector<const Cs_Constraint*>& GetAssociatedConstraints() const {
+        return extra_ ? extra_->constraints : kNone.constraints;
+    }
     // The group names a TIMESPEC's paths run through (FROM, THRU, TO), as written.
-    const std::vector<const char*>& GetAssociatedPaths() const { return paths_; }
-    const std::vector<Cs_Conflict>& GetConflicts() const { return conflicts_; }
+    const std::vector<const char*>& GetAssociatedPaths() const { return extra_ ? extra_->paths : kNone.paths; }
+    const std::vector<Cs_Conflict>& GetConflicts() const { return extra_ ? extra_->conflicts : kNone.conflicts; }
 
 protected:
     Cs_Constraint() = default;
@@ -159,6 +167,23 @@ private:
     friend class Cs_Loader;
     friend class Cs_Store;
 
+    // What only some constraints have, kept aside so that the many constraints of objects
+    // stay small: links to other constraints, group names, overrides, a stored entry.
+    struct Extra {
+        std::vector<const Cs_Constraint*> constraints;
+        const Cs_Constraint* parent = nullptr;  // given to CreateConstraints
+        std::vector<const char*> paths;
+        std::vector<Cs_Conflict> conflicts;
+        const char* entry = "";  // texts are owned by the repository
+        const char* stored = "";
+    };
+    static const Extra kNone;
+    Extra& More() {
+        if (!extra_) extra_ = std::make_unique<Extra>();
+        return *extra_;
+    }
+    const Cs_Constraint* Parent() const { return extra_ ? extra_->parent : nullptr; }
+
     Cs_Scope scope_ = Cs_Scope::Design;
     bool flag_ = false;
     Cs_Block block_ = Cs_Block::None;
@@ -166,14 +191,10 @@ private:
     const char* key_ = "";
     const char* value_ = "";
     const char* statement_ = "";
-    const char* entry_ = "";
-    const char* stored_ = "";
     Cs_ConstraintSourceInfo source_;
-    std::vector<Ndm_PropertyHolder*> objects_;
-    std::vector<const Cs_Constraint*> constraints_;
-    const Cs_Constraint* parent_ = nullptr;  // given to CreateConstraints
-    std::vector<const char*> paths_;
-    std::vector<Cs_Conflict> conflicts_;
+    Ndm_PropertyHolder* one_ = nullptr;
+    const std::vector<Ndm_PropertyHolder*>* many_ = nullptr;  // owned by the repository
+    std::unique_ptr<Extra> extra_;
 };
 
 #define LUN_CS_CONSTRAINT_CLASS(Name)                                                  \

@@ -79,8 +79,9 @@ Cs_Constraint& Cs_Loader::Add(Cs_Scope scope, const char* target, const char* ke
 
 void Cs_Loader::Store(Cs_Constraint& c, Cs_Block block, std::string_view entry, std::string_view stored) {
     c.block_ = block;
-    c.entry_ = mgr_.Text(entry);
-    c.stored_ = mgr_.Text(stored);
+    if (entry.empty() && stored.empty()) return;
+    c.More().entry = mgr_.Text(entry);
+    c.More().stored = mgr_.Text(stored);
 }
 
 template <class T>
@@ -134,7 +135,7 @@ bool Cs_Loader::cb_comment(const char* text, const Handle* handle) {
 bool Cs_Loader::cb_enable(bool enable, const char* name, const Handle* handle) {
     const char* key = enable ? "ENABLE" : "DISABLE";
     Cs_Constraint& c = Add<Cs_Constraint_TimeSpec>(Cs_Scope::TimeSpec, "", key, name, handle);
-    c.paths_ = {mgr_.Text(name)};
+    c.More().paths = {mgr_.Text(name)};
     Store(c, Cs_Block::TimeSpec, key, name);
     return true;
 }
@@ -275,7 +276,7 @@ Cs_Constraint& Cs_Loader::TimingEntry(const char* target, const char* key, const
                                       std::vector<const char*> groups) {
     Cs_Constraint& c = Add<Cs_Constraint_TimeSpec>(Cs_Scope::TimeSpec, target, key, AfterEquals(handle), handle);
     for (const char* g : groups)
-        if (g && *g) c.paths_.push_back(mgr_.Text(g));
+        if (g && *g) c.More().paths.push_back(mgr_.Text(g));
     return c;
 }
 
@@ -287,7 +288,7 @@ Cs_Constraint& Cs_Loader::Offset(const char* group, bool in, double time, const 
                                                  AfterEquals(handle), handle);
     Store(c, Cs_Block::TimeSpec, entry.name, entry.value);
     for (const char* g : {group, regs})
-        if (g) c.paths_.push_back(mgr_.Text(g));
+        if (g) c.More().paths.push_back(mgr_.Text(g));
     return c;
 }
 
@@ -349,8 +350,8 @@ bool Cs_Loader::cb_tspec_drop_spec(const char* name, const Handle* handle) {
 bool Cs_Loader::cb_timegrp(const char* group, const std::vector<std::pair<const char*, PR_EDGE>>& members,
                            const std::vector<const char*>& excluded, const Handle* handle) {
     Cs_Constraint& c = Add<Cs_Constraint_TimeGrp>(Cs_Scope::TimeGroup, group, group, AfterEquals(handle), handle);
-    for (const auto& m : members) c.paths_.push_back(mgr_.Text(m.first));
-    for (const char* x : excluded) c.paths_.push_back(mgr_.Text(x));
+    for (const auto& m : members) c.More().paths.push_back(mgr_.Text(m.first));
+    for (const char* x : excluded) c.More().paths.push_back(mgr_.Text(x));
     if (!members.empty())  // the annotator refuses a group of no members
         Store(c, Cs_Block::TimeGroup, group, Pr_TimeGroupText(members, excluded));
     return true;
@@ -358,7 +359,7 @@ bool Cs_Loader::cb_timegrp(const char* group, const std::vector<std::pair<const 
 
 bool Cs_Loader::cb_timegrp_areagroup(const char* group, const char* areagroup, const Handle* handle) {
     Cs_Constraint& c = Add<Cs_Constraint_TimeGrp>(Cs_Scope::TimeGroup, group, "AREA_GROUP", areagroup, handle);
-    c.paths_.push_back(mgr_.Text(group));
+    c.More().paths.push_back(mgr_.Text(group));
     Pr_BlockEntry entry = Pr_GroupAreaEntry(group, areagroup);
     Store(c, Cs_Block::TimeSpec, entry.name, entry.value);
     return true;

@@ -155,7 +155,7 @@ Cs_ReturnCode Cs_ConstraintMgr::CreateConstraints(const Port::StringBase<char>& 
     auto copy = Pr_FileText::FromText(text.str());
     loader.Read(copy);
     for (auto& c : loader.constraints()) {
-        c->parent_ = parent;
+        if (parent) c->More().parent = parent;
         loose_.push_back(std::move(c));
     }
     Changed();
@@ -184,6 +184,7 @@ void Cs_ConstraintMgr::DeleteAllConstraints() {
     same_as_file_.clear();
     sources_.clear();
     loose_.clear();
+    object_lists_.clear();
     resolution_ = Cs_ReturnCode();
     committed_.clear();
     texts_ = std::make_unique<Ndm_NamePool>();

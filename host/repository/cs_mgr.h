@@ -4,6 +4,7 @@
 // repository file (SQLite) that Commit writes and Restore reads back. See docs/repository.md.
 #pragma once
 
+#include <deque>
 #include <memory>
 #include <string>
 #include <unordered_map>
@@ -139,6 +140,9 @@ public:
         return it == committed_.end() ? nullptr : &it->second;
     }
 
+    // Bytes held by the repository's texts (arena and index), for reports.
+    size_t GetTextBytes() const { return texts_->bytes(); }
+
     // Interned copy of a text, owned by the repository.
     const char* Text(std::string_view text) { return texts_->Intern(text); }
 
@@ -162,6 +166,8 @@ private:
     void Changed();
     // Resolution of every constraint (cs_resolve.cpp).
     Cs_ReturnCode Resolve();
+    // Gives c the objects found (emptied); lists of more than one are kept by the repository.
+    void SetObjects(Cs_Constraint& c, std::vector<Ndm_PropertyHolder*>& found);
     // Whether c was read from an NCF (the others are read as UCFs).
     bool IsFromNcf(const Cs_Constraint& c) const;
     template <class F>
@@ -176,6 +182,7 @@ private:
     Constraints loose_;  // constraints of no file (CreateConstraints, take-in), after the sources
     Cs_ReturnCode resolution_;  // statuses of the last resolution
     std::unique_ptr<Ndm_NamePool> texts_;
+    std::deque<std::vector<Ndm_PropertyHolder*>> object_lists_;  // the constraints' lists of objects
     bool bulk_ = false;
     bool bulk_changed_ = false;
     mutable Cs_ReturnCode store_outcome_;

@@ -48,11 +48,15 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
     same_as_file_.clear();
     Cs_ReturnCode outcome;
     std::vector<Cs_Constraint*> all;
+    object_lists_.clear();
     ForEach([&](Cs_Constraint& c) {
-        c.objects_.clear();
-        c.conflicts_.clear();
-        c.constraints_.clear();
-        if (c.parent_) c.constraints_.push_back(c.parent_);
+        c.one_ = nullptr;
+        c.many_ = nullptr;
+        if (c.extra_) {
+            c.extra_->conflicts.clear();
+            c.extra_->constraints.clear();
+            if (c.extra_->parent) c.extra_->constraints.push_back(c.extra_->parent);
+        }
         all.push_back(&c);
     });
 
@@ -77,6 +81,7 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
     std::map<std::pair<const void*, std::string>, const Cs_Constraint*> last;
     // Results per statement and name: the constraints of one statement share one lookup.
     std::string working;
+    std::vector<Ndm_PropertyHolder*> found;
     const Cs_Constraint* previous = nullptr;
     for (Cs_Constraint* c : all) {
         const bool object = !c->IsAssociationExempt();
@@ -90,25 +95,26 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
                               previous->source_.GetSourceFile() && where &&
                               previous->source_.GetSourceFile()->GetLine() == where->GetLine();
             if (same) {
-                c->objects_ = previous->objects_;
+                c->one_ = previous->one_;
+                c->many_ = previous->many_;
             } else {
                 switch (c->scope_) {
                     case Cs_Scope::Instance:
-                        for (Ndm_Block* b : finder->Instances(c->target_, working, silent)) c->objects_.push_back(b);
+                        for (Ndm_Block* b : finder->Instances(c->target_, working, silent)) found.push_back(b);
                         break;
                     case Cs_Scope::Net:
                         for (Ndm_Signal* s : finder->Nets(c->target_, working, silent))
-                            c->objects_.push_back(s->GetNetwork() ? static_cast<Ndm_PropertyHolder*>(s->GetNetwork())
-                                                                  : s);
+                            found.push_back(s->GetNetwork() ? static_cast<Ndm_PropertyHolder*>(s->GetNetwork()) : s);
                         break;
                     case Cs_Scope::Pin:
-                        for (Ndm_Pin* p : finder->Pins(c->target_, working, silent)) c->objects_.push_back(p);
+                        for (Ndm_Pin* p : finder->Pins(c->target_, working, silent)) found.push_back(p);
                         break;
                     default: break;
                 }
+                SetObjects(*c, found);
             }
             previous = c;
-            if (c->objects_.empty()) {
+            if (c->GetAssociatedDesignObjs().empty()) {
                 outcome.Add(std::make_shared<Cs_Status_Resolution>(
                     Cs_StatusID::NO_DESIGN_MATCH, Cs_Status::WARNING, 20,
                     Port_Format("%s matches no object of the design.", c->GetMsgName().c_str()), c));
@@ -116,16 +122,16 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
         }
         // Group references of TIMESPEC statements, groups and offsets.
         bool missing = false;
-        for (const char* g : c->paths_) {
+        for (const char* g : c->GetAssociatedPaths()) {
             auto it = groups.find(g);
             if (it == groups.end()) {
                 missing = true;
                 continue;
             }
             for (const Cs_Constraint* d : it->second)
-                if (d != c) c->constraints_.push_back(d);
+                if (d != c) c->More().constraints.push_back(d);
         }
-        if (missing && c->constraints_.empty() && c->scope_ != Cs_Scope::Comment)
+        if (missing && c->GetAssociatedConstraints().empty() && c->scope_ != Cs_Scope::Comment)
             outcome.Add(std::make_shared<Cs_Status_Resolution>(
                 Cs_StatusID::NO_RESOLVED_ASSOCIATIONS, Cs_Status::INFO, 81,
                 Port_Format("%s names no group that a constraint defines.", c->GetMsgName().c_str()), c));
@@ -142,15 +148,26 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
             if (fresh) return;
             const Cs_Constraint* earlier = it->second;
             if (std::strcmp(earlier->value_, c->value_) != 0)
-                const_cast<Cs_Constraint*>(earlier)->conflicts_.emplace_back(Cs_Conflict::OVERRIDE, entity, c);
+                const_cast<Cs_Constraint*>(earlier)->More().conflicts.emplace_back(Cs_Conflict::OVERRIDE, entity, c);
             it->second = c;
         };
         if (object) {
-            for (Ndm_PropertyHolder* o : c->objects_) record(o, o);
+            for (Ndm_PropertyHolder* o : c->GetAssociatedDesignObjs()) record(o, o);
         } else {
             record(nullptr, nullptr);
         }
     }
     resolution_ = outcome;
     return outcome;
+}
+
+void Cs_ConstraintMgr::SetObjects(Cs_Constraint& c, std::vector<Ndm_PropertyHolder*>& found) {
+    c.one_ = found.size() == 1 ? found[0] : nullptr;
+    c.many_ = nullptr;
+    if (found.size() > 1) {
+        object_lists_.push_back(std::move(found));
+        object_lists_.back().shrink_to_fit();
+        c.many_ = &object_lists_.back();
+    }
+    found.clear();
 }

@@ -370,7 +370,7 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
                            {id, src, int64_t{where ? where->GetLine() : 0}, std::string(c.GetType().GetName()),
                             std::string(ScopeName(c.GetScope())), std::string(c.GetTarget()),
                             std::string(c.GetAttribute()), std::string(c.GetValueText()), int64_t{c.IsFlag()},
-                            std::string(c.GetStatementText()), id_of(c.parent_), block, entry, stored},
+                            std::string(c.GetStatementText()), id_of(c.Parent()), block, entry, stored},
                            &sum, error);
             for (const char* g : c.GetAssociatedPaths())
                 ok = ok && db.Insert("INSERT INTO path VALUES (?,?)", {id, std::string(g)}, &sum, error);
@@ -380,7 +380,7 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
                                      {id, std::string(kind), name, Value()}, &sum, error);
             }
             for (const Cs_Constraint* other : c.GetAssociatedConstraints()) {
-                if (other == c.parent_) continue;
+                if (other == c.Parent()) continue;
                 ok = ok && db.Insert("INSERT INTO association VALUES (?,?,?,?)",
                                      {id, std::string("constraint"), Value(), id_of(other)}, &sum, error);
             }
@@ -534,8 +534,10 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         c->flag_ = Int(r[8]) != 0;
         c->statement_ = staged.Text(Str(r[9]));
         if (!IsNull(r[11]) && !BlockFrom(Str(r[11]), c->block_)) return fail("it is damaged (unknown constraint block)");
-        c->entry_ = staged.Text(Str(r[12]));
-        c->stored_ = staged.Text(Str(r[13]));
+        if (!IsNull(r[11])) {
+            c->More().entry = staged.Text(Str(r[12]));
+            c->More().stored = staged.Text(Str(r[13]));
+        }
         const char* file = nullptr;
         Cs_ConstraintMgr::Constraints* list = &staged.loose_;
         if (!IsNull(r[1])) {
@@ -556,29 +558,51 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     };
     for (auto& [c, parent] : parents) {
         auto it = by_id.find(parent);
-        c->parent_ = it == by_id.end() ? nullptr : it->second;
-        if (c->parent_) c->constraints_.push_back(c->parent_);
+        if (it == by_id.end()) continue;
+        c->More().parent = it->second;
+        c->More().constraints.push_back(it->second);
     }
     Ndm_View* view = mgr.design_ ? mgr.design_->GetWorkView() : nullptr;
     for (Table::RowRef r : paths)
-        if (Cs_Constraint* c = constraint(r[0])) c->paths_.push_back(staged.Text(Str(r[1])));
+        if (Cs_Constraint* c = constraint(r[0])) c->More().paths.push_back(staged.Text(Str(r[1])));
     // What the constraints resolved to counts only for the design it was committed for; with no
     // design bound the names are kept for listings.
     const std::string& stamp = mgr.design_ ? mgr.design_->GetSourceStamp() : info["design_stamp"];
     const bool same_design = !stamp.empty() && stamp == info["design_stamp"];
+    // The rows of one constraint come together; the constraints of one statement that found
+    // the same objects share one list, as after a resolution.
+    Cs_Constraint* filling = nullptr;
+    const Cs_Constraint* filled = nullptr;
+    std::vector<Ndm_PropertyHolder*> found;
+    auto flush = [&] {
+        if (!filling) return;
+        const auto before = filled ? filled->GetAssociatedDesignObjs() : std::span<Ndm_PropertyHolder* const>();
+        if (filled && found.size() > 1 && filled->GetStatementText() == filling->GetStatementText() &&
+            std::equal(found.begin(), found.end(), before.begin(), before.end())) {
+            filling->many_ = filled->many_;
+            found.clear();
+        } else {
+            staged.SetObjects(*filling, found);
+        }
+        filled = filling;
+        filling = nullptr;
+    };
     for (Table::RowRef r : assocs) {
         Cs_Constraint* c = constraint(r[0]);
         if (!c) return fail("it is damaged (an association of an unknown constraint)");
+        if (c != filling) flush();
         if (Str(r[1]) == "constraint") {
-            if (Cs_Constraint* other = constraint(r[3])) c->constraints_.push_back(other);
+            if (Cs_Constraint* other = constraint(r[3])) c->More().constraints.push_back(other);
         } else if (!view) {
             staged.committed_[c].objects.emplace_back(Str(r[2]));
         } else if (!same_design) {
             continue;
         } else if (Ndm_PropertyHolder* o = FindObject(view, Str(r[1]), Str(r[2]))) {
-            c->objects_.push_back(o);
+            filling = c;
+            found.push_back(o);
         }
     }
+    flush();
     for (Table::RowRef r : conflicts) {
         Cs_Constraint* c = constraint(r[0]);
         if (!c) return fail("it is damaged (a conflict of an unknown constraint)");
@@ -589,7 +613,7 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
         if (!IsNull(r[2]) && !same_design) continue;
         Ndm_PropertyHolder* entity = IsNull(r[2]) ? nullptr : FindObject(view, Str(r[2]), Str(r[3]));
         if (!IsNull(r[2]) && !entity) continue;  // an object the bound design no longer has
-        c->conflicts_.emplace_back(static_cast<Cs_Conflict::CONFLICTTYPE>(Int(r[1])), entity, constraint(r[4]));
+        c->More().conflicts.emplace_back(static_cast<Cs_Conflict::CONFLICTTYPE>(Int(r[1])), entity, constraint(r[4]));
     }
     for (Table::RowRef r : statuses) {
         auto id = static_cast<Cs_StatusID>(Int(r[1]));
@@ -618,6 +642,7 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     mgr.resolution_ = std::move(staged.resolution_);
     mgr.committed_ = std::move(staged.committed_);
     mgr.texts_ = std::move(staged.texts_);
+    mgr.object_lists_ = std::move(staged.object_lists_);
     staged.texts_ = std::make_unique<Ndm_NamePool>();
     mgr.same_as_file_.clear();
     if (view && !same_design) mgr.Resolve();
