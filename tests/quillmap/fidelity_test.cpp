@@ -17,12 +17,7 @@ using lun_test::RunCommand;
 const std::string kBlinky = std::string(LUN_SOURCE_DIR) + "/examples/blinky/blinky.json";
 
 using lun_test::Quillmap;
-
-size_t Count(const std::string& text, const std::string& what) {
-    size_t n = 0;
-    for (size_t at = text.find(what); at != std::string::npos; at = text.find(what, at + 1)) ++n;
-    return n;
-}
+using lun_test::CountOf;
 
 // Every byte 0x80..0xFF in names and values of each statement family: the messages are JSON,
 // the saved design reads back, dumps, converts to the same bytes, extracts, and the extracted
@@ -129,7 +124,7 @@ TEST(Fidelity, EachPortKeepsItsOwnPadConstraints) {
                        "NET 'x'."),
               std::string::npos)
         << err;
-    EXPECT_EQ(Count(err, "equivalent NET"), 1u) << err;
+    EXPECT_EQ(CountOf(err, "equivalent NET"), 1u) << err;
     ASSERT_EQ(Quillmap("dump " + saved, &out, &err), 0) << err;
     EXPECT_NE(out.find("network \"x\" signals 2\n    % \"LOC\" string \"A1\"\n"), std::string::npos) << out;
     EXPECT_NE(out.find("network \"y\" signals 1\n    % \"LOC\" string \"B2\"\n"), std::string::npos) << out;
