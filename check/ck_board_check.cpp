@@ -89,6 +89,17 @@ Ck_Ref Ck_BoardCheck::RefOf(const Cs_Constraint* c, std::string object) const {
     return ref;
 }
 
+void Ck_BoardCheck::AddRef(Ck_Finding& f, const Cs_Constraint* c, std::string object) const {
+    Ck_Ref ref = RefOf(c, std::move(object));
+    if (!f.refs.empty()) {
+        const Ck_Ref& last = f.refs.back();
+        if (last.file == ref.file && last.line == ref.line && last.object == ref.object && last.constraint &&
+            last.constraint->GetStatementText() == c->GetStatementText())
+            return;
+    }
+    f.refs.push_back(std::move(ref));
+}
+
 void Ck_BoardCheck::Sort() {
     // A reference without a constraint (a file or statement that cannot be read) sorts by its
     // file and line among the others.

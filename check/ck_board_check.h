@@ -64,6 +64,9 @@ private:
 
     void Add(Ck_Finding finding);
     Ck_Ref RefOf(const Cs_Constraint* c, std::string object = {}) const;
+    // Adds a reference to c unless the last one is to the same statement and object (the
+    // constraints of one statement come one after the other).
+    void AddRef(Ck_Finding& f, const Cs_Constraint* c, std::string object = {}) const;
     void Sort();
 
     const Cs_ConstraintMgr& mgr_;

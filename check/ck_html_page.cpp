@@ -135,11 +135,17 @@ const char* const kCk_PageTail = R"PAGE(</script>
     tr.appendChild(el('td', 'msg', f.message));
     var refs = el('td');
     if (!f.refs.length) refs.appendChild(el('span', 'none', data.design));
-    f.refs.slice(0, SHOWN_REFS).forEach(function (r, i) {
-      if (i) refs.appendChild(document.createTextNode(', '));
+    // One link per statement (a statement of several objects is referred to once per object).
+    var seen = {}, listed = 0, left = 0;
+    f.refs.forEach(function (r) {
+      var key = r[0] < 0 ? r[1] : r[0];
+      if (seen[key]) return;
+      seen[key] = true;
+      if (listed === SHOWN_REFS) { left++; return; }
+      if (listed++) refs.appendChild(document.createTextNode(', '));
       refs.appendChild(link(r));
     });
-    if (f.refs.length > SHOWN_REFS) refs.appendChild(el('span', 'none', ' and ' + (f.refs.length - SHOWN_REFS) + ' more'));
+    if (left) refs.appendChild(el('span', 'none', ' and ' + left + ' more'));
     tr.appendChild(refs);
     return tr;
   }

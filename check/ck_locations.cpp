@@ -142,7 +142,7 @@ void Ck_BoardCheck::PinClashes() {
         if (objects.size() < 2) continue;
         Ck_Finding f{Ck_Kind::PinClash, "", {}, {}};
         for (const Ndm_PropertyHolder* o : objects) f.objects.push_back(o->GetFullName());
-        for (const Use& u : uses) f.refs.push_back(RefOf(u.by, u.object->GetFullName()));
+        for (const Use& u : uses) AddRef(f, u.by, u.object->GetFullName());
         f.message = Port_Format("Site %s is given to %zu nets: %s.", uses.front().site.c_str(), objects.size(),
                                 Ck_NameList(f.objects).c_str());
         Add(std::move(f));

@@ -215,7 +215,7 @@ void Ck_BoardCheck::Clocks() {
                                  reach[i].first->GetFullName().c_str()),
                      {name},
                      {}};
-        for (const Cs_Constraint* c : ports_[i].constraints) f.refs.push_back(RefOf(c, name));
+        for (const Cs_Constraint* c : ports_[i].constraints) AddRef(f, c, name);
         Add(std::move(f));
     }
 }
@@ -248,7 +248,7 @@ void Ck_BoardCheck::Groups() {
                      Port_Format("Group '%s' is defined but no TIMESPEC, TIMEGRP or OFFSET uses it.", name.c_str()),
                      {name},
                      {}};
-        for (const Cs_Constraint* c : by) f.refs.push_back(RefOf(c));
+        for (const Cs_Constraint* c : by) AddRef(f, c);
         Add(std::move(f));
     }
 }

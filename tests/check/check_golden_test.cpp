@@ -1,7 +1,7 @@
 // quillmap check end to end on the board of tests/check/design.v: each folder below
-// tests/check/golden holds constraint files (*.ucf, given as --ucf in name order), an optional
-// file "options" (more arguments), and expected.txt: the exit status, the messages and the
-// output. LUN_REGRESS_UPDATE=1 rewrites expected.txt from the current output.
+// tests/check/golden holds constraint files (*.ucf and *.ncf, given as --ucf and --ncf in name
+// order), an optional file "options" (more arguments), and expected.txt: the exit status, the
+// messages and the output. LUN_REGRESS_UPDATE=1 rewrites expected.txt from the current output.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -54,11 +54,12 @@ TEST_P(CheckGolden, FindingsAsExpected) {
     ASSERT_EQ(RunCommand("cp " + netlist_dir_->path() + "/design.json " + work.path()), 0);
     std::vector<std::string> files;
     for (const auto& entry : fs::directory_iterator(dir))
-        if (entry.path().extension() == ".ucf") files.push_back(entry.path().filename().string());
+        if (entry.path().extension() == ".ucf" || entry.path().extension() == ".ncf")
+            files.push_back(entry.path().filename().string());
     std::sort(files.begin(), files.end());
     for (const std::string& f : files) {
         ASSERT_EQ(RunCommand("cp " + dir + "/" + f + " " + work.path()), 0);
-        args += " --ucf " + f;
+        args += " --" + f.substr(f.size() - 3) + " " + f;
     }
     std::string options = ReadFile(dir + "/options");
     options.erase(std::remove(options.begin(), options.end(), '\n'), options.end());
