@@ -18,8 +18,6 @@ namespace {
 
 // Names listed per statement: the page shows the count and these.
 constexpr size_t kNamesPerStatement = 50;
-// Objects listed per finding.
-constexpr size_t kObjectsPerFinding = 50;
 
 // Marks of a row the page filters on.
 enum RowFlag { kUnmatched = 1, kOverride = 2, kClash = 4 };
@@ -107,8 +105,6 @@ public:
             out += Ck_SeverityWord(Ck_SeverityOf(finding.kind));
             out += "\",\"message\":";
             Port_AppendJsonString(out, finding.message);
-            out += ",\"objects\":" + std::to_string(finding.objects.size()) + ",\"names\":";
-            Ck_AppendJsonNames(out, finding.objects, kObjectsPerFinding);
             out += ",\"refs\":[";
             for (size_t k = 0; k < finding.refs.size(); ++k) {
                 const Ck_Ref& r = finding.refs[k];

@@ -1,8 +1,8 @@
 // The HTML page of the board check, around its data: styles and script inline, nothing loaded
 // from anywhere. The script reads the data (rows: [file, line, text, count or -1, names,
-// findings, flags]; findings: kind, severity, message, objects, names, refs: [row, where,
-// object, wins]) and builds the table rows as they come into view, a few hundred at a time.
-// Opened with #s-FILE-LINE, it shows that statement expanded.
+// findings, flags]; findings: kind, severity, message, refs: [row, where, object, wins]) and
+// builds the table rows as they come into view, 200 at a time. Opened with #s-FILE-LINE, it
+// shows that statement expanded.
 
 extern const char* const kCk_PageHead;
 extern const char* const kCk_PageTail;
