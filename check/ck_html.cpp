@@ -99,11 +99,9 @@ public:
         out += "],\"findings\":[";
         for (size_t f = 0; f < findings.size(); ++f) {
             const Ck_Finding& finding = findings[f];
-            out += f ? ",{\"kind\":\"" : "{\"kind\":\"";
-            out += Ck_KindId(finding.kind);
-            out += "\",\"severity\":\"";
-            out += Ck_SeverityWord(Ck_SeverityOf(finding.kind));
-            out += "\",\"message\":";
+            out += f ? ",{" : "{";
+            Ck_AppendKindJson(out, finding.kind);
+            out += ",\"message\":";
             Port_AppendJsonString(out, finding.message);
             out += ",\"refs\":[";
             for (size_t k = 0; k < finding.refs.size(); ++k) {

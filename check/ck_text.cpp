@@ -98,11 +98,8 @@ void Ck_WriteText(const Ck_BoardCheck& check, const std::string& design, std::st
 
 void Ck_WriteJsonLines(const Ck_BoardCheck& check, const std::string& design, std::string& out) {
     for (const Ck_Finding& f : check.findings()) {
-        out += "{\"kind\":\"";
-        out += Ck_KindId(f.kind);
-        out += "\",\"severity\":\"";
-        out += Ck_SeverityWord(Ck_SeverityOf(f.kind));
-        out += '"';
+        out += '{';
+        Ck_AppendKindJson(out, f.kind);
         AppendString(out, "file", f.refs.empty() ? design : std::string(f.refs.front().file));
         AppendCount(out, "line", f.refs.empty() ? 0 : static_cast<size_t>(f.refs.front().line));
         AppendString(out, "message", f.message);
@@ -128,6 +125,14 @@ void Ck_WriteJsonLines(const Ck_BoardCheck& check, const std::string& design, st
     out += "{\"summary\":";
     Ck_AppendSummaryJson(check.summary(), out);
     out += "}\n";
+}
+
+void Ck_AppendKindJson(std::string& out, Ck_Kind kind) {
+    out += "\"kind\":\"";
+    out += Ck_KindId(kind);
+    out += "\",\"severity\":\"";
+    out += Ck_SeverityWord(Ck_SeverityOf(kind));
+    out += '"';
 }
 
 void Ck_AppendJsonNames(std::string& out, const std::vector<std::string>& names, size_t most) {

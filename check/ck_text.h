@@ -20,6 +20,9 @@ std::string Ck_NameList(const std::vector<std::string>& names, size_t shown = 10
 // findings about the design alone.
 void Ck_WriteText(const Ck_BoardCheck& check, const std::string& design, std::string& out);
 
+// Appends the members "kind" and "severity" of a finding's JSON object.
+void Ck_AppendKindJson(std::string& out, Ck_Kind kind);
+
 // Appends the names as a JSON array, the first most of them.
 void Ck_AppendJsonNames(std::string& out, const std::vector<std::string>& names, size_t most = SIZE_MAX);
 
