@@ -2,11 +2,15 @@
 # compiles against, the data files, the CMake package (lun::lun), lun.pc and the manual page.
 include(CMakePackageConfigHelpers)
 
-# The headers of the classes a host drives (the annotators, the extractor, the repository
-# bridge) and of the platform interfaces their declarations use. The readers' internals (and
-# every header that includes simdjson or SQLite) stay inside the library.
+# The headers of the classes a host drives (the annotators, the extractor, the board check,
+# the repository bridge) and of the platform interfaces their declarations use. The readers'
+# internals (and every header that includes simdjson or SQLite) stay inside the library.
 set(LUN_PUBLIC_HEADERS
   bridge/luncshelper.h
+  check/ck_board_check.h
+  check/ck_finding.h
+  check/ck_html.h
+  check/ck_text.h
   extract/cst_extractor.h
   frame/lunbase.h
   lookup/lookup_report.h

@@ -34,6 +34,31 @@ bool QuillmapOutputIsNew(const std::string& output, const std::vector<std::strin
     return true;
 }
 
+void QuillmapInputs::AddOptions(CLI::App* cmd) {
+    cmd_ = cmd;
+    cmd->add_option("DESIGN", design, "Yosys JSON netlist or native design file")->required();
+    cmd->add_option("--top", top, "Top module of a Yosys netlist (default: the module marked top)");
+    ucf_opt_ = cmd->add_option("--ucf", ucf, "User constraints file (repeatable)");
+    ncf_opt_ = cmd->add_option("--ncf", ncf, "Netlist constraints file (repeatable)");
+}
+
+std::vector<QuillmapConstraintFile> QuillmapInputs::FilesInOrder() const {
+    std::vector<QuillmapConstraintFile> files;
+    size_t u = 0, n = 0;
+    for (const CLI::Option* opt : cmd_->parse_order()) {
+        if (opt == ucf_opt_ && u < ucf.size()) files.push_back({false, ucf[u++]});
+        if (opt == ncf_opt_ && n < ncf.size()) files.push_back({true, ncf[n++]});
+    }
+    return files;
+}
+
+std::vector<std::string> QuillmapInputs::Paths() const {
+    std::vector<std::string> paths{design};
+    paths.insert(paths.end(), ucf.begin(), ucf.end());
+    paths.insert(paths.end(), ncf.begin(), ncf.end());
+    return paths;
+}
+
 int QuillmapMain(int argc, char** argv) {
     CLI::App app{kDescription, "quillmap"};
     // The tool's version is the one it was built as; the library's is the one it loaded.
@@ -50,6 +75,7 @@ int QuillmapMain(int argc, char** argv) {
     QuillmapAction run;
     AddAnnotateCommand(app, run, options);
     AddPartCommand(app, run, options);
+    AddCheckCommand(app, run);
     AddDesignCommands(app, run);
     AddExtractCommand(app, run);
     AddRepoCommand(app, run);

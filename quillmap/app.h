@@ -9,6 +9,7 @@
 
 namespace CLI {
 class App;
+class Option;
 }
 class Ndm_Block;
 class Ndm_Design;
@@ -36,12 +37,39 @@ std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const st
 // top block.
 Ndm_View* QuillmapWorkView(Ndm_Design& design, const std::string& path, const char* purpose);
 
+// A constraint file of the command line, and whether it is an NCF (else a UCF).
+struct QuillmapConstraintFile {
+    bool ncf;
+    std::string path;
+};
+// What a subcommand reads: a design (DESIGN, --top) and constraint files (--ucf and --ncf, each
+// repeatable).
+class QuillmapInputs {
+public:
+    std::string design;
+    std::string top;
+    std::vector<std::string> ucf;
+    std::vector<std::string> ncf;
+    // Adds the options to cmd.
+    void AddOptions(CLI::App* cmd);
+    // The constraint files in the order they were given.
+    std::vector<QuillmapConstraintFile> FilesInOrder() const;
+    // The design and every constraint file, for QuillmapOutputIsNew.
+    std::vector<std::string> Paths() const;
+
+private:
+    const CLI::App* cmd_ = nullptr;
+    const CLI::Option* ucf_opt_ = nullptr;
+    const CLI::Option* ncf_opt_ = nullptr;
+};
+
 // Each subcommand registers itself and sets run to its action, which returns an exit status.
 using QuillmapAction = std::function<int()>;
 void AddDesignCommands(CLI::App& app, QuillmapAction& run);
 void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
 void AddExtractCommand(CLI::App& app, QuillmapAction& run);
 void AddPartCommand(CLI::App& app, QuillmapAction& run, const QuillmapOptions& options);
+void AddCheckCommand(CLI::App& app, QuillmapAction& run);
 
 // Part reading, shared by annotate and part (cmd_part.cpp).
 // Runs the part reader over a UCF (its text read beforehand), keeping only its PART, as a host

@@ -14,10 +14,7 @@
 namespace {
 
 struct AnnotateArgs {
-    std::string design;
-    std::string top;
-    std::vector<std::string> ucf;
-    std::vector<std::string> ncf;
+    QuillmapInputs in;
     std::string filter;
     bool case_sensitive = false;
     bool case_insensitive = false;
@@ -28,46 +25,28 @@ struct AnnotateArgs {
     std::string project;
     std::string drc;
     bool allow_unmatched_maxdelay = false;
-    CLI::Option* ucf_opt = nullptr;
-    CLI::Option* ncf_opt = nullptr;
     CLI::Option* best_effort_opt = nullptr;
-    const CLI::App* cmd = nullptr;
 };
-
-struct ConstraintFile {
-    CP_FILE_TYPE kind;
-    std::string path;
-};
-
-// The constraint files in the order they were given on the command line.
-std::vector<ConstraintFile> FilesInOrder(const AnnotateArgs& args) {
-    std::vector<ConstraintFile> files;
-    size_t u = 0, n = 0;
-    for (const CLI::Option* opt : args.cmd->parse_order()) {
-        if (opt == args.ucf_opt && u < args.ucf.size()) files.push_back({CP_UCF, args.ucf[u++]});
-        if (opt == args.ncf_opt && n < args.ncf.size()) files.push_back({CP_NCF, args.ncf[n++]});
-    }
-    return files;
-}
 
 int RunFileRoad(const AnnotateArgs& args, const QuillmapOptions& options) {
-    auto design = QuillmapLoadDesign(args.design, args.top);
+    auto design = QuillmapLoadDesign(args.in.design, args.in.top);
     if (!design) return kStatusErrors;
-    Ndm_View* view = QuillmapWorkView(*design, args.design, "annotate");
+    Ndm_View* view = QuillmapWorkView(*design, args.in.design, "annotate");
     if (!view) return kStatusErrors;
     // Which file named which part: the parts already in the design, then each file's new one.
     std::vector<QuillmapPartSource> parts;
     auto before = QuillmapPartsOf(view);
-    for (const auto& [block, part] : before) parts.push_back({args.design, part});
-    for (const ConstraintFile& file : FilesInOrder(args)) {
+    for (const auto& [block, part] : before) parts.push_back({args.in.design, part});
+    for (const QuillmapConstraintFile& file : args.in.FilesInOrder()) {
+        const CP_FILE_TYPE kind = file.ncf ? CP_NCF : CP_UCF;
         // The file is read once and both readers parse that text, so a pipe works too; when it
         // cannot be read, the annotator reports it.
         std::shared_ptr<const Pr_FileText> text = Pr_FileText::Read(file.path.c_str());
         // A host learns the part of a UCF from the part reader (the manager passes over it);
         // in a second pass the first pass has stored it already.
-        if (text && file.kind == CP_UCF && !args.second_pass)
+        if (text && kind == CP_UCF && !args.second_pass)
             QuillmapReadUcfPart(view, file.path, text, args.filter, options.debug);
-        Ta_LunMgr mgr(file.path.c_str(), file.kind, args.filter.empty() ? nullptr : args.filter.c_str());
+        Ta_LunMgr mgr(file.path.c_str(), kind, args.filter.empty() ? nullptr : args.filter.c_str());
         mgr.set_text(std::move(text));
         if (args.case_sensitive) mgr.set_case_sensitive(true);
         if (args.case_insensitive) mgr.set_case_sensitive(false);
@@ -90,14 +69,15 @@ int RunFileRoad(const AnnotateArgs& args, const QuillmapOptions& options) {
 }
 
 int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
-    std::vector<std::string> inputs{args.design, args.filter, args.project};
-    inputs.insert(inputs.end(), args.ucf.begin(), args.ucf.end());
-    inputs.insert(inputs.end(), args.ncf.begin(), args.ncf.end());
+    std::vector<std::string> inputs = args.in.Paths();
+    inputs.push_back(args.filter);
+    inputs.push_back(args.project);
     if (!args.project.empty()) inputs.push_back(Ta_LunCSHelper::RepositoryPath(args.project.c_str()).str());
     if (!QuillmapOutputIsNew(args.output, inputs)) return kStatusFatal;
     if (args.project.empty()) return RunFileRoad(args, options);
-    QuillmapRoadRequest request{args.design, args.top, args.ucf, !args.ncf.empty(), args.project, args.drc,
-                                args.allow_unmatched_locs, args.allow_unmatched_maxdelay, args.output};
+    QuillmapRoadRequest request{args.in.design, args.in.top, args.in.ucf, !args.in.ncf.empty(),
+                                args.project, args.drc, args.allow_unmatched_locs, args.allow_unmatched_maxdelay,
+                                args.output};
     return QuillmapRepositoryRoad(request, [&] { return RunFileRoad(args, options); });
 }
 
@@ -134,11 +114,7 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
         "reported. `quillmap repo PROJECT` lists what the repository holds. Another value of\n"
         "ZEP_QUILLMAP_CS or ZEP_QUILLMAP_CONSTRAINT_DRC is a fatal error (exit status 2) and nothing is\n"
         "written. See docs/repository-road.md.");
-    args.cmd = cmd;
-    cmd->add_option("DESIGN", args.design, "Yosys JSON netlist or native design file")->required();
-    cmd->add_option("--top", args.top, "Top module of a Yosys netlist (default: the module marked top)");
-    args.ucf_opt = cmd->add_option("--ucf", args.ucf, "User constraints file (repeatable)");
-    args.ncf_opt = cmd->add_option("--ncf", args.ncf, "Netlist constraints file (repeatable)");
+    args.in.AddOptions(cmd);
     cmd->add_option("--filter", args.filter,
                     "Property definition file (default: ucf.pfd from the data folder)");
     auto* cs = cmd->add_flag("--case-sensitive", args.case_sensitive,

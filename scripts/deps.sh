@@ -2,7 +2,8 @@
 # Installs the Debian packages the build, the tests and the examples need, when missing.
 set -euo pipefail
 packages=(g++ cmake ninja-build libsimdjson-dev libcli11-dev libsqlite3-dev sqlite3 libgtest-dev
-          libgmock-dev libbenchmark-dev yosys help2man dpkg-dev file pkgconf)
+          libgmock-dev libbenchmark-dev yosys help2man dpkg-dev file pkgconf
+          chromium)
 missing=()
 for p in "${packages[@]}"; do
     dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

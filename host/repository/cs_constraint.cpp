@@ -121,6 +121,17 @@ std::string Cs_Constraint::GetMsgName() const {
     return text;
 }
 
+std::string_view Cs_DefinedGroup(const Cs_Constraint& c) {
+    if (c.GetType() == Cs_Constraint_TimingName::Type()) {
+        std::string_view value = c.GetValueText();
+        size_t colon = value.rfind(" : ");
+        return colon == std::string_view::npos ? value : value.substr(colon + 3);
+    }
+    if (c.GetType() == Cs_Constraint_TimeGrp::Type() && std::strcmp(c.GetAttribute(), "AREA_GROUP") != 0)
+        return c.GetTarget();
+    return {};
+}
+
 bool Cs_Constraint::IsAssociationExempt() const {
     switch (scope_) {
         case Cs_Scope::Instance:

@@ -7,6 +7,7 @@
 #include <memory>
 #include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "host/port/string_base.h"
@@ -240,6 +241,11 @@ public:
     Port::StringBase<char> GetKey() const { return GetAttribute(); }
     Port::StringBase<char> GetValue() const { return GetValueText(); }
 };
+
+// The timing group a constraint defines: the group of a TNM, TNM_NET, TPSYNC or TPTHRU (its
+// value after any qualifier: "FFS : grp" defines grp), the group of a TIMEGRP definition; empty
+// for every other constraint.
+std::string_view Cs_DefinedGroup(const Cs_Constraint& c);
 
 // Selects the constraints of one type.
 class Cs_Filter_ConstraintType {

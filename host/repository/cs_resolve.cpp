@@ -34,14 +34,6 @@ bool Accumulates(const Ndh_PropInFilter& filter, const Cs_Constraint& c) {
     return filter.KeepsEveryValue(c.GetAttribute(), FilterKind(c.GetScope()));
 }
 
-// The group a membership constraint (TNM, TNM_NET, TPSYNC, TPTHRU) defines: its value, after
-// a qualifier ("FFS : grp" defines grp).
-std::string DefinedGroup(const char* value) {
-    std::string v(value);
-    size_t colon = v.rfind(" : ");
-    return colon == std::string::npos ? v : v.substr(colon + 3);
-}
-
 }  // namespace
 
 Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
@@ -63,9 +55,8 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
     // Groups and the constraints that define them, for the associations below.
     std::unordered_map<std::string, std::vector<const Cs_Constraint*>> groups;
     for (Cs_Constraint* c : all) {
-        if (c->GetType() == Cs_Constraint_TimingName::Type()) groups[DefinedGroup(c->value_)].push_back(c);
-        if (c->GetType() == Cs_Constraint_TimeGrp::Type() && std::strcmp(c->key_, "AREA_GROUP") != 0)
-            groups[c->target_].push_back(c);
+        std::string_view group = Cs_DefinedGroup(*c);
+        if (!group.empty()) groups[std::string(group)].push_back(c);
     }
 
     Ndm_View* view = design_ ? design_->GetWorkView() : nullptr;

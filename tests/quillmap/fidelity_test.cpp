@@ -17,12 +17,7 @@ using lun_test::RunCommand;
 const std::string kBlinky = std::string(LUN_SOURCE_DIR) + "/examples/blinky/blinky.json";
 
 using lun_test::Quillmap;
-
-size_t Count(const std::string& text, const std::string& what) {
-    size_t n = 0;
-    for (size_t at = text.find(what); at != std::string::npos; at = text.find(what, at + 1)) ++n;
-    return n;
-}
+using lun_test::CountOf;
 
 // Every byte 0x80..0xFF in names and values of each statement family: the messages are JSON,
 // the saved design reads back, dumps, converts to the same bytes, extracts, and the extracted
@@ -121,11 +116,11 @@ TEST(Fidelity, NamesThatExtractionCannotQuoteAreSaid) {
     ASSERT_EQ(Quillmap("annotate " + kBlinky + " --ucf " + ucf + " -o " + saved, &out, &err), 0) << err;
     for (const char* name : {"grp a;b", "uart regs;x", "c;lk", "g#1"})
         EXPECT_NE(err.find(std::string("': The name '") + name + "' holds a blank"), std::string::npos) << err;
-    EXPECT_EQ(Count(err, "Line 1 in '" + ucf + "'"), 2u);
-    EXPECT_EQ(Count(err, "WARNING"), 4u);
+    EXPECT_EQ(CountOf(err, "Line 1 in '" + ucf + "'"), 2u);
+    EXPECT_EQ(CountOf(err, "WARNING"), 4u);
     ASSERT_EQ(Quillmap("extract " + saved, &out, &err), 0) << err;
     EXPECT_NE(out.find("TIMEGRP grp a;b = RISING uart regs;x  ;"), std::string::npos) << out;  // as stored
-    EXPECT_EQ(Count(err, "will not read back as written"), 3u) << err;
+    EXPECT_EQ(CountOf(err, "will not read back as written"), 3u) << err;
     EXPECT_EQ(err.find("fine"), std::string::npos) << err;
 }
 
@@ -148,7 +143,7 @@ TEST(Fidelity, EachPortKeepsItsOwnPadConstraints) {
                        "NET 'x'."),
               std::string::npos)
         << err;
-    EXPECT_EQ(Count(err, "equivalent NET"), 1u) << err;
+    EXPECT_EQ(CountOf(err, "equivalent NET"), 1u) << err;
     ASSERT_EQ(Quillmap("dump " + saved, &out, &err), 0) << err;
     EXPECT_NE(out.find("network \"x\" signals 2\n    % \"LOC\" string \"A1\"\n"), std::string::npos) << out;
     EXPECT_NE(out.find("network \"y\" signals 1\n    % \"LOC\" string \"B2\"\n"), std::string::npos) << out;

@@ -76,6 +76,9 @@ private:
     bool had_ = false;
 };
 
+// How many times what occurs in text (overlapping occurrences counted).
+size_t CountOf(const std::string& text, const std::string& what);
+
 // Whole content of a file ("" when it cannot be read).
 std::string ReadFile(const std::string& path);
 
