@@ -23,8 +23,8 @@ uint64_t Ndm_DefaultMaxCells();
 
 // Reads path. top_module names the top module; when null, the module with a true "top"
 // attribute is taken, else the only module no other module instantiates. max_cells limits the
-// blocks of the expanded design (0: Ndm_DefaultMaxCells()); bits and signals are limited to
-// what 32-bit counts hold. On a failure that stops reading, one error message naming the file
+// blocks of the expanded design (0: Ndm_DefaultMaxCells()); bits, signals and pins are limited
+// to what 32-bit counts hold. On a failure that stops reading, one error message naming the file
 // is issued; names that no object can carry (empty, holding a NUL byte, or repeated within a
 // module) each get one and reading goes on, so that all are listed. Either way null is
 // returned.
