@@ -123,6 +123,9 @@ bool Ta_LunMgr::cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
             }
             unsigned char error_reported = 0;
             if (!create_property(holder, *it, keyword, &error_reported, handle)) return false;
+            // A network is named after its top signal: the names are made (as long as the
+            // hierarchy is deep) only for another signal.
+            if (holder == sig || sig->GetNetwork()->GetTopSignal() == sig) continue;
             std::string net_name = holder->GetFullName();
             std::string sig_name = sig->GetFullName();
             if (net_name != sig_name)

@@ -71,6 +71,10 @@ int QuillmapMain(int argc, char** argv) {
         ->check(CLI::IsMember({"text", "jsonl"}))
         ->capture_default_str();
     app.add_flag("--debug", options.debug, "Show the debug channel (trace lines)");
+    app.add_option("--max-cells", options.max_cells,
+                   "Refuse a netlist that expands to more instances than this (default: LUN_MAX_CELLS, else "
+                   "100000000)")
+        ->check(CLI::PositiveNumber);
 
     QuillmapAction run;
     AddAnnotateCommand(app, run, options);
@@ -100,6 +104,7 @@ int QuillmapMain(int argc, char** argv) {
 
     if (options.messages == "jsonl") Port_MsgManData::AddSink(std::make_shared<Port_JsonSink>(stderr));
     Port_MsgManData::SetDebug(options.debug);
+    QuillmapSetMaxCells(options.max_cells);
 
     try {
         int status = run ? run() : kStatusFatal;

@@ -1,6 +1,7 @@
 // The quillmap command line: global options, subcommands, exit status.
 #pragma once
 
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <string>
@@ -23,6 +24,7 @@ enum QuillmapStatus { kStatusOk = 0, kStatusErrors = 1, kStatusFatal = 2 };
 struct QuillmapOptions {
     std::string messages = "text";  // "text" or "jsonl"
     bool debug = false;
+    uint64_t max_cells = 0;  // 0: the library's default
 };
 
 // False, after an error naming both, when output (if given) is the same file as one of the
@@ -31,6 +33,9 @@ bool QuillmapOutputIsNew(const std::string& output, const std::vector<std::strin
 
 // Reads a design file (Yosys JSON netlist or native design file); null after a message.
 std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top);
+// The limit on the instances a netlist may expand to for every later load (the global option
+// --max-cells); 0 leaves the library's default (LUN_MAX_CELLS, else 100,000,000).
+void QuillmapSetMaxCells(uint64_t max_cells);
 
 // The view the subcommands work on: EXPANDED, else the first view; null, after an error
 // naming the file and what the view was wanted for ("annotate"), when there is none with a

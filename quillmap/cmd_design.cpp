@@ -1,8 +1,9 @@
 // Subcommands that read and write whole designs: dump and convert.
 #include <CLI/CLI.hpp>
-#include <fstream>
-#include <sstream>
+#include <cstdint>
 #include <iostream>
+#include <ostream>
+#include <streambuf>
 
 #include "extract/cst_extractor.h"
 #include "host/design/design_io.h"
@@ -29,10 +30,34 @@ void AddDesignArgs(CLI::App* cmd, DesignArgs& args) {
                     "Top module of a Yosys netlist (default: the module marked top)");
 }
 
+// An output stream buffer over an atomic file: a dump of any size passes through the
+// dumper's own small buffer straight into the file.
+class AtomicFileBuf : public std::streambuf {
+public:
+    explicit AtomicFileBuf(Port::AtomicFile& file) : file_(file) {}
+
+protected:
+    std::streamsize xsputn(const char* data, std::streamsize size) override {
+        return file_.Write(data, static_cast<size_t>(size)) ? size : 0;
+    }
+    int_type overflow(int_type c) override {
+        if (traits_type::eq_int_type(c, traits_type::eof())) return traits_type::not_eof(c);
+        const char byte = traits_type::to_char_type(c);
+        return file_.Write(&byte, 1) ? c : traits_type::eof();
+    }
+
+private:
+    Port::AtomicFile& file_;
+};
+
+uint64_t g_max_cells = 0;  // --max-cells; 0: the library's default
+
 }  // namespace
 
+void QuillmapSetMaxCells(uint64_t max_cells) { g_max_cells = max_cells; }
+
 std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const std::string& top) {
-    return Ndm_LoadDesign(path.c_str(), top.empty() ? nullptr : top.c_str());
+    return Ndm_LoadDesign(path.c_str(), top.empty() ? nullptr : top.c_str(), g_max_cells);
 }
 
 Ndm_View* QuillmapWorkView(Ndm_Design& design, const std::string& path, const char* purpose) {
@@ -62,10 +87,11 @@ static void AddDumpCommand(CLI::App& app, QuillmapAction& run) {
                 std::cout.flush();
                 return std::cout ? static_cast<int>(kStatusOk) : static_cast<int>(kStatusErrors);
             }
-            std::ostringstream text;
-            Ndm_Dump(*design, text);
             Port::AtomicFile out(args.output);
-            if (!out.Write(text.str()) || !out.Commit()) {
+            AtomicFileBuf buf(out);
+            std::ostream text(&buf);
+            Ndm_Dump(*design, text);
+            if (!text || !out.Commit()) {
                 Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
                     .issueError("Could not write '%s': %s\n", args.output.c_str(), out.error().c_str());
                 return static_cast<int>(kStatusErrors);

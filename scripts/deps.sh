@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Installs the Debian packages the build, the tests and the examples need, when missing.
 set -euo pipefail
-packages=(g++ cmake ninja-build libsimdjson-dev libcli11-dev libsqlite3-dev sqlite3 libgtest-dev
+packages=(g++ clang cmake ninja-build libsimdjson-dev libcli11-dev libsqlite3-dev sqlite3 libgtest-dev
           libgmock-dev libbenchmark-dev yosys help2man dpkg-dev file pkgconf
           chromium)
 missing=()

@@ -19,7 +19,7 @@ using Ndm_JsonInput::Msg;
 
 }  // namespace
 
-std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_module) {
+std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_module, uint64_t max_cells) {
     if (!path) return nullptr;
     // The marker is the first member of a native file, so the head of the file tells.
     char head[512];
@@ -41,7 +41,7 @@ std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_mod
                                                static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec));
         return design;
     };
-    if (!Ndm_IsNativeText(head, got)) return stamp(Ndm_ReadYosysJson(path, top_module));
+    if (!Ndm_IsNativeText(head, got)) return stamp(Ndm_ReadYosysJson(path, top_module, max_cells));
     auto design = stamp(Ndm_ReadNative(path));
     if (design && top_module && std::strcmp(design->GetName(), top_module) != 0) {
         Msg().issueError("%s", Port_Format("Design file '%s' holds design '%s', not '%s'.", path,

@@ -2,7 +2,10 @@
 #include "host/port/json_text.h"
 
 #include <cstdio>
+#include <span>
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -27,10 +30,11 @@ private:
         Quoted(view.GetName());
         End();
         Properties(view, 1);
-        if (const Ndm_Block* top = view.GetBlock()) Block(*top, 1);
+        if (const Ndm_Block* top = view.GetBlock()) Tree(*top);
         for (const Ndm_Network* net : view.GetNetworkItr()) {
             Line(1, "network");
-            Quoted(net->GetName());
+            name_ = net->GetFullName();  // not net->GetName(), which would keep every name
+            Quoted(name_.c_str(), name_.size());
             buf_ += " signals ";
             buf_ += std::to_string(net->GetNumSignals());
             End();
@@ -43,7 +47,26 @@ private:
         }
     }
 
-    void Block(const Ndm_Block& block, int depth) {
+    // Blocks in preorder with their own stack: hierarchies can be very deep.
+    void Tree(const Ndm_Block& root) {
+        std::vector<std::pair<const Ndm_Block*, size_t>> stack;  // block, next child
+        BlockLines(root, 1);
+        stack.emplace_back(&root, 0);
+        while (!stack.empty()) {
+            auto& [block, next] = stack.back();
+            auto children = block->GetBlockItr();
+            if (next == children.size()) {
+                stack.pop_back();
+                continue;
+            }
+            const Ndm_Block* child = children[next++];
+            BlockLines(*child, static_cast<int>(stack.size()) + 1);
+            stack.emplace_back(child, 0);  // block and next are not used after this
+        }
+    }
+
+    // A block's own line, its properties, signals and pins.
+    void BlockLines(const Ndm_Block& block, int depth) {
         Line(depth, "block");
         if (block.GetParent()) {
             FullName(block);
@@ -72,11 +95,23 @@ private:
             End();
             Properties(*pin, depth + 2);
         }
-        for (const Ndm_Block* child : block.GetBlockItr()) Block(*child, depth + 1);
     }
 
+    // Properties, list entries one level deeper below their list, with their own stack.
     void Properties(const Ndm_PropertyHolder& holder, int depth) {
-        for (const Ndm_Property* p : holder.GetPropertyItr()) Property(*p, depth);
+        if (!holder.GetNumProperties()) return;
+        std::vector<std::pair<std::span<Ndm_Property* const>, size_t>>& stack = lists_;
+        stack.assign(1, {holder.GetPropertyItr(), 0});
+        while (!stack.empty()) {
+            auto& [list, next] = stack.back();
+            if (next == list.size()) {
+                stack.pop_back();
+                continue;
+            }
+            const Ndm_Property* p = list[next++];
+            Property(*p, depth + static_cast<int>(stack.size()) - 1);
+            if (p->GetNumEntries()) stack.emplace_back(p->GetListItr(), 0);  // list and next are not used after this
+        }
     }
 
     void Property(const Ndm_Property& p, int depth) {
@@ -111,7 +146,6 @@ private:
             default: break;
         }
         End();
-        for (const Ndm_Property* e : p.GetListItr()) Property(*e, depth + 1);
     }
 
     void Line(int depth, const char* word) {
@@ -144,6 +178,7 @@ private:
     std::ostream& out_;
     std::string buf_;
     std::string name_;
+    std::vector<std::pair<std::span<Ndm_Property* const>, size_t>> lists_;  // open property lists
 };
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -88,23 +89,33 @@ size_t FirstBadUtf8(const unsigned char* s, size_t size) {
     return size;
 }
 
-// Offset of the opening quote of a string that is never closed, or size.
-size_t UnclosedQuote(const char* s, size_t size) {
-    size_t open = size;
+// Calls visit(offset, byte) for every byte outside JSON strings, opening quotes included;
+// returns whether the text ends inside a string.
+template <class Visit>
+bool ForEachOutsideStrings(const char* s, size_t size, Visit&& visit) {
     bool in_string = false;
     for (size_t i = 0; i < size; ++i) {
-        char c = s[i];
+        const char c = s[i];
         if (in_string) {
             if (c == '\\')
                 ++i;
             else if (c == '"')
                 in_string = false;
-        } else if (c == '"') {
-            in_string = true;
-            open = i;
+        } else {
+            in_string = c == '"';
+            visit(i, c);
         }
     }
-    return in_string ? open : size;
+    return in_string;
+}
+
+// Offset of the opening quote of a string that is never closed, or size.
+size_t UnclosedQuote(const char* s, size_t size) {
+    size_t open = size;
+    const bool unclosed = ForEachOutsideStrings(s, size, [&](size_t i, char c) {
+        if (c == '"') open = i;
+    });
+    return unclosed ? open : size;
 }
 
 }  // namespace
@@ -277,6 +288,22 @@ const char* SyntaxReason(simdjson::error_code error) {
 bool IsSyntaxError(simdjson::error_code error) {
     return error != simdjson::SUCCESS && error != simdjson::INCORRECT_TYPE &&
            error != simdjson::NUMBER_OUT_OF_RANGE && error != simdjson::NO_SUCH_FIELD;
+}
+
+simdjson::error_code Iterate(simdjson::ondemand::parser& parser, const Input& input,
+                             simdjson::ondemand::document& doc) {
+#if SIMDJSON_DEVELOPMENT_CHECKS
+    size_t depth = 0, deepest = 0;
+    ForEachOutsideStrings(input.data(), input.size(), [&](size_t, char c) {
+        if (c == '{' || c == '[')
+            deepest = std::max(deepest, ++depth);
+        else if ((c == '}' || c == ']') && depth)
+            --depth;
+    });
+    if (deepest >= simdjson::DEFAULT_MAX_DEPTH)
+        if (simdjson::error_code e = parser.allocate(input.size(), deepest + 1)) return e;
+#endif
+    return parser.iterate(input.view()).get(doc);
 }
 
 }  // namespace Ndm_JsonInput

@@ -41,6 +41,13 @@ private:
     size_t size_ = 0;
 };
 
+// Starts iterating the whole input. Builds with simdjson's development checks (unoptimized
+// builds) follow every nesting level up to the parser's depth, 1024 unless told otherwise, and
+// stop at a deeper one: there the parser is first given the input's own depth, so that deep
+// design files read in every build. Other builds follow no depth and skip that pass.
+simdjson::error_code Iterate(simdjson::ondemand::parser& parser, const Input& input,
+                             simdjson::ondemand::document& doc);
+
 // Text of a JSON string from its raw form. Texts without escapes are views into the input;
 // others are decoded into scratch. With bytes set, code points U+F780..U+F7FF, escaped or
 // literal, are the bytes 0x80..0xFF they stand for (host/port/json_text.h). False for a

@@ -1,3 +1,5 @@
+// The native design file, writing side: the design in file order, with its own stacks for the
+// block tree and nested property lists; and the test for the file's marker.
 #include "host/design/native_format.h"
 
 #include <simdjson.h>
@@ -5,7 +7,9 @@
 #include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <span>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "host/design/json_input.h"
@@ -16,16 +20,7 @@
 
 namespace {
 
-namespace od = simdjson::ondemand;
-using simdjson::error_code;
-
 using Ndm_JsonInput::Msg;
-
-constexpr const char kMarker[] = "lun-design";
-constexpr int kVersion = 1;
-
-// ---------------------------------------------------------------------------------------
-// Writing
 
 class Writer {
 public:
@@ -85,17 +80,22 @@ private:
         Properties(view);
         if (view.GetBlock()) {
             buf_ += ",\"top\":\n";
-            Block(*view.GetBlock());
+            Tree(*view.GetBlock());
         }
         buf_ += ",\"networks\":[";
         bool first = true;
         for (const Ndm_Network* net : view.GetNetworkItr()) {
             buf_ += first ? "\n" : ",\n";
             first = false;
-            buf_ += "{\"name\":";
-            Str(net->GetName());
-            Properties(*net);
-            buf_ += ",\"signals\":[";
+            // A network is named after its top signal, found again on reading; its full name
+            // would make the file grow with the square of the hierarchy's depth.
+            buf_ += '{';
+            if (net->GetNumProperties()) {
+                buf_ += "\"properties\":";
+                PropertyList(net->GetPropertyItr());
+                buf_ += ',';
+            }
+            buf_ += "\"signals\":[";
             for (const Ndm_Signal* s = net->GetFirstSignal(); s; s = s->GetNextInNetwork()) {
                 if (s != net->GetFirstSignal()) buf_ += ',';
                 Uint(Ordinal(s) - 1);
@@ -106,7 +106,41 @@ private:
         buf_ += "]}";
     }
 
-    void Block(const Ndm_Block& block) {
+    // The tree below and including root, blocks in preorder, with its own stack (hierarchies
+    // can be very deep).
+    void Tree(const Ndm_Block& root) {
+        struct Frame {
+            const Ndm_Block* block;
+            size_t next = 0;
+        };
+        std::vector<Frame> stack;
+        auto open = [&](const Ndm_Block& block) {
+            BlockHead(block);
+            if (block.GetNumBlocks()) {
+                buf_ += ",\"blocks\":[";
+                stack.push_back({&block});
+            } else {
+                buf_ += '}';
+                Check();
+            }
+        };
+        open(root);
+        while (!stack.empty()) {
+            Frame& frame = stack.back();
+            auto children = frame.block->GetBlockItr();
+            if (frame.next == children.size()) {
+                buf_ += "]}";
+                Check();
+                stack.pop_back();
+                continue;
+            }
+            buf_ += frame.next ? ",\n" : "\n";
+            open(*children[frame.next++]);  // frame is not used after this
+        }
+    }
+
+    // A block's members up to its children.
+    void BlockHead(const Ndm_Block& block) {
         buf_ += "{\"name\":";
         Str(block.GetName());
         if (*block.GetTypeName()) {
@@ -152,18 +186,6 @@ private:
             }
             buf_ += ']';
         }
-        if (block.GetNumBlocks()) {
-            buf_ += ",\"blocks\":[";
-            bool first = true;
-            for (const Ndm_Block* child : block.GetBlockItr()) {
-                buf_ += first ? "\n" : ",\n";
-                first = false;
-                Block(*child);
-            }
-            buf_ += ']';
-        }
-        buf_ += '}';
-        Check();
     }
 
     // 1 + the signal's number, or 0 for a signal outside the written tree.
@@ -177,12 +199,20 @@ private:
         PropertyList(holder.GetPropertyItr());
     }
 
+    // Lists may nest as deeply as a file made them: the writer keeps its own stack.
     void PropertyList(std::span<Ndm_Property* const> props) {
+        std::vector<std::pair<std::span<Ndm_Property* const>, size_t>>& stack = lists_;
+        stack.assign(1, {props, 0});
         buf_ += '[';
-        bool first = true;
-        for (const Ndm_Property* p : props) {
-            if (!first) buf_ += ',';
-            first = false;
+        while (!stack.empty()) {
+            auto& [list, next] = stack.back();
+            if (next == list.size()) {
+                stack.pop_back();
+                buf_ += stack.empty() ? "]" : "]}";
+                continue;
+            }
+            const Ndm_Property* p = list[next++];
+            if (next > 1) buf_ += ',';
             buf_ += "{\"name\":";
             Str(p->GetName());
             buf_ += ",\"type\":\"";
@@ -204,12 +234,15 @@ private:
                     buf_ += ']';
                     break;
                 }
-                case NDM_PROP_LIST: PropertyList(p->GetListItr()); break;
+                case NDM_PROP_LIST:
+                    buf_ += '[';
+                    stack.emplace_back(p->GetListItr(), 0);  // list and next are not used after this
+                    continue;
                 default: buf_ += p->GetBool() ? "true" : "false"; break;
             }
             buf_ += '}';
+            Check();
         }
-        buf_ += ']';
     }
 
     void Float(double v) {
@@ -259,386 +292,9 @@ private:
     Port::AtomicFile file_;
     std::string buf_;
     Ndm_PtrMap ordinal_;  // signal -> 1 + its number
+    std::vector<std::pair<std::span<Ndm_Property* const>, size_t>> lists_;  // open property lists
     bool ok_ = true;
     std::string why_;
-};
-
-// ---------------------------------------------------------------------------------------
-// Reading
-
-class Reader {
-public:
-    Reader(const char* path, Ndm_Design& design) : path_(path), design_(design) {}
-
-    bool Read() {
-        std::string why;
-        if (!buf_.Open(path_, why))
-            return Error(Port_Format("Cannot read design file '%s': %s.", path_, why.c_str()));
-        if (error_code e = parser_.iterate(buf_.view()).get(doc_))
-            return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
-        od::object root;
-        od::json_type type;
-        if (error_code e = doc_.type().get(type)) return SyntaxError(e, Where());
-        if (error_code e = doc_.get_object().get(root)) return JsonError(e, "the file must hold a JSON object");
-        bool marked = false;
-        for (auto item : root) {
-            od::field field;
-            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member");
-            od::raw_json_string key = field.key();
-            if (key == "format") {
-                std::string_view text;
-                if (!String(field.value(), text, "\"format\"")) return false;
-                if (text != kMarker) return Shape("\"format\" must be \"lun-design\"");
-                marked = true;
-            } else if (!marked) {
-                return Error(Port_Format("'%s' is not a design file: it does not start with the "
-                                         "\"format\": \"lun-design\" marker.",
-                                         path_));
-            } else if (key == "version") {
-                int64_t version;
-                if (error_code e = field.value().get_int64().get(version))
-                    return JsonError(e, "\"version\" must be an integer");
-                if (version != kVersion)
-                    return Error(Port_Format("Design file '%s' has version %lld; this program reads version %d.",
-                                             path_, static_cast<long long>(version), kVersion));
-            } else if (key == "name") {
-                std::string_view text;
-                if (!String(field.value(), text, "\"name\"")) return false;
-                design_.SetName(text);
-            } else if (key == "properties") {
-                if (!Properties(field.value(), design_)) return false;
-            } else if (key == "views") {
-                od::array views;
-                if (error_code e = field.value().get_array().get(views))
-                    return JsonError(e, "\"views\" must be an array");
-                for (auto vitem : views) {
-                    od::value view;
-                    if (error_code e = std::move(vitem).get(view)) return JsonError(e, "bad view");
-                    if (!View(view)) return false;
-                }
-            }
-        }
-        if (doc_.current_location().error() != simdjson::OUT_OF_BOUNDS)
-            return SyntaxError(simdjson::TRAILING_CONTENT, Where());
-        if (!marked)
-            return Error(Port_Format("'%s' is not a design file: it has no \"format\": \"lun-design\" marker.",
-                                     path_));
-        // Pins that named signals further down the file.
-        for (const auto& [pin, n] : pending_) {
-            if (n >= signals_.size())
-                return Error(Port_Format("Design file '%s' is damaged: a pin names signal %llu, but the file "
-                                         "has %zu signals.",
-                                         path_, static_cast<unsigned long long>(n), signals_.size()));
-            pin->SetSignal(signals_[n]);
-        }
-        return true;
-    }
-
-private:
-    bool Error(const std::string& text) {
-        Msg().issueError("%s", text.c_str());
-        return false;
-    }
-    size_t Where() { return Ndm_JsonInput::Offset(doc_, buf_); }
-    bool SyntaxError(error_code e, size_t offset) {
-        return Error(Port_Format("'%s' is not valid JSON: %s at byte %zu.", path_, Ndm_JsonInput::SyntaxReason(e),
-                                 offset));
-    }
-    bool Shape(const std::string& what) {
-        return Error(Port_Format("Design file '%s' is damaged: %s (at byte %zu).", path_, what.c_str(), Where()));
-    }
-    bool JsonError(error_code e, const std::string& what) {
-        if (Ndm_JsonInput::IsSyntaxError(e)) return SyntaxError(e, Where());
-        return Shape(what);
-    }
-
-    bool String(od::value value, std::string_view& out, const char* what) {
-        od::raw_json_string raw;
-        if (error_code e = value.get_raw_json_string().get(raw))
-            return JsonError(e, std::string(what) + " must be a string");
-        if (!Ndm_JsonInput::Text(raw, scratch_, out, true)) return SyntaxError(simdjson::STRING_ERROR, Where());
-        return true;
-    }
-
-    // Interned, terminated copy of a string value.
-    bool Name(od::value value, const char*& out, const char* what) {
-        std::string_view text;
-        if (!String(value, text, what)) return false;
-        out = design_.Intern(text);
-        return true;
-    }
-
-    bool View(od::value value) {
-        od::object object;
-        if (error_code e = value.get_object().get(object)) return JsonError(e, "a view must be an object");
-        Ndm_View* view = nullptr;
-        for (auto item : object) {
-            od::field field;
-            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad view member");
-            od::raw_json_string key = field.key();
-            if (key == "name") {
-                const char* name;
-                if (!Name(field.value(), name, "view \"name\"")) return false;
-                if (design_.GetViewByName(name)) return Shape(Port_Format("view '%s' appears twice", name));
-                view = design_.CreateView(name);
-                continue;
-            }
-            if (!view) return Shape("a view must start with its \"name\"");
-            if (key == "properties") {
-                if (!Properties(field.value(), *view)) return false;
-            } else if (key == "top") {
-                if (view->GetBlock()) return Shape("a view has two top blocks");
-                if (!Block(field.value(), nullptr, view)) return false;
-            } else if (key == "networks") {
-                od::array nets;
-                if (error_code e = field.value().get_array().get(nets))
-                    return JsonError(e, "\"networks\" must be an array");
-                for (auto nitem : nets) {
-                    od::value net;
-                    if (error_code e = std::move(nitem).get(net)) return JsonError(e, "bad network");
-                    if (!Network(net, *view)) return false;
-                }
-            }
-        }
-        if (!view) return Shape("a view has no \"name\"");
-        return true;
-    }
-
-    bool Block(od::value value, Ndm_Block* parent, Ndm_View* view) {
-        od::object object;
-        if (error_code e = value.get_object().get(object)) return JsonError(e, "a block must be an object");
-        Ndm_Block* block = nullptr;
-        for (auto item : object) {
-            od::field field;
-            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad block member");
-            od::raw_json_string key = field.key();
-            if (key == "name") {
-                const char* name;
-                if (!Name(field.value(), name, "block \"name\"")) return false;
-                if (block) return Shape("a block has two names");
-                block = parent ? parent->CreateBlock(name) : view->CreateTopBlock(name);
-                continue;
-            }
-            if (!block) return Shape("a block must start with its \"name\"");
-            if (key == "type") {
-                const char* type;
-                if (!Name(field.value(), type, "block \"type\"")) return false;
-                block->SetTypeName(type);
-            } else if (key == "properties") {
-                if (!Properties(field.value(), *block)) return false;
-            } else if (key == "signals") {
-                if (!Signals(field.value(), *block)) return false;
-            } else if (key == "pins") {
-                if (!Pins(field.value(), *block)) return false;
-            } else if (key == "blocks") {
-                od::array children;
-                if (error_code e = field.value().get_array().get(children))
-                    return JsonError(e, "\"blocks\" must be an array");
-                for (auto citem : children) {
-                    od::value child;
-                    if (error_code e = std::move(citem).get(child)) return JsonError(e, "bad block");
-                    if (!Block(child, block, view)) return false;
-                }
-            }
-        }
-        if (!block) return Shape("a block has no \"name\"");
-        return true;
-    }
-
-    bool Signals(od::value value, Ndm_Block& block) {
-        od::array array;
-        if (error_code e = value.get_array().get(array)) return JsonError(e, "\"signals\" must be an array");
-        for (auto item : array) {
-            od::object object;
-            if (error_code e = std::move(item).get_object().get(object))
-                return JsonError(e, "a signal must be an object");
-            Ndm_Signal* signal = nullptr;
-            for (auto fitem : object) {
-                od::field field;
-                if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad signal member");
-                od::raw_json_string key = field.key();
-                if (key == "name") {
-                    const char* name;
-                    if (!Name(field.value(), name, "signal \"name\"")) return false;
-                    if (signal) return Shape("a signal has two names");
-                    signal = block.CreateSignal(name);
-                    signals_.push_back(signal);
-                } else if (key == "properties") {
-                    if (!signal) return Shape("a signal must start with its \"name\"");
-                    if (!Properties(field.value(), *signal)) return false;
-                }
-            }
-            if (!signal) return Shape("a signal has no \"name\"");
-        }
-        return true;
-    }
-
-    bool Pins(od::value value, Ndm_Block& block) {
-        od::array array;
-        if (error_code e = value.get_array().get(array)) return JsonError(e, "\"pins\" must be an array");
-        for (auto item : array) {
-            od::object object;
-            if (error_code e = std::move(item).get_object().get(object)) return JsonError(e, "a pin must be an object");
-            Ndm_Pin* pin = nullptr;
-            const char* name = nullptr;
-            Ndm_Dir dir = Ndm_Dir::None;
-            auto make = [&] {
-                if (!pin) pin = block.CreatePin(name, dir);
-            };
-            for (auto fitem : object) {
-                od::field field;
-                if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad pin member");
-                od::raw_json_string key = field.key();
-                if (key == "name") {
-                    if (name) return Shape("a pin has two names");
-                    if (!Name(field.value(), name, "pin \"name\"")) return false;
-                    continue;
-                }
-                if (!name) return Shape("a pin must start with its \"name\"");
-                if (key == "dir") {
-                    if (pin) return Shape("a pin's \"dir\" must come right after its name");
-                    std::string_view text;
-                    if (!String(field.value(), text, "pin \"dir\"")) return false;
-                    if (!Ndm_DirFromName(text, dir))
-                        return Shape("pin \"dir\" must be \"input\", \"output\" or \"inout\"");
-                } else if (key == "signal") {
-                    uint64_t n;
-                    if (error_code e = field.value().get_uint64().get(n))
-                        return JsonError(e, "pin \"signal\" must be a signal number");
-                    make();
-                    if (n < signals_.size())
-                        pin->SetSignal(signals_[n]);
-                    else
-                        pending_.emplace_back(pin, n);
-                } else if (key == "properties") {
-                    make();
-                    if (!Properties(field.value(), *pin)) return false;
-                }
-            }
-            if (!name) return Shape("a pin has no \"name\"");
-            make();
-        }
-        return true;
-    }
-
-    bool Network(od::value value, Ndm_View& view) {
-        od::object object;
-        if (error_code e = value.get_object().get(object)) return JsonError(e, "a network must be an object");
-        Ndm_Network* net = view.CreateNetwork();
-        for (auto item : object) {
-            od::field field;
-            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad network member");
-            od::raw_json_string key = field.key();
-            if (key == "properties") {
-                if (!Properties(field.value(), *net)) return false;
-            } else if (key == "signals") {
-                od::array array;
-                if (error_code e = field.value().get_array().get(array))
-                    return JsonError(e, "network \"signals\" must be an array");
-                for (auto sitem : array) {
-                    uint64_t n;
-                    if (error_code e = std::move(sitem).get_uint64().get(n))
-                        return JsonError(e, "network \"signals\" must hold signal numbers");
-                    if (n >= signals_.size()) return Shape(Port_Format("a network names unknown signal %llu",
-                                                                       static_cast<unsigned long long>(n)));
-                    if (signals_[n]->GetNetwork())
-                        return Shape(Port_Format("signal %llu is in two networks", static_cast<unsigned long long>(n)));
-                    net->AddSignal(signals_[n]);
-                }
-            }
-        }
-        return true;
-    }
-
-    // Holder is a design object or a list property; both create properties the same way.
-    template <class Holder>
-    bool Properties(od::value value, Holder& holder) {
-        od::array array;
-        if (error_code e = value.get_array().get(array)) return JsonError(e, "\"properties\" must be an array");
-        for (auto item : array) {
-            od::object object;
-            if (error_code e = std::move(item).get_object().get(object))
-                return JsonError(e, "a property must be an object");
-            std::string_view text;
-            od::value v;
-            if (error_code e = object.find_field("name").get(v)) return JsonError(e, "a property needs a \"name\"");
-            if (!String(v, text, "property \"name\"")) return false;
-            std::string name(text);
-            if (error_code e = object.find_field("type").get(v))
-                return JsonError(e, "property \"name\" must be followed by \"type\"");
-            if (!String(v, text, "property \"type\"")) return false;
-            std::string type(text);
-            if (error_code e = object.find_field("value").get(v))
-                return JsonError(e, "property \"type\" must be followed by \"value\"");
-            if (!Value(v, holder, name.c_str(), type)) return false;
-        }
-        return true;
-    }
-
-    template <class Holder>
-    bool Value(od::value v, Holder& holder, const char* name, const std::string& type) {
-        if (type == "bool") {
-            bool b;
-            if (error_code e = v.get_bool().get(b)) return JsonError(e, "a bool property needs true or false");
-            holder.CreatePropertyBool(name, b);
-        } else if (type == "int32") {
-            int64_t n;
-            if (error_code e = v.get_int64().get(n)) return JsonError(e, "an int32 property needs an integer");
-            if (n < INT32_MIN || n > INT32_MAX) return Shape("an int32 property is out of range");
-            holder.CreatePropertyInt32(name, static_cast<int32_t>(n));
-        } else if (type == "float64") {
-            double d;
-            od::json_type t;
-            if (error_code e = v.type().get(t)) return JsonError(e, "bad float64 property");
-            if (t == od::json_type::string) {
-                std::string_view text;
-                if (!String(v, text, "float64 property")) return false;
-                if (text == "inf")
-                    d = HUGE_VAL;
-                else if (text == "-inf")
-                    d = -HUGE_VAL;
-                else if (text == "nan")
-                    d = std::nan("");
-                else if (text == "-nan")
-                    d = -std::nan("");
-                else
-                    return Shape("a float64 property needs a number, \"inf\", \"-inf\" or \"nan\"");
-            } else if (error_code e = v.get_double().get(d)) {
-                return JsonError(e, "a float64 property needs a number");
-            }
-            holder.CreatePropertyFloat64(name, d);
-        } else if (type == "string") {
-            std::string_view text;
-            if (!String(v, text, "string property")) return false;
-            holder.CreatePropertyString(name, std::string(text).c_str());
-        } else if (type == "string_list") {
-            od::array array;
-            if (error_code e = v.get_array().get(array)) return JsonError(e, "a string_list property needs an array");
-            Ndm_Property* p = holder.CreatePropertyStringList(name);
-            for (auto item : array) {
-                od::value s;
-                std::string_view text;
-                if (error_code e = std::move(item).get(s)) return JsonError(e, "bad string_list entry");
-                if (!String(s, text, "string_list entry")) return false;
-                p->AddString(std::string(text).c_str());
-            }
-        } else if (type == "list") {
-            Ndm_Property* p = holder.CreatePropertyList(name);
-            if (!Properties(v, *p)) return false;
-        } else {
-            return Shape(Port_Format("unknown property type '%s'", type.c_str()));
-        }
-        return true;
-    }
-
-    const char* path_;
-    Ndm_Design& design_;
-    Ndm_JsonInput::Input buf_;
-    od::parser parser_;
-    od::document doc_;
-    std::string scratch_;
-    std::vector<Ndm_Signal*> signals_;  // by number
-    std::vector<std::pair<Ndm_Pin*, uint64_t>> pending_;
 };
 
 }  // namespace
@@ -647,14 +303,6 @@ bool Ndm_WriteNative(const Ndm_Design& design, const char* path) {
     if (!path) return false;
     Writer writer(design, path);
     return writer.Write();
-}
-
-std::unique_ptr<Ndm_Design> Ndm_ReadNative(const char* path) {
-    if (!path) return nullptr;
-    auto design = std::make_unique<Ndm_Design>("");
-    Reader reader(path, *design);
-    if (!reader.Read()) return nullptr;
-    return design;
 }
 
 bool Ndm_IsNativeText(const char* text, size_t size) {

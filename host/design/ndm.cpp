@@ -73,12 +73,6 @@ bool HasPrefix(const char* name, std::string_view prefix, bool fold) {
     return true;
 }
 
-int Depth(const Ndm_Block* block) {
-    int d = 0;
-    for (const Ndm_Block* b = block; b && b->GetParent(); b = b->GetParent()) ++d;
-    return d;
-}
-
 }  // namespace
 
 // Per-block hash indexes of members by exact and by case-folded interned name. Name-sorted
@@ -236,7 +230,11 @@ Ndm_Network* Ndm_Pin::GetNetwork() const { return signal_ ? signal_->GetNetwork(
 // ---- blocks ----
 
 Ndm_Block::Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* view)
-    : Ndm_PropertyHolder(Ndm_ObjKind::Block), name_(name), parent_(parent), view_(view) {}
+    : Ndm_PropertyHolder(Ndm_ObjKind::Block),
+      depth_(parent ? parent->depth_ + 1 : 0),
+      name_(name),
+      parent_(parent),
+      view_(view) {}
 
 Ndm_Block::~Ndm_Block() = default;
 
@@ -287,22 +285,46 @@ void Ndm_Block::Reserve(size_t blocks, size_t signals, size_t pins) {
     if (pins) pins_.reserve(pins_.size() + pins);
 }
 
+// The subtree is taken apart with a work list (hierarchies can be very deep). Its signals leave
+// their networks in one pass over each network touched, and emptied networks leave the view
+// in one pass, so deleting a large subtree stays linear.
 void Ndm_Block::Release() {
-    for (Ndm_Block* child : blocks_) child->Release();
-    for (Ndm_Signal* signal : signals_) {
-        if (signal->network_) signal->network_->Remove(signal);
-        signal->DeleteAllProperties();
+    std::vector<Ndm_Network*> touched;
+    Ndm_PtrMap seen;  // touched networks
+    std::vector<Ndm_Block*> work{this};
+    while (!work.empty()) {
+        Ndm_Block* b = work.back();
+        work.pop_back();
+        work.insert(work.end(), b->blocks_.begin(), b->blocks_.end());
+        for (Ndm_Signal* signal : b->signals_) {
+            if (Ndm_Network* net = signal->network_) {
+                if (!seen.Find(net)) {
+                    seen.InsertIfAbsent(net, net);
+                    touched.push_back(net);
+                }
+                signal->network_ = nullptr;
+            }
+            signal->DeleteAllProperties();
+        }
+        for (Ndm_Pin* pin : b->pins_) pin->DeleteAllProperties();
+        b->blocks_.clear();
+        b->blocks_.shrink_to_fit();
+        b->signals_.clear();
+        b->signals_.shrink_to_fit();
+        b->pins_.clear();
+        b->pins_.shrink_to_fit();
+        b->index_.reset();
+        b->DeleteAllProperties();
+        b->parent_ = nullptr;
     }
-    for (Ndm_Pin* pin : pins_) pin->DeleteAllProperties();
-    blocks_.clear();
-    blocks_.shrink_to_fit();
-    signals_.clear();
-    signals_.shrink_to_fit();
-    pins_.clear();
-    pins_.shrink_to_fit();
-    index_.reset();
-    DeleteAllProperties();
-    parent_ = nullptr;
+    Ndm_PtrMap emptied;
+    bool any = false;
+    for (Ndm_Network* net : touched) {
+        if (net->Prune()) continue;
+        emptied.InsertIfAbsent(net, net);
+        any = true;
+    }
+    if (any) std::erase_if(view_->networks_, [&](const Ndm_Network* net) { return emptied.Find(net) != nullptr; });
 }
 
 bool Ndm_Block::DeleteBlock(Ndm_Block* child) {
@@ -448,6 +470,14 @@ size_t Ndm_Block::GetMaxBlockNameLength() const {
 
 // ---- networks ----
 
+const char* Ndm_Network::GetName() const {
+    if (!top_) return "";
+    if (!name_) name_ = view_->GetDesign()->Intern(top_->GetFullName());
+    return name_;
+}
+
+std::string Ndm_Network::GetFullName() const { return top_ ? top_->GetFullName() : std::string(); }
+
 void Ndm_Network::AddSignal(Ndm_Signal* signal) {
     if (!signal || signal->network_) return;
     signal->network_ = this;
@@ -458,43 +488,34 @@ void Ndm_Network::AddSignal(Ndm_Signal* signal) {
         first_ = signal;
     last_ = signal;
     ++count_;
-    int depth = Depth(signal->GetBlock());
-    if (!top_ || depth < top_depth_) {
+    if (!top_ || signal->GetBlock()->GetDepth() < top_->GetBlock()->GetDepth()) {
         top_ = signal;
-        top_depth_ = depth;
-        name_ = view_->GetDesign()->Intern(signal->GetFullName());
-        view_->DropNetworkIndex();
+        name_ = nullptr;
     }
 }
 
-void Ndm_Network::Remove(Ndm_Signal* signal) {
+bool Ndm_Network::Prune() {
     Ndm_Signal* prev = nullptr;
-    for (Ndm_Signal* s = first_; s; prev = s, s = s->next_in_network_) {
-        if (s != signal) continue;
-        (prev ? prev->next_in_network_ : first_) = s->next_in_network_;
-        if (last_ == s) last_ = prev;
-        --count_;
-        break;
-    }
-    signal->network_ = nullptr;
-    signal->next_in_network_ = nullptr;
-    if (top_ != signal) return;
-    view_->DropNetworkIndex();
-    top_ = nullptr;
-    name_ = "";
-    for (Ndm_Signal* s = first_; s; s = s->next_in_network_) {
-        int depth = Depth(s->GetBlock());
-        if (!top_ || depth < top_depth_) {
-            top_ = s;
-            top_depth_ = depth;
+    count_ = 0;
+    for (Ndm_Signal* s = first_; s;) {
+        Ndm_Signal* next = s->next_in_network_;
+        if (s->network_ == this) {
+            (prev ? prev->next_in_network_ : first_) = s;
+            prev = s;
+            ++count_;
+        } else {
+            s->next_in_network_ = nullptr;
         }
+        s = next;
     }
-    if (top_) {
-        name_ = view_->GetDesign()->Intern(top_->GetFullName());
-    } else {
-        auto& nets = view_->networks_;
-        nets.erase(std::find(nets.begin(), nets.end(), this));
-    }
+    (prev ? prev->next_in_network_ : first_) = nullptr;
+    last_ = prev;
+    if (top_ && top_->network_ == this) return true;
+    top_ = nullptr;
+    name_ = nullptr;
+    for (Ndm_Signal* s = first_; s; s = s->next_in_network_)
+        if (!top_ || s->GetBlock()->GetDepth() < top_->GetBlock()->GetDepth()) top_ = s;
+    return top_ != nullptr;
 }
 
 // ---- views and design ----
@@ -509,31 +530,7 @@ Ndm_Network* Ndm_View::CreateNetwork() {
     Ndm_Network* net = &design_->network_pool_.emplace_back(Ndm_Token(), this);
     net->order_ = networks_.empty() ? 0 : networks_.back()->order_ + 1;
     networks_.push_back(net);
-    DropNetworkIndex();
     return net;
-}
-
-void Ndm_View::GetNetworksByPrefix(std::string_view prefix, bool ignore_case,
-                                   std::vector<Ndm_Network*>& out) const {
-    if (prefix.empty()) {
-        out.insert(out.end(), networks_.begin(), networks_.end());
-        return;
-    }
-    std::unique_ptr<std::vector<Ndm_Network*>>& list = by_name_[ignore_case ? 1 : 0];
-    if (!list) {
-        list = std::make_unique<std::vector<Ndm_Network*>>(networks_);
-        std::stable_sort(list->begin(), list->end(), [&](const Ndm_Network* a, const Ndm_Network* b) {
-            return CompareName(a->name_, b->name_, ignore_case) < 0;
-        });
-    }
-    auto at = std::lower_bound(list->begin(), list->end(), prefix,
-                               [&](const Ndm_Network* net, std::string_view key) {
-                                   return CompareName(net->name_, key, ignore_case) < 0;
-                               });
-    const size_t start = out.size();
-    for (; at != list->end() && HasPrefix((*at)->name_, prefix, ignore_case); ++at) out.push_back(*at);
-    std::sort(out.begin() + static_cast<std::ptrdiff_t>(start), out.end(),
-              [](const Ndm_Network* a, const Ndm_Network* b) { return a->order_ < b->order_; });
 }
 
 Ndm_Design::Ndm_Design(const char* name)

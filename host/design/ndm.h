@@ -101,6 +101,8 @@ public:
     const char* GetName() const { return name_; }
     // Stored-order key among the children of the parent: a later child has a larger key.
     uint32_t GetOrder() const { return order_; }
+    // Levels below the top block (0 for the top block), kept with the block.
+    uint32_t GetDepth() const { return depth_; }
     // Names from below the top block joined by "/"; empty for the top block.
     std::string GetFullName() const;
     // Appends the full name to out (no allocation when out has room).
@@ -167,6 +169,7 @@ private:
     void Release();  // drops members and properties of a deleted subtree
 
     uint32_t order_ = 0;  // fits in the base's tail padding
+    uint32_t depth_;
     const char* name_;
     const char* type_ = "";
     Ndm_Block* parent_;
@@ -181,9 +184,16 @@ class Ndm_Network : public Ndm_PropertyHolder {
 public:
     Ndm_Network(Ndm_Token, Ndm_View* view) : Ndm_PropertyHolder(Ndm_ObjKind::Network), view_(view) {}
     // Full name of the top signal (the highest in the hierarchy; the first of those in
-    // creation order).
-    const char* GetName() const { return name_; }
+    // creation order); "" without signals. A full name is as long as the hierarchy is deep, so
+    // the network keeps only its top signal: the name is made and interned on the first call
+    // (and again after the top signal changed). Walks over every network use GetFullName,
+    // which keeps nothing.
+    const char* GetName() const;
+    // The same name, made anew.
+    std::string GetFullName() const;
     Ndm_Signal* GetTopSignal() const { return top_; }
+    // Creation-order key among the networks of the view: a later network has a larger key.
+    uint32_t GetOrder() const { return order_; }
     // Signals of the network in the order they were added.
     Ndm_Signal* GetFirstSignal() const { return first_; }
     int GetNumSignals() const { return count_; }
@@ -195,16 +205,17 @@ public:
 private:
     friend class Ndm_View;
     friend class Ndm_Block;
-    void Remove(Ndm_Signal* signal);
+    // Drops the signals whose network was cleared (a deleted subtree's) from the member list
+    // and names the network after the highest signal left; false when none is left.
+    bool Prune();
 
     uint32_t order_ = 0;  // network-order key; fits in the base's tail padding
     Ndm_View* view_;
-    const char* name_ = "";
+    mutable const char* name_ = nullptr;  // interned full name of top_, made on request
     Ndm_Signal* top_ = nullptr;
     Ndm_Signal* first_ = nullptr;
     Ndm_Signal* last_ = nullptr;
     int count_ = 0;
-    int top_depth_ = 0;
 };
 
 class Ndm_View : public Ndm_PropertyHolder {
@@ -222,25 +233,16 @@ public:
     int GetNumNetworks() const { return static_cast<int>(networks_.size()); }
     // A new, empty network.
     Ndm_Network* CreateNetwork();
-    // Appends the networks whose name starts with prefix (exactly, or ignoring ASCII case), in
-    // network order. A name-sorted list is made on first use and dropped when networks change.
-    void GetNetworksByPrefix(std::string_view prefix, bool ignore_case,
-                             std::vector<Ndm_Network*>& out) const;
 
 private:
     friend class Ndm_Design;
     friend class Ndm_Block;
     friend class Ndm_Network;
-    void DropNetworkIndex() {
-        by_name_[0].reset();
-        by_name_[1].reset();
-    }
 
     const char* name_;
     Ndm_Design* design_;
     Ndm_Block* top_ = nullptr;
     std::vector<Ndm_Network*> networks_;
-    mutable std::unique_ptr<std::vector<Ndm_Network*>> by_name_[2];  // [ignore case]
 };
 
 class Ndm_Design : public Ndm_PropertyHolder {

@@ -208,6 +208,41 @@ void Walk(Ndm_Block* root, std::string_view lit, bool fold, Visit&& visit) {
     }
 }
 
+// Calls take(signal, full name) for every signal below and including root that keep accepts
+// and whose full name matches pattern, blocks in pre-order, signals in stored order.
+template <class Keep, class Take>
+void ForEachMatchingSignal(Ndm_Block* root, const char* pattern, bool fold, Keep&& keep, Take&& take) {
+    const std::string_view lit = LiteralPrefix(pattern);
+    std::vector<Ndm_Signal*> picked;
+    std::string full;
+    Walk(root, lit, fold, [&](Ndm_Block* b, const std::string& block_name) {
+        if (b->GetNumSignals() == 0) return true;
+        // A signal's full name is its block's full name, "/", its name (just its name when the
+        // block's full name is empty).
+        full = block_name;
+        if (!full.empty()) full += '/';
+        const size_t base_len = full.size();
+        std::string_view rem;
+        std::span<Ndm_Signal* const> signals;
+        switch (Relate(full, lit, fold, &rem)) {
+            case Reach::None: return true;
+            case Reach::All: signals = b->GetSignalItr(); break;
+            case Reach::Some:
+                picked.clear();
+                b->GetSignalsByPrefix(rem, fold, picked);
+                signals = picked;
+                break;
+        }
+        for (Ndm_Signal* sig : signals) {
+            if (!keep(sig)) continue;
+            full.resize(base_len);
+            full += sig->GetName();
+            if (Matches(full.c_str(), pattern, fold)) take(sig, std::as_const(full));
+        }
+        return true;
+    });
+}
+
 bool IsWildcard(const char* name) { return std::strchr(name, '*') || std::strchr(name, '?'); }
 
 // A modifiable copy of a name for the lookups that rewrite it.
@@ -343,19 +378,24 @@ void FindPins(Ndm_Block* block, std::vector<Ndm_Pin*>& out, const char* inst_pat
     });
 }
 
+// A network's name is its top signal's full name, so the networks whose name matches are
+// those whose top signal's full name matches: the walk below the top block finds them without
+// making the name of every network. They are handed out in network order.
 void FindNetSignals(Ndm_View* view, std::vector<Ndm_Signal*>& out, const char* pattern, bool exact,
                     Ndm_LookupReport& report) {
-    if (!view || !pattern) return;
+    if (!view || !view->GetBlock() || !pattern) return;
     const bool fold = !exact;
-    // Only networks whose name starts with the literal prefix can match; the view hands them
-    // out in network order.
-    std::vector<Ndm_Network*> nets;
-    view->GetNetworksByPrefix(LiteralPrefix(pattern), fold, nets);
-    for (Ndm_Network* net : nets) {
-        const char* name = net->GetName();
-        if (!Matches(name, pattern, fold)) continue;
-        if (fold) report.Signal(pattern, name);
-        out.push_back(net->GetTopSignal());
+    std::vector<std::pair<Ndm_Signal*, std::string>> found;
+    ForEachMatchingSignal(
+        view->GetBlock(), pattern, fold,
+        [](const Ndm_Signal* sig) { return sig->GetNetwork() && sig->GetNetwork()->GetTopSignal() == sig; },
+        [&](Ndm_Signal* sig, const std::string& full) { found.emplace_back(sig, fold ? full : std::string()); });
+    std::stable_sort(found.begin(), found.end(), [](const auto& a, const auto& b) {
+        return a.first->GetNetwork()->GetOrder() < b.first->GetNetwork()->GetOrder();
+    });
+    for (const auto& [sig, full] : found) {
+        if (fold) report.Signal(pattern, full);
+        out.push_back(sig);
     }
 }
 
@@ -363,36 +403,12 @@ void FindSignals(Ndm_Block* block, std::vector<Ndm_Signal*>& out, const char* pa
                  Ndm_LookupReport& report) {
     if (!block || !pattern) return;
     const bool fold = !exact;
-    const std::string_view lit = LiteralPrefix(pattern);
-    std::vector<Ndm_Signal*> picked;
-    std::string full;
-    Walk(block, lit, fold, [&](Ndm_Block* b, const std::string& block_name) {
-        if (b->GetNumSignals() == 0) return true;
-        // A signal's full name is its block's full name, "/", its name (just its name when the
-        // block's full name is empty).
-        full = block_name;
-        if (!full.empty()) full += '/';
-        const size_t base_len = full.size();
-        std::string_view rem;
-        std::span<Ndm_Signal* const> signals;
-        switch (Relate(full, lit, fold, &rem)) {
-            case Reach::None: return true;
-            case Reach::All: signals = b->GetSignalItr(); break;
-            case Reach::Some:
-                picked.clear();
-                b->GetSignalsByPrefix(rem, fold, picked);
-                signals = picked;
-                break;
-        }
-        for (Ndm_Signal* sig : signals) {
-            full.resize(base_len);
-            full += sig->GetName();
-            if (!Matches(full.c_str(), pattern, fold)) continue;
+    ForEachMatchingSignal(
+        block, pattern, fold, [](const Ndm_Signal*) { return true; },
+        [&](Ndm_Signal* sig, const std::string& full) {
             out.push_back(sig);
             if (fold) report.Signal(pattern, full);
-        }
-        return true;
-    });
+        });
 }
 
 void FindRamBlocks(Ndm_Block* block, std::vector<Ndm_Block*>& out) {

@@ -27,9 +27,21 @@ Ndm_Property* Set(Ndm_Property* p, const char* v) { return p ? (p->SetValueStrin
 Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name)
     : owner_(owner), type_(type), name_(name ? name : "") {}
 
+// Lists may nest as deeply as a file makes them: entries are freed from a work list, each
+// after its own entries were taken out, so no destructor recurses.
 Ndm_Property::~Ndm_Property() {
-    if (list_)
-        for (Ndm_Property* e : list_->entries) delete e;
+    if (!list_) return;
+    std::vector<Ndm_Property*> work;
+    work.swap(list_->entries);
+    while (!work.empty()) {
+        Ndm_Property* p = work.back();
+        work.pop_back();
+        if (p->list_) {
+            work.insert(work.end(), p->list_->entries.begin(), p->list_->entries.end());
+            p->list_->entries.clear();
+        }
+        delete p;
+    }
 }
 
 bool Ndm_Property::AddString(const char* text) {
@@ -119,6 +131,7 @@ std::string Ndm_PropertyHolder::GetFullName() const {
         case Ndm_ObjKind::Block: return static_cast<const Ndm_Block*>(this)->GetFullName();
         case Ndm_ObjKind::Signal: return static_cast<const Ndm_Signal*>(this)->GetFullName();
         case Ndm_ObjKind::Pin: return static_cast<const Ndm_Pin*>(this)->GetFullName();
+        case Ndm_ObjKind::Network: return static_cast<const Ndm_Network*>(this)->GetFullName();
         default: return GetName();
     }
 }

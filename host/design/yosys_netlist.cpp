@@ -90,24 +90,84 @@ bool Reader::ChooseTop(const char* top_module, uint32_t& top) {
                              path_, NameList(free).c_str()));
 }
 
-bool Reader::CheckCycles(uint32_t module, std::vector<uint32_t>& stack) {
-    Module& m = modules_[module];
-    if (m.state == 2) return true;
-    stack.push_back(module);
-    if (m.state == 1) {
-        auto first = std::find(stack.begin(), stack.end(), module);
-        std::string chain;
-        for (auto it = first; it != stack.end(); ++it) {
-            if (!chain.empty()) chain += " -> ";
-            chain += modules_[*it].name;
+// Depth-first over the instantiations from the top module, with its own stack (a netlist may
+// nest tens of thousands of levels); each module is counted (Count) once all it instantiates
+// has been.
+bool Reader::CheckCycles(uint32_t top) {
+    struct Frame {
+        uint32_t module;
+        size_t next_cell = 0;
+    };
+    std::vector<Frame> stack;
+    if (modules_[top].state == 2) return true;
+    modules_[top].state = 1;
+    stack.push_back({top});
+    while (!stack.empty()) {
+        Frame& frame = stack.back();
+        Module& m = modules_[frame.module];
+        if (frame.next_cell == m.cells.size()) {
+            Count(m);
+            m.state = 2;
+            stack.pop_back();
+            continue;
         }
-        return Error(Port_Format("Module '%s' in '%s' instantiates itself: %s.", m.name, path_, chain.c_str()));
+        const int32_t sub = m.cells[frame.next_cell++].sub;
+        if (sub < 0 || modules_[sub].state == 2) continue;
+        if (modules_[sub].state == 1) {
+            auto first = std::find_if(stack.begin(), stack.end(),
+                                      [&](const Frame& f) { return f.module == static_cast<uint32_t>(sub); });
+            std::string chain;
+            for (auto it = first; it != stack.end(); ++it) {
+                chain += modules_[it->module].name;
+                chain += " -> ";
+            }
+            chain += modules_[sub].name;
+            return Error(Port_Format("Module '%s' in '%s' instantiates itself: %s.", modules_[sub].name, path_,
+                                     chain.c_str()));
+        }
+        modules_[sub].state = 1;
+        stack.push_back({static_cast<uint32_t>(sub)});
     }
-    m.state = 1;
-    for (const Cell& cell : m.cells)
-        if (cell.sub >= 0 && !CheckCycles(static_cast<uint32_t>(cell.sub), stack)) return false;
-    m.state = 2;
-    stack.pop_back();
+    return true;
+}
+
+// What one instance of m expands to; the modules it instantiates are counted already.
+void Reader::Count(Module& m) {
+    Expansion& e = m.below;
+    e.bits = m.num_bits;
+    e.signals = m.num_signals;
+    for (const Cell& cell : m.cells) {
+        e.blocks = Expansion::Add(e.blocks, 1);
+        for (uint32_t k = 0; k < cell.num_conns; ++k) e.pins = Expansion::Add(e.pins, m.conns[cell.first_conn + k].bits.count);
+        if (cell.sub < 0) continue;
+        const Expansion& sub = modules_[cell.sub].below;
+        e.blocks = Expansion::Add(e.blocks, sub.blocks);
+        e.bits = Expansion::Add(e.bits, sub.bits);
+        e.signals = Expansion::Add(e.signals, sub.signals);
+        e.pins = Expansion::Add(e.pins, sub.pins);
+    }
+}
+
+// Refuses a netlist whose expansion would pass the instance limit, or the 32-bit counts of bit
+// ids and of signals (and so of networks and their members), before anything is made.
+bool Reader::CheckSize(uint32_t top) {
+    const Module& m = modules_[top];
+    const Expansion& e = m.below;
+    auto count = [](uint64_t n) {
+        return n >= Expansion::kMany ? std::string("more than 4611686018427387904") : std::to_string(n);
+    };
+    const uint64_t blocks = Expansion::Add(e.blocks, 1);
+    if (blocks > max_cells_)
+        return Error(Port_Format("Netlist '%s' expands to %s instances below top module '%s', more than the limit of "
+                                 "%llu. Raise the limit (LUN_MAX_CELLS, or quillmap --max-cells) if the machine has "
+                                 "the memory for that many.",
+                                 path_, count(blocks).c_str(), m.name, static_cast<unsigned long long>(max_cells_)));
+    constexpr uint64_t kMaxCount = INT32_MAX;
+    for (auto [n, what] : {std::pair{e.bits, "bits"}, std::pair{e.signals, "signals"}, std::pair{e.pins, "pins"}})
+        if (n > kMaxCount)
+            return Error(Port_Format("Netlist '%s' expands to %s %s below top module '%s', more than the %llu one "
+                                     "design can hold.",
+                                     path_, count(n).c_str(), what, m.name, static_cast<unsigned long long>(kMaxCount)));
     return true;
 }
 
@@ -161,51 +221,79 @@ void Reader::Union(uint32_t a, uint32_t b) {
         parent_[a] = b;
 }
 
-bool Reader::Expand(Ndm_Block* block, uint32_t module, uint32_t base) {
-    Module& m = modules_[module];
-    instances_.push_back({block, module, base});
-    block->Reserve(m.cells.size(), m.num_signals, 0);
-    for (const Net& net : m.nets)
-        for (uint32_t i = 0; i < net.bits.count; ++i)
-            block->CreateSignal(BitName(net.name, net.bits.count, net.offset, net.upto, i));
-    std::span<Ndm_Signal* const> signals = block->GetSignalItr();
-
-    for (const Cell& cell : m.cells) {
-        Ndm_Block* child = block->CreateBlock(cell.name);
-        child->SetTypeName(cell.type);
-        Module* sub = cell.sub >= 0 ? &modules_[cell.sub] : nullptr;
-        uint32_t num_pins = 0;
-        for (uint32_t k = 0; k < cell.num_conns; ++k) num_pins += m.conns[cell.first_conn + k].bits.count;
-        child->Reserve(0, 0, num_pins);
-        for (uint32_t k = 0; k < cell.num_conns; ++k) {
-            const Conn& conn = m.conns[cell.first_conn + k];
-            const Port* port = nullptr;
-            if (sub && !(port = FindPort(*sub, conn.name)))
-                return Error(Port_Format("Cell '%s' in module '%s' of '%s' connects port '%s', which module "
-                                         "'%s' does not have.",
-                                         cell.name, m.name, path_, conn.name, sub->name));
-            Ndm_Dir dir = port ? port->dir : conn.dir;
-            for (uint32_t i = 0; i < conn.bits.count; ++i) {
-                const char* name = port ? BitName(conn.name, conn.bits.count, port->offset, port->upto, i)
-                                        : BitName(conn.name, conn.bits.count, 0, false, i);
-                Ndm_Pin* pin = child->CreatePin(name, dir);
-                int32_t bit = m.bits[conn.bits.first + i];
-                if (bit >= 0 && m.bit_signal[bit] >= 0) pin->SetSignal(signals[m.bit_signal[bit]]);
-            }
+// Expands module below block: the instances in preorder (each block's signals, then its
+// cells in stored order, an expanded cell's subtree before the next cell), with its own stack
+// (a netlist may nest tens of thousands of levels). Each instance gets its bit ids from Alloc
+// when its cell is met, and the cell's port bits are joined to the parent's bits right away.
+bool Reader::Expand(Ndm_Block* block, uint32_t module) {
+    struct Frame {
+        Ndm_Block* block;
+        uint32_t module;
+        uint32_t base;
+        size_t next_cell = 0;
+    };
+    std::vector<Frame> stack;
+    auto enter = [&](Ndm_Block* b, uint32_t mod, uint32_t base) {
+        const Module& m = modules_[mod];
+        instances_.push_back({b, mod, base});
+        b->Reserve(m.cells.size(), m.num_signals, 0);
+        for (const Net& net : m.nets)
+            for (uint32_t i = 0; i < net.bits.count; ++i)
+                b->CreateSignal(BitName(net.name, net.bits.count, net.offset, net.upto, i));
+        stack.push_back({b, mod, base});
+    };
+    enter(block, module, Alloc(modules_[module].num_bits));
+    while (!stack.empty()) {
+        Frame& frame = stack.back();
+        Module& m = modules_[frame.module];
+        if (frame.next_cell == m.cells.size()) {
+            stack.pop_back();
+            continue;
         }
-        if (!sub) continue;
-        uint32_t child_base = Alloc(sub->num_bits);
-        if (!Expand(child, static_cast<uint32_t>(cell.sub), child_base)) return false;
+        const Cell& cell = m.cells[frame.next_cell++];
+        Ndm_Block* child = frame.block->CreateBlock(cell.name);
+        if (!ExpandCell(child, m, cell)) return false;
+        if (cell.sub < 0) continue;
+        const uint32_t child_base = Alloc(modules_[cell.sub].num_bits);
+        const Module& sub = modules_[cell.sub];
         for (uint32_t k = 0; k < cell.num_conns; ++k) {
             const Conn& conn = m.conns[cell.first_conn + k];
-            const Port* port = FindPort(*sub, conn.name);
+            const Port* port = FindPort(modules_[cell.sub], conn.name);
             uint32_t width = std::min(conn.bits.count, port->bits.count);
             for (uint32_t i = 0; i < width; ++i) {
                 int32_t outer = m.bits[conn.bits.first + i];
-                int32_t inner = sub->bits[port->bits.first + i];
+                int32_t inner = sub.bits[port->bits.first + i];
                 if (outer >= 0 && inner >= 0)
-                    Union(base + static_cast<uint32_t>(outer), child_base + static_cast<uint32_t>(inner));
+                    Union(frame.base + static_cast<uint32_t>(outer), child_base + static_cast<uint32_t>(inner));
             }
+        }
+        enter(child, static_cast<uint32_t>(cell.sub), child_base);  // frame is not used after this
+    }
+    return true;
+}
+
+// The block of one cell of m: its type and its pins on the signals of the parent block.
+bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
+    child->SetTypeName(cell.type);
+    std::span<Ndm_Signal* const> signals = child->GetParent()->GetSignalItr();
+    Module* sub = cell.sub >= 0 ? &modules_[cell.sub] : nullptr;
+    uint32_t num_pins = 0;
+    for (uint32_t k = 0; k < cell.num_conns; ++k) num_pins += m.conns[cell.first_conn + k].bits.count;
+    child->Reserve(0, 0, num_pins);
+    for (uint32_t k = 0; k < cell.num_conns; ++k) {
+        const Conn& conn = m.conns[cell.first_conn + k];
+        const Port* port = nullptr;
+        if (sub && !(port = FindPort(*sub, conn.name)))
+            return Error(Port_Format("Cell '%s' in module '%s' of '%s' connects port '%s', which module "
+                                     "'%s' does not have.",
+                                     cell.name, m.name, path_, conn.name, sub->name));
+        Ndm_Dir dir = port ? port->dir : conn.dir;
+        for (uint32_t i = 0; i < conn.bits.count; ++i) {
+            const char* name = port ? BitName(conn.name, conn.bits.count, port->offset, port->upto, i)
+                                    : BitName(conn.name, conn.bits.count, 0, false, i);
+            Ndm_Pin* pin = child->CreatePin(name, dir);
+            int32_t bit = m.bits[conn.bits.first + i];
+            if (bit >= 0 && m.bit_signal[bit] >= 0) pin->SetSignal(signals[m.bit_signal[bit]]);
         }
     }
     return true;
@@ -346,9 +434,7 @@ void Reader::SignalOrder(Module& m) {
 
 bool Reader::Build(const char* top_module) {
     uint32_t top = 0;
-    if (!ResolveTypes() || !ChooseTop(top_module, top)) return false;
-    std::vector<uint32_t> stack;
-    if (!CheckCycles(top, stack)) return false;
+    if (!ResolveTypes() || !ChooseTop(top_module, top) || !CheckCycles(top) || !CheckSize(top)) return false;
     // The JSON input and the parser's buffers are no longer needed.
     doc_ = od::document();
     parser_ = od::parser();
@@ -360,7 +446,7 @@ bool Reader::Build(const char* top_module) {
     Ndm_Block* block = view->CreateTopBlock(m.name);
     block->SetTypeName(m.name);
     PadBoundary(modules_[top]);
-    if (!Expand(block, top, Alloc(m.num_bits))) return false;
+    if (!Expand(block, top)) return false;
     TopPins(block, top);
     Networks(view);
     return true;

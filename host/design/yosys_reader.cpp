@@ -1,9 +1,13 @@
 #include "host/design/yosys_reader.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <cstdlib>
 #include <cstring>
 
 #include "host/design/yosys_reader_impl.h"
+#include "host/port/env.h"
+#include "host/port/json_text.h"
 #include "host/port/msgman.h"
 
 namespace ndm_yosys {
@@ -71,7 +75,7 @@ bool Reader::Load() {
     std::string why;
     if (!buf_.Open(path_, why))
         return Error(Port_Format("Cannot read netlist file '%s': %s.", path_, why.c_str()));
-    if (error_code e = parser_.iterate(buf_.view()).get(doc_))
+    if (error_code e = Ndm_JsonInput::Iterate(parser_, buf_, doc_))
         return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
     return ParseRoot();
 }
@@ -100,9 +104,11 @@ bool Reader::ParseRoot() {
             if (error_code e = std::move(mitem).get(mfield)) return JsonError(e, "bad module");
             std::string_view name;
             if (!Key(mfield, name)) return false;
+            if (!NameOk(StripEscape(name), nullptr, "module")) continue;
             Module m;
             m.name = design_.Intern(StripEscape(name));
             m.offset = Where();
+            for (Ndm_PtrMap& seen : seen_) seen.Clear();
             module_name_ = m.name;
             if (module_index_.Find(m.name)) return ShapeError(Port_Format("module '%s' is defined twice", m.name));
             od::object object;
@@ -117,8 +123,43 @@ bool Reader::ParseRoot() {
     if (!AtEnd()) return SyntaxError(simdjson::TRAILING_CONTENT, Where());
     if (!seen_modules)
         return Error(Port_Format("'%s' is not a Yosys JSON netlist: it has no \"modules\" object.", path_));
+    if (bad_names_) return false;  // each was reported
     if (modules_.empty()) return Error(Port_Format("Netlist '%s' holds no module.", path_));
     return true;
+}
+
+// A name of the file that a design object will carry (a module, port, cell or net name, or a
+// cell type or connection name with may_be_empty): false, after an error naming the file, the
+// module and the name, when it is empty or holds a NUL byte, which would cut it short wherever
+// names are texts. The caller leaves the object out and reads on, so that one run lists every
+// such name; the netlist is then refused (ParseRoot).
+bool Reader::NameOk(std::string_view name, const Module* m, const char* kind, bool may_be_empty) {
+    const bool empty = name.empty() && !may_be_empty;
+    if (!empty && name.find('\0') == std::string_view::npos) return true;
+    const std::string owner = m ? Port_Format("Module '%s' in '%s'", m->name, path_) : Port_Format("Netlist '%s'", path_);
+    if (empty) {
+        Error(Port_Format("%s has a %s with an empty name (at byte %zu).", owner.c_str(), kind, Where()));
+    } else {
+        std::string shown;
+        Port_AppendJsonString(shown, name);
+        shown = shown.substr(1, shown.size() - 2);
+        Error(Port_Format("%s has a %s named '%s', which holds a NUL character (at byte %zu).", owner.c_str(), kind,
+                          shown.c_str(), Where()));
+    }
+    ++bad_names_;
+    return false;
+}
+
+// False, after an error naming the file, the module and the name, when the module already has
+// an object of that kind and name (interned); the caller leaves the second one out.
+bool Reader::FirstOfName(Ndm_PtrMap& seen, const char* name, const Module& m, const char* kind) {
+    if (!seen.Find(name)) {
+        seen.InsertIfAbsent(name, const_cast<char*>(name));
+        return true;
+    }
+    Error(Port_Format("Module '%s' in '%s' has two %ss named '%s' (at byte %zu).", m.name, path_, kind, name, Where()));
+    ++bad_names_;
+    return false;
 }
 
 bool Reader::ParseModule(od::object object, Module& m) {
@@ -178,8 +219,10 @@ bool Reader::ParsePorts(od::value value, Module& m) {
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad port" + InModule());
         std::string_view name;
         if (!Key(field, name)) return false;
+        if (!NameOk(StripEscape(name), &m, "port")) continue;
         Port port;
         port.name = design_.Intern(StripEscape(name));
+        if (!FirstOfName(seen_[kSeenPorts], port.name, m, "port")) continue;
         auto what = [&] { return Port_Format("port '%s' in module '%s'", port.name, m.name); };
         od::object body;
         if (error_code e = field.value().get_object().get(body)) return JsonError(e, what() + " must be an object");
@@ -218,13 +261,16 @@ bool Reader::ParseCells(od::value value, Module& m) {
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad cell" + InModule());
         std::string_view name;
         if (!Key(field, name)) return false;
+        if (!NameOk(StripEscape(name), &m, "cell")) continue;
         Cell cell;
         cell.name = design_.Intern(StripEscape(name));
+        if (!FirstOfName(seen_[kSeenCells], cell.name, m, "cell")) continue;
         od::object body;
         if (error_code e = field.value().get_object().get(body))
             return JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name));
+        const size_t bad = bad_names_;
         if (!ParseCell(body, m, cell)) return false;
-        m.cells.push_back(cell);
+        if (bad_names_ == bad) m.cells.push_back(cell);
     }
     return true;
 }
@@ -240,6 +286,7 @@ bool Reader::ParseCell(od::object object, Module& m, Cell& cell) {
         if (key == "type") {
             std::string_view type;
             if (!String(field.value(), type, [&] { return "\"type\" of " + what(); })) return false;
+            if (!NameOk(StripEscape(type), &m, "cell type", true)) type = "";
             cell.type = design_.Intern(StripEscape(type));
         } else if (key == "port_directions") {
             od::object dirs;
@@ -250,6 +297,7 @@ bool Reader::ParseCell(od::object object, Module& m, Cell& cell) {
                 if (error_code e = std::move(ditem).get(dfield)) return JsonError(e, "bad port direction of " + what());
                 std::string_view pname;
                 if (!Key(dfield, pname)) return false;
+                if (!NameOk(StripEscape(pname), &m, "port direction", true)) continue;
                 const char* port = design_.Intern(StripEscape(pname));
                 Ndm_Dir dir;
                 if (!Direction(dfield.value(), dir, [&] { return Port_Format("direction of port '%s' of ", port) + what(); }))
@@ -265,8 +313,10 @@ bool Reader::ParseCell(od::object object, Module& m, Cell& cell) {
                 if (error_code e = std::move(citem).get(cfield)) return JsonError(e, "bad connection of " + what());
                 std::string_view pname;
                 if (!Key(cfield, pname)) return false;
+                if (!NameOk(StripEscape(pname), &m, "connection", true)) continue;
                 Conn conn;
                 conn.name = design_.Intern(StripEscape(pname));
+                if (!FirstConnection(m, cell, conn.name)) continue;
                 if (!Bits(cfield.value(), m, conn.bits,
                           [&] { return Port_Format("connection '%s' of ", conn.name) + what(); }))
                     return false;
@@ -302,8 +352,10 @@ bool Reader::ParseNets(od::value value, Module& m) {
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad netname" + InModule());
         std::string_view name;
         if (!Key(field, name)) return false;
+        if (!NameOk(StripEscape(name), &m, "net")) continue;
         Net net;
         net.name = design_.Intern(StripEscape(name));
+        if (!FirstOfName(seen_[kSeenNets], net.name, m, "net")) continue;
         od::object body;
         if (error_code e = field.value().get_object().get(body))
             return JsonError(e, Port_Format("netname '%s' in module '%s' must be an object", net.name, m.name));
@@ -337,6 +389,31 @@ bool Reader::ParseNets(od::value value, Module& m) {
         m.nets.push_back(net);
     }
     return true;
+}
+
+// False, after an error, when the cell being read already connects a port of that name (the
+// second connection is left out). Cells of a few connections are searched directly.
+bool Reader::FirstConnection(const Module& m, const Cell& cell, const char* name) {
+    constexpr size_t kDirect = 8;
+    const size_t count = m.conns.size() - cell.first_conn;
+    bool twice = false;
+    if (count <= kDirect) {
+        for (size_t k = cell.first_conn; k < m.conns.size() && !twice; ++k) twice = m.conns[k].name == name;
+    } else {
+        Ndm_PtrMap& seen = seen_[kSeenConns];
+        if (count == kDirect + 1) {
+            seen.Clear();
+            for (size_t k = cell.first_conn; k < m.conns.size(); ++k)
+                seen.InsertIfAbsent(m.conns[k].name, const_cast<char*>(m.conns[k].name));
+        }
+        twice = seen.Find(name) != nullptr;
+        if (!twice) seen.InsertIfAbsent(name, const_cast<char*>(name));
+    }
+    if (!twice) return true;
+    Error(Port_Format("Cell '%s' in module '%s' of '%s' connects port '%s' twice (at byte %zu).", cell.name, m.name,
+                      path_, name, Where()));
+    ++bad_names_;
+    return false;
 }
 
 // Makes the bit ids of a module dense and derives the per-bit and per-signal tables.
@@ -376,10 +453,26 @@ void Reader::Finish(Module& m) {
 
 }  // namespace ndm_yosys
 
-std::unique_ptr<Ndm_Design> Ndm_ReadYosysJson(const char* path, const char* top_module) {
+uint64_t Ndm_DefaultMaxCells() {
+    const char* text = Port_Env::GetEnv("LUN_MAX_CELLS");
+    if (!text) return kNdm_MaxCells;
+    char* end = nullptr;
+    errno = 0;
+    const unsigned long long n = std::strtoull(text, &end, 10);
+    if (errno || end == text || *end || n == 0 || text[0] == '-') {
+        ndm_yosys::Msg().issueWarning(
+            "%s", Port_Format("LUN_MAX_CELLS is '%s', not a positive number of instances; the limit stays %llu.", text,
+                              static_cast<unsigned long long>(kNdm_MaxCells))
+                      .c_str());
+        return kNdm_MaxCells;
+    }
+    return n;
+}
+
+std::unique_ptr<Ndm_Design> Ndm_ReadYosysJson(const char* path, const char* top_module, uint64_t max_cells) {
     if (!path) return nullptr;
     auto design = std::make_unique<Ndm_Design>("");
-    ndm_yosys::Reader reader(path, *design);
+    ndm_yosys::Reader reader(path, *design, max_cells ? max_cells : Ndm_DefaultMaxCells());
     if (!reader.Load() || !reader.Build(top_module)) return nullptr;
     return design;
 }

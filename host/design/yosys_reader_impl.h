@@ -64,6 +64,17 @@ struct Cell {
     int32_t sub = -1;  // module the cell instantiates, or -1 for a leaf
 };
 
+// What expanding one instance of a module makes, its whole subtree counted; each count stops
+// at kMany rather than wrap (a netlist can double its size at every level).
+struct Expansion {
+    static constexpr uint64_t kMany = uint64_t{1} << 62;
+    uint64_t blocks = 0;   // blocks below the instance's own
+    uint64_t bits = 0;     // bit ids, the instance's own included
+    uint64_t signals = 0;
+    uint64_t pins = 0;
+    static uint64_t Add(uint64_t a, uint64_t b) { return a >= kMany - b ? kMany : a + b; }
+};
+
 // One module as read from the file; names are interned in the design.
 struct Module {
     const char* name = "";
@@ -87,6 +98,7 @@ struct Module {
     Ndm_PtrMap port_index;                   // port name -> index + 1
     int state = 0;                           // for the instantiation cycle check
     bool instantiated = false;
+    Expansion below;                         // what one instance makes, itself included
 };
 
 // Describes the value being read, for messages; built only when a message is issued.
@@ -121,7 +133,8 @@ inline size_t FromValue(void* value) { return reinterpret_cast<uintptr_t>(value)
 
 class Reader {
 public:
-    Reader(const char* path, Ndm_Design& design) : path_(path), design_(design) {}
+    Reader(const char* path, Ndm_Design& design, uint64_t max_cells)
+        : path_(path), design_(design), max_cells_(max_cells) {}
 
     bool Load();
     bool Build(const char* top_module);
@@ -162,19 +175,25 @@ private:
     bool ParseCells(od::value value, Module& m);
     bool ParseCell(od::object object, Module& m, Cell& cell);
     bool ParseNets(od::value value, Module& m);
+    bool NameOk(std::string_view name, const Module* m, const char* kind, bool may_be_empty = false);
+    bool FirstOfName(Ndm_PtrMap& seen, const char* name, const Module& m, const char* kind);
+    bool FirstConnection(const Module& m, const Cell& cell, const char* name);
     void Finish(Module& m);
 
     // ---- building ----
     bool ResolveTypes();
     void BoxDirections(Module& m, const Cell& cell, Module& box);
     bool ChooseTop(const char* top_module, uint32_t& top);
-    bool CheckCycles(uint32_t module, std::vector<uint32_t>& stack);
+    bool CheckCycles(uint32_t top);
+    void Count(Module& m);
+    bool CheckSize(uint32_t top);
     const Port* FindPort(Module& m, const char* name);
     const char* BitName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i);
     uint32_t Alloc(uint32_t count);
     uint32_t Find(uint32_t id);
     void Union(uint32_t a, uint32_t b);
-    bool Expand(Ndm_Block* block, uint32_t module, uint32_t base);
+    bool Expand(Ndm_Block* block, uint32_t module);
+    bool ExpandCell(Ndm_Block* child, Module& m, const Cell& cell);
     void TopPins(Ndm_Block* block, uint32_t module);
     void Networks(Ndm_View* view);
     void PadBoundary(Module& m);
@@ -182,12 +201,17 @@ private:
 
     const char* path_;
     Ndm_Design& design_;
+    uint64_t max_cells_;
     Ndm_JsonInput::Input buf_;
     od::parser parser_;
     od::document doc_;
     std::string scratch_;
     std::string name_buf_;
     const char* module_name_ = "";
+    enum { kSeenPorts, kSeenCells, kSeenNets, kSeenConns };
+    Ndm_PtrMap seen_[4];    // names of the ports, cells and netnames of the module being read,
+                            // and of the connections of a cell with many
+    size_t bad_names_ = 0;  // objects left out for their names
 
     std::vector<Module> modules_;
     Ndm_PtrMap module_index_;  // module name -> index + 1

@@ -1,5 +1,6 @@
 #include "host/filter/prop_filter.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstdint>
@@ -151,6 +152,56 @@ bool Overlaps(const Definition& a, const Definition& b) {
     return true;
 }
 
+// The definitions read so far, by what two overlapping definitions share (see Overlaps): the
+// form, the upper-cased name and a range's width. Exact and prefix definitions of one key
+// have disjoint object kinds, so a key holds at most eight of them; ranges of one key are kept
+// per object kind, by low bound, where they never overlap.
+class OverlapIndex {
+public:
+    // The first definition of defs (in file order) that d overlaps, or null.
+    const Definition* Find(const std::vector<Definition>& defs, const Definition& d) const {
+        auto it = keys_.find(Key(d));
+        if (it == keys_.end()) return nullptr;
+        size_t first = SIZE_MAX;
+        if (d.form != Form::Range) {
+            for (size_t i : it->second.defs)
+                if (Overlaps(d, defs[i])) first = std::min(first, i);
+        } else {
+            for (int kind = 0; kind < 8; ++kind) {
+                if (!(d.kinds & (1u << kind))) continue;
+                const std::map<uint32_t, size_t>& ranges = it->second.ranges[kind];
+                // The ranges below d.hi, from the last one down, overlap d until one ends
+                // below d.lo.
+                for (auto at = ranges.upper_bound(d.hi); at != ranges.begin();) {
+                    --at;
+                    if (defs[at->second].hi < d.lo) break;
+                    first = std::min(first, at->second);
+                }
+            }
+        }
+        return first == SIZE_MAX ? nullptr : &defs[first];
+    }
+    void Add(const Definition& d, size_t index) {
+        Entry& entry = keys_[Key(d)];
+        if (d.form != Form::Range) {
+            entry.defs.push_back(index);
+            return;
+        }
+        for (int kind = 0; kind < 8; ++kind)
+            if (d.kinds & (1u << kind)) entry.ranges[kind].emplace(d.lo, index);
+    }
+
+private:
+    struct Entry {
+        std::vector<size_t> defs;                  // exact or prefix definitions
+        std::map<uint32_t, size_t> ranges[8];      // per object kind: low bound -> definition
+    };
+    static std::string Key(const Definition& d) {
+        return std::to_string(static_cast<int>(d.form)) + ':' + std::to_string(d.width) + ':' + d.upper;
+    }
+    std::unordered_map<std::string, Entry> keys_;
+};
+
 // Reads a definition file; on failure returns null and sets error.
 std::shared_ptr<Definitions> Load(const std::string& path, std::string& error) {
     std::ifstream in(path, std::ios::binary);
@@ -159,6 +210,7 @@ std::shared_ptr<Definitions> Load(const std::string& path, std::string& error) {
         return nullptr;
     }
     auto defs = std::make_shared<Definitions>();
+    OverlapIndex overlaps;
     std::string raw;
     int line_no = 0;
     auto fail = [&](const std::string& why) {
@@ -196,12 +248,11 @@ std::shared_ptr<Definitions> Load(const std::string& path, std::string& error) {
             if (!kind) return fail("unknown object kind '" + std::string(fields[k]) + "'.");
             d.kinds |= kind;
         }
-        for (const Definition& other : defs->defs)
-            if (Overlaps(d, other))
-                return fail("duplicate definition of '" + std::string(fields[0]) +
-                            "' for the same object kind (first on line " +
-                            std::to_string(other.line) + ").");
+        if (const Definition* other = overlaps.Find(defs->defs, d))
+            return fail("duplicate definition of '" + std::string(fields[0]) +
+                        "' for the same object kind (first on line " + std::to_string(other->line) + ").");
         size_t index = defs->defs.size();
+        overlaps.Add(d, index);
         if (d.form == Form::Exact)
             defs->exact[d.upper].push_back(index);
         else

@@ -22,7 +22,20 @@ bool GlobMatch(const char* text, const char* pattern) {
         unsigned char p = static_cast<unsigned char>(*pattern);
         unsigned char t = static_cast<unsigned char>(*text);
         if (p == '*') {
-            star = pattern++;
+            while (*pattern == '*') ++pattern;
+            if (!std::strchr(pattern, '*')) {
+                // After the last star only the end of the text, as long as the rest of the
+                // pattern, can match it: no need to try every start (names can be long).
+                const size_t rest = std::strlen(pattern), left = std::strlen(text);
+                if (rest > left) return false;
+                for (text += left - rest; *pattern; ++pattern, ++text) {
+                    const unsigned char q = static_cast<unsigned char>(*pattern);
+                    const unsigned char c = static_cast<unsigned char>(*text);
+                    if (q != '?' && (kIgnoreCase ? Fold(q) != Fold(c) : q != c)) return false;
+                }
+                return true;
+            }
+            star = pattern - 1;
             resume = text;
         } else if (p && (p == '?' || (kIgnoreCase ? Fold(p) == Fold(t) : p == t))) {
             ++pattern;

@@ -98,10 +98,15 @@ Cs_ConstraintMgr::PropReplaceResults Cs_ConstraintMgr::ReplaceConstraintsFromPro
     const Ndm_View* view = region.GetView();
     if (!view || !view->GetBlock()) return results;
     Ndh_PropInFilter filter("ucf.prp", nullptr);
-    auto take = [&](Ndm_PropertyHolder* object, Cs_Scope scope, const std::string& name) {
+    // The object's full name is made only for an object with constraint properties: full names
+    // grow with the depth of the hierarchy.
+    std::string name;
+    auto take = [&](Ndm_PropertyHolder* object, Cs_Scope scope) {
+        name.clear();
         for (Ndm_Property* p : object->GetPropertyItr()) {
             const char* key = p->GetName();
             if (filter.CanonicalName(key).empty()) continue;
+            if (name.empty()) name = object->GetFullName();
             std::vector<std::string> values;
             bool flag = false;
             switch (p->GetType()) {
@@ -134,12 +139,12 @@ Cs_ConstraintMgr::PropReplaceResults Cs_ConstraintMgr::ReplaceConstraintsFromPro
     while (!stack.empty()) {
         Ndm_Block* b = stack.back();
         stack.pop_back();
-        if (b->GetParent() && !b->GetPropertyByName("TYPE")) take(b, Cs_Scope::Instance, b->GetFullName());
-        for (Ndm_Pin* pin : b->GetPinItr()) take(pin, Cs_Scope::Pin, pin->GetFullName());
+        if (b->GetParent() && !b->GetPropertyByName("TYPE")) take(b, Cs_Scope::Instance);
+        for (Ndm_Pin* pin : b->GetPinItr()) take(pin, Cs_Scope::Pin);
         auto children = b->GetBlockItr();
         for (size_t i = children.size(); i-- > 0;) stack.push_back(children[i]);
     }
-    for (Ndm_Network* n : view->GetNetworkItr()) take(n, Cs_Scope::Net, n->GetName());
+    for (Ndm_Network* n : view->GetNetworkItr()) take(n, Cs_Scope::Net);
     Changed();
     return results;
 }

@@ -96,7 +96,8 @@ TEST_F(FrameTest, CopiesOwnTheirStrings) {
     ProbeAnnotator copy(*original);
     ProbeAnnotator assigned("other.ucf", CP_UCF, nullptr);
     assigned = *original;
-    assigned = assigned;  // self-assignment keeps everything
+    ProbeAnnotator& self = assigned;
+    assigned = self;      // self-assignment keeps everything
     original.reset();     // the copies must not depend on the source's buffers
     EXPECT_STREQ(copy.get_constraint_filename(), file.c_str());
     EXPECT_STREQ(copy.FilterFile(), "x.pfd");

@@ -70,6 +70,9 @@ TEST(Cli, BadInputNamesTheFile) {
         {"dump " + dir.Write("plain.json", "this is not json"), 1, {"plain.json"}},
         {"dump " + dir.Write("other.json", "{\"creator\": \"me\"}"), 1, {"other.json"}},
         {"dump " + kExample + "blinky.json --top nosuch", 1, {"nosuch"}},
+        {"--max-cells 5 dump " + kExample + "blinky.json", 1, {"blinky.json", "more than the limit of 5."}},
+        {"convert " + kExample + "blinky.json --max-cells 5 -o " + dir.path() + "/x.qdf", 1, {"limit of 5."}},
+        {"--max-cells 0 dump " + kExample + "blinky.json", 2, {"--max-cells"}},
         {"annotate " + kExample + "blinky.json --ucf " + dir.path() + "/none.ucf", 1, {"none.ucf"}},
         {"annotate " + kExample + "blinky.json --filter " + dir.Write("bad.pfd", "LOC strng net\n") + " --ucf " +
              kExample + "blinky.ucf",

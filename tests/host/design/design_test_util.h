@@ -1,11 +1,14 @@
-// Helpers of the design tests: a scratch directory and whole-file access.
+// Helpers of the design tests: a scratch directory, whole-file access, a dump, and a thread
+// with a small stack.
 #pragma once
 
+#include <pthread.h>
 #include <unistd.h>
 
 #include <atomic>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <sstream>
 #include <string>
 
@@ -51,6 +54,24 @@ inline std::string DumpText(const Ndm_Design& design) {
     std::ostringstream out;
     Ndm_Dump(design, out);
     return out.str();
+}
+
+// Runs f on a thread whose stack holds only `bytes`: code that recurses once per level of an
+// input overflows it at depths far below what the main thread's 8 MB would need. False when
+// no such thread could be made.
+inline bool OnSmallStack(size_t bytes, const std::function<void()>& f) {
+    pthread_attr_t attr;
+    pthread_attr_init(&attr);
+    pthread_attr_setstacksize(&attr, bytes);
+    pthread_t thread;
+    auto run = [](void* arg) -> void* {
+        (*static_cast<const std::function<void()>*>(arg))();
+        return nullptr;
+    };
+    const bool made = pthread_create(&thread, &attr, run, const_cast<std::function<void()>*>(&f)) == 0;
+    if (made) pthread_join(thread, nullptr);
+    pthread_attr_destroy(&attr);
+    return made;
 }
 
 }  // namespace design_test

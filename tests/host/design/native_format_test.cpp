@@ -156,6 +156,11 @@ TEST(NativeDesignFile, DamagedFilesGiveOneClearError) {
          "a block must start with its \"name\""},
         {"cut.lun", R"({"format":"lun-design","version":1,"views":[{"name":"V","top":{"name":"t")",
          "is not valid JSON"},
+        {"nul.lun", R"({"format":"lun-design","version":1,"views":[{"name":"V","top":{"name":"t\u0000x"}}]})",
+         "block \"name\" holds a NUL character"},
+        {"nullist.lun",
+         R"({"format":"lun-design","version":1,"properties":[{"name":"l","type":"list","value":[{"name":"s","type":"string","value":"a\u0000"}]}]})",
+         "string property holds a NUL character"},
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.name);
@@ -174,6 +179,19 @@ TEST(NativeDesignFile, DamagedFilesGiveOneClearError) {
     EXPECT_FALSE(Ndm_WriteNative(*design, bad.c_str()));
     ASSERT_EQ(capture.Texts(Port_Severity::Error).size(), 1u);
     EXPECT_NE(capture.Texts(Port_Severity::Error)[0].find(bad), std::string::npos);
+}
+
+// Files of earlier writers name their networks; the name is found again from the signals.
+TEST(NativeDesignFile, NetworkNamesOfEarlierFilesAreNotNeeded) {
+    TempDir dir;
+    const std::string path = dir.Write("old.lun", R"({"format":"lun-design","version":1,"name":"top","views":[
+{"name":"EXPANDED","top":{"name":"top","signals":[{"name":"clk"}],"blocks":[{"name":"u","signals":[{"name":"c"}]}]},
+"networks":[{"name":"stale","signals":[1,0]}]}]})");
+    auto design = Ndm_ReadNative(path.c_str());
+    ASSERT_TRUE(design);
+    EXPECT_STREQ(design->GetWorkView()->GetNetworkItr()[0]->GetName(), "clk");
+    ASSERT_TRUE(Ndm_WriteNative(*design, path.c_str()));
+    EXPECT_NE(ReadAll(path).find("\n{\"signals\":[1,0]}]}]}"), std::string::npos) << ReadAll(path);
 }
 
 TEST(NativeDesignFile, MarkerDetection) {

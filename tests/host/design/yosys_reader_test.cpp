@@ -385,4 +385,40 @@ TEST(YosysReader, BadInputGivesOneClearError) {
     EXPECT_EQ(capture.Texts(Port_Severity::Error).size(), 1u);
 }
 
+
+// Names no object can carry (empty, cut short by a NUL, or taken twice in a module) each get an
+// error naming the file, the module and the name; the whole file is read so that every one is
+// listed, and the netlist is refused.
+TEST(YosysReader, BadNamesAreEachReportedAndTheNetlistRefused) {
+    TempDir dir;
+    const std::string path = dir.Write("names.json", R"({"modules": {
+      "top": {
+        "ports": {"a": {"direction": "input", "bits": [2]}, "a": {"direction": "input", "bits": [3]},
+                  "": {"direction": "input", "bits": [4]}},
+        "cells": {"c": {"type": "X", "connections": {"A": [2], "A": [3]}}, "c": {"type": "X"},
+                  "n\u0000ul": {"type": "X"}, "t": {"type": "X\u0000Y"}},
+        "netnames": {"w": {"bits": [2]}, "\\w": {"bits": [3]}, "": {"bits": [4]}}},
+      "m\u0000": {}}})");
+    const std::vector<std::string> expected = {
+        "Module 'top' in '@' has two ports named 'a'",
+        "Module 'top' in '@' has a port with an empty name",
+        "Cell 'c' in module 'top' of '@' connects port 'A' twice",
+        "Module 'top' in '@' has two cells named 'c'",
+        "Module 'top' in '@' has a cell named 'n\\u0000ul', which holds a NUL character",
+        "Module 'top' in '@' has a cell type named 'X\\u0000Y', which holds a NUL character",
+        "Module 'top' in '@' has two nets named 'w'",
+        "Module 'top' in '@' has a net with an empty name",
+        "Netlist '@' has a module named 'm\\u0000', which holds a NUL character",
+    };
+    Port_MsgCapture capture;
+    EXPECT_FALSE(Ndm_LoadDesign(path.c_str(), nullptr));
+    const std::vector<std::string> errors = capture.Texts(Port_Severity::Error);
+    ASSERT_EQ(errors.size(), expected.size());
+    for (size_t i = 0; i < expected.size(); ++i) {
+        std::string expect = expected[i];
+        expect.replace(expect.find('@'), 1, path);
+        EXPECT_EQ(errors[i].rfind(expect + " (at byte ", 0), 0u) << errors[i];
+    }
+}
+
 }  // namespace

@@ -32,6 +32,9 @@ TEST(UtStrTest, WildcardMatching) {
     EXPECT_TRUE(UT_STR::Match("data<7>", "data<?>"));
     EXPECT_FALSE(UT_STR::Match("data<17>", "data<?>"));
     EXPECT_TRUE(UT_STR::Match("abcabcx", "*abc*x"));  // needs backtracking over the first *
+    EXPECT_FALSE(UT_STR::Match("bc", "*abc"));         // the end of the text is shorter
+    EXPECT_TRUE(UT_STR::IMatch("xaABC", "*a**b?"));    // the last star takes all but the end
+    EXPECT_FALSE(UT_STR::Match("xabcab", "*abc"));
     EXPECT_TRUE(UT_STR::Match("", "*"));
     EXPECT_FALSE(UT_STR::Match("", "?"));
     EXPECT_FALSE(UT_STR::Match("U1/REG", "u1/reg"));

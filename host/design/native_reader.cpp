@@ -1,0 +1,474 @@
+// The native design file, reading side: the design rebuilt from the file, with its own stacks
+// for the block tree and nested property lists, and one clear error for a damaged file.
+#include <simdjson.h>
+
+#include <cmath>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "host/design/json_input.h"
+#include "host/design/native_format.h"
+#include "host/port/msgman.h"
+
+namespace {
+
+namespace od = simdjson::ondemand;
+using simdjson::error_code;
+
+using Ndm_JsonInput::Msg;
+
+constexpr const char kMarker[] = "lun-design";
+constexpr int kVersion = 1;
+
+class Reader {
+public:
+    Reader(const char* path, Ndm_Design& design) : path_(path), design_(design) {}
+
+    bool Read() {
+        std::string why;
+        if (!buf_.Open(path_, why))
+            return Error(Port_Format("Cannot read design file '%s': %s.", path_, why.c_str()));
+        if (error_code e = Ndm_JsonInput::Iterate(parser_, buf_, doc_))
+            return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
+        od::object root;
+        od::json_type type;
+        if (error_code e = doc_.type().get(type)) return SyntaxError(e, Where());
+        if (error_code e = doc_.get_object().get(root)) return JsonError(e, "the file must hold a JSON object");
+        bool marked = false;
+        for (auto item : root) {
+            od::field field;
+            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member");
+            od::raw_json_string key = field.key();
+            if (key == "format") {
+                std::string_view text;
+                if (!String(field.value(), text, "\"format\"")) return false;
+                if (text != kMarker) return Shape("\"format\" must be \"lun-design\"");
+                marked = true;
+            } else if (!marked) {
+                return Error(Port_Format("'%s' is not a design file: it does not start with the "
+                                         "\"format\": \"lun-design\" marker.",
+                                         path_));
+            } else if (key == "version") {
+                int64_t version;
+                if (error_code e = field.value().get_int64().get(version))
+                    return JsonError(e, "\"version\" must be an integer");
+                if (version != kVersion)
+                    return Error(Port_Format("Design file '%s' has version %lld; this program reads version %d.",
+                                             path_, static_cast<long long>(version), kVersion));
+            } else if (key == "name") {
+                std::string_view text;
+                if (!String(field.value(), text, "\"name\"")) return false;
+                design_.SetName(text);
+            } else if (key == "properties") {
+                if (!Properties(field.value(), design_)) return false;
+            } else if (key == "views") {
+                od::array views;
+                if (error_code e = field.value().get_array().get(views))
+                    return JsonError(e, "\"views\" must be an array");
+                for (auto vitem : views) {
+                    od::value view;
+                    if (error_code e = std::move(vitem).get(view)) return JsonError(e, "bad view");
+                    if (!View(view)) return false;
+                }
+            }
+        }
+        if (doc_.current_location().error() != simdjson::OUT_OF_BOUNDS)
+            return SyntaxError(simdjson::TRAILING_CONTENT, Where());
+        if (!marked)
+            return Error(Port_Format("'%s' is not a design file: it has no \"format\": \"lun-design\" marker.",
+                                     path_));
+        // Pins that named signals further down the file.
+        for (const auto& [pin, n] : pending_) {
+            if (n >= signals_.size())
+                return Error(Port_Format("Design file '%s' is damaged: a pin names signal %llu, but the file "
+                                         "has %zu signals.",
+                                         path_, static_cast<unsigned long long>(n), signals_.size()));
+            pin->SetSignal(signals_[n]);
+        }
+        return true;
+    }
+
+private:
+    bool Error(const std::string& text) {
+        Msg().issueError("%s", text.c_str());
+        return false;
+    }
+    size_t Where() { return Ndm_JsonInput::Offset(doc_, buf_); }
+    bool SyntaxError(error_code e, size_t offset) {
+        return Error(Port_Format("'%s' is not valid JSON: %s at byte %zu.", path_, Ndm_JsonInput::SyntaxReason(e),
+                                 offset));
+    }
+    bool Shape(const std::string& what) {
+        return Error(Port_Format("Design file '%s' is damaged: %s (at byte %zu).", path_, what.c_str(), Where()));
+    }
+    bool JsonError(error_code e, const std::string& what) {
+        if (Ndm_JsonInput::IsSyntaxError(e)) return SyntaxError(e, Where());
+        return Shape(what);
+    }
+
+    bool String(od::value value, std::string_view& out, const char* what) {
+        od::raw_json_string raw;
+        if (error_code e = value.get_raw_json_string().get(raw))
+            return JsonError(e, std::string(what) + " must be a string");
+        if (!Ndm_JsonInput::Text(raw, scratch_, out, true)) return SyntaxError(simdjson::STRING_ERROR, Where());
+        // Names and texts of a design are terminated byte strings: a NUL would cut one short.
+        if (out.find('\0') != std::string_view::npos) return Shape(std::string(what) + " holds a NUL character");
+        return true;
+    }
+
+    // Interned, terminated copy of a string value.
+    bool Name(od::value value, const char*& out, const char* what) {
+        std::string_view text;
+        if (!String(value, text, what)) return false;
+        out = design_.Intern(text);
+        return true;
+    }
+
+    bool View(od::value value) {
+        od::object object;
+        if (error_code e = value.get_object().get(object)) return JsonError(e, "a view must be an object");
+        Ndm_View* view = nullptr;
+        for (auto item : object) {
+            od::field field;
+            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad view member");
+            od::raw_json_string key = field.key();
+            if (key == "name") {
+                const char* name;
+                if (!Name(field.value(), name, "view \"name\"")) return false;
+                if (design_.GetViewByName(name)) return Shape(Port_Format("view '%s' appears twice", name));
+                view = design_.CreateView(name);
+                continue;
+            }
+            if (!view) return Shape("a view must start with its \"name\"");
+            if (key == "properties") {
+                if (!Properties(field.value(), *view)) return false;
+            } else if (key == "top") {
+                if (view->GetBlock()) return Shape("a view has two top blocks");
+                if (!Tree(field.value(), view)) return false;
+            } else if (key == "networks") {
+                od::array nets;
+                if (error_code e = field.value().get_array().get(nets))
+                    return JsonError(e, "\"networks\" must be an array");
+                for (auto nitem : nets) {
+                    od::value net;
+                    if (error_code e = std::move(nitem).get(net)) return JsonError(e, "bad network");
+                    if (!Network(net, *view)) return false;
+                }
+            }
+        }
+        if (!view) return Shape("a view has no \"name\"");
+        return true;
+    }
+
+    // The tree of a view's top block. Blocks nest as deeply as the design does, so the reader
+    // keeps its own stack: a frame per open block, holding where its members and, while they
+    // are read, its children stand. A child is read to its end before its parent moves on.
+    bool Tree(od::value value, Ndm_View* view) {
+        struct Frame {
+            Ndm_Block* block = nullptr;
+            od::object_iterator member, members_end;
+            bool in_children = false;
+            od::array_iterator child, children_end;
+        };
+        std::vector<Frame> stack;
+        auto open = [&](od::value v) {
+            od::object object;
+            Frame frame;
+            if (error_code e = v.get_object().get(object)) return JsonError(e, "a block must be an object");
+            if (error_code e = object.begin().get(frame.member)) return JsonError(e, "bad block member");
+            if (error_code e = object.end().get(frame.members_end)) return JsonError(e, "bad block member");
+            stack.push_back(frame);
+            return true;
+        };
+        if (!open(value)) return false;
+        while (!stack.empty()) {
+            Frame& frame = stack.back();
+            if (frame.in_children) {
+                if (frame.child != frame.children_end) {
+                    od::value child;
+                    if (error_code e = (*frame.child).get(child)) return JsonError(e, "bad block");
+                    if (!open(child)) return false;  // frame is not used after this
+                    continue;
+                }
+                frame.in_children = false;
+                ++frame.member;
+                continue;
+            }
+            if (!(frame.member != frame.members_end)) {
+                if (!frame.block) return Shape("a block has no \"name\"");
+                stack.pop_back();
+                if (!stack.empty()) ++stack.back().child;
+                continue;
+            }
+            od::field field;
+            if (error_code e = (*frame.member).get(field)) return JsonError(e, "bad block member");
+            od::raw_json_string key = field.key();
+            if (key == "name") {
+                const char* name;
+                if (!Name(field.value(), name, "block \"name\"")) return false;
+                if (frame.block) return Shape("a block has two names");
+                Ndm_Block* parent = stack.size() > 1 ? stack[stack.size() - 2].block : nullptr;
+                frame.block = parent ? parent->CreateBlock(name) : view->CreateTopBlock(name);
+            } else if (!frame.block) {
+                return Shape("a block must start with its \"name\"");
+            } else if (key == "type") {
+                const char* type;
+                if (!Name(field.value(), type, "block \"type\"")) return false;
+                frame.block->SetTypeName(type);
+            } else if (key == "properties") {
+                if (!Properties(field.value(), *frame.block)) return false;
+            } else if (key == "signals") {
+                if (!Signals(field.value(), *frame.block)) return false;
+            } else if (key == "pins") {
+                if (!Pins(field.value(), *frame.block)) return false;
+            } else if (key == "blocks") {
+                od::array children;
+                if (error_code e = field.value().get_array().get(children))
+                    return JsonError(e, "\"blocks\" must be an array");
+                if (error_code e = children.begin().get(frame.child)) return JsonError(e, "bad block");
+                if (error_code e = children.end().get(frame.children_end)) return JsonError(e, "bad block");
+                frame.in_children = true;
+                continue;  // the member moves on once the children are read
+            }
+            ++frame.member;
+        }
+        return true;
+    }
+
+    bool Signals(od::value value, Ndm_Block& block) {
+        od::array array;
+        if (error_code e = value.get_array().get(array)) return JsonError(e, "\"signals\" must be an array");
+        for (auto item : array) {
+            od::object object;
+            if (error_code e = std::move(item).get_object().get(object))
+                return JsonError(e, "a signal must be an object");
+            Ndm_Signal* signal = nullptr;
+            for (auto fitem : object) {
+                od::field field;
+                if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad signal member");
+                od::raw_json_string key = field.key();
+                if (key == "name") {
+                    const char* name;
+                    if (!Name(field.value(), name, "signal \"name\"")) return false;
+                    if (signal) return Shape("a signal has two names");
+                    signal = block.CreateSignal(name);
+                    signals_.push_back(signal);
+                } else if (key == "properties") {
+                    if (!signal) return Shape("a signal must start with its \"name\"");
+                    if (!Properties(field.value(), *signal)) return false;
+                }
+            }
+            if (!signal) return Shape("a signal has no \"name\"");
+        }
+        return true;
+    }
+
+    bool Pins(od::value value, Ndm_Block& block) {
+        od::array array;
+        if (error_code e = value.get_array().get(array)) return JsonError(e, "\"pins\" must be an array");
+        for (auto item : array) {
+            od::object object;
+            if (error_code e = std::move(item).get_object().get(object)) return JsonError(e, "a pin must be an object");
+            Ndm_Pin* pin = nullptr;
+            const char* name = nullptr;
+            Ndm_Dir dir = Ndm_Dir::None;
+            auto make = [&] {
+                if (!pin) pin = block.CreatePin(name, dir);
+            };
+            for (auto fitem : object) {
+                od::field field;
+                if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad pin member");
+                od::raw_json_string key = field.key();
+                if (key == "name") {
+                    if (name) return Shape("a pin has two names");
+                    if (!Name(field.value(), name, "pin \"name\"")) return false;
+                    continue;
+                }
+                if (!name) return Shape("a pin must start with its \"name\"");
+                if (key == "dir") {
+                    if (pin) return Shape("a pin's \"dir\" must come right after its name");
+                    std::string_view text;
+                    if (!String(field.value(), text, "pin \"dir\"")) return false;
+                    if (!Ndm_DirFromName(text, dir))
+                        return Shape("pin \"dir\" must be \"input\", \"output\" or \"inout\"");
+                } else if (key == "signal") {
+                    uint64_t n;
+                    if (error_code e = field.value().get_uint64().get(n))
+                        return JsonError(e, "pin \"signal\" must be a signal number");
+                    make();
+                    if (n < signals_.size())
+                        pin->SetSignal(signals_[n]);
+                    else
+                        pending_.emplace_back(pin, n);
+                } else if (key == "properties") {
+                    make();
+                    if (!Properties(field.value(), *pin)) return false;
+                }
+            }
+            if (!name) return Shape("a pin has no \"name\"");
+            make();
+        }
+        return true;
+    }
+
+    bool Network(od::value value, Ndm_View& view) {
+        od::object object;
+        if (error_code e = value.get_object().get(object)) return JsonError(e, "a network must be an object");
+        Ndm_Network* net = view.CreateNetwork();
+        for (auto item : object) {
+            od::field field;
+            if (error_code e = std::move(item).get(field)) return JsonError(e, "bad network member");
+            od::raw_json_string key = field.key();
+            if (key == "properties") {
+                if (!Properties(field.value(), *net)) return false;
+            } else if (key == "signals") {
+                od::array array;
+                if (error_code e = field.value().get_array().get(array))
+                    return JsonError(e, "network \"signals\" must be an array");
+                for (auto sitem : array) {
+                    uint64_t n;
+                    if (error_code e = std::move(sitem).get_uint64().get(n))
+                        return JsonError(e, "network \"signals\" must hold signal numbers");
+                    if (n >= signals_.size()) return Shape(Port_Format("a network names unknown signal %llu",
+                                                                       static_cast<unsigned long long>(n)));
+                    if (signals_[n]->GetNetwork())
+                        return Shape(Port_Format("signal %llu is in two networks", static_cast<unsigned long long>(n)));
+                    net->AddSignal(signals_[n]);
+                }
+            }
+        }
+        return true;
+    }
+
+    // The properties of a design object. List properties nest as deeply as the file makes
+    // them, so the reader keeps its own stack of open lists: a frame per array of property
+    // objects, with the list property it fills (none for the object's own array).
+    bool Properties(od::value value, Ndm_PropertyHolder& holder) {
+        std::vector<ListFrame>& stack = lists_;
+        stack.clear();
+        auto open = [&](od::value v, Ndm_Property* list) {
+            od::array array;
+            ListFrame frame{list, {}, {}};
+            if (error_code e = v.get_array().get(array)) return JsonError(e, "\"properties\" must be an array");
+            if (error_code e = array.begin().get(frame.item)) return JsonError(e, "a property must be an object");
+            if (error_code e = array.end().get(frame.end)) return JsonError(e, "a property must be an object");
+            stack.push_back(frame);
+            return true;
+        };
+        if (!open(value, nullptr)) return false;
+        std::string& name = prop_name_;
+        std::string& type = prop_type_;
+        while (!stack.empty()) {
+            ListFrame& frame = stack.back();
+            if (!(frame.item != frame.end)) {
+                stack.pop_back();
+                if (!stack.empty()) ++stack.back().item;
+                continue;
+            }
+            od::object object;
+            if (error_code e = (*frame.item).get_object().get(object))
+                return JsonError(e, "a property must be an object");
+            std::string_view text;
+            od::value v;
+            if (error_code e = object.find_field("name").get(v)) return JsonError(e, "a property needs a \"name\"");
+            if (!String(v, text, "property \"name\"")) return false;
+            name.assign(text);
+            if (error_code e = object.find_field("type").get(v))
+                return JsonError(e, "property \"name\" must be followed by \"type\"");
+            if (!String(v, text, "property \"type\"")) return false;
+            type.assign(text);
+            if (error_code e = object.find_field("value").get(v))
+                return JsonError(e, "property \"type\" must be followed by \"value\"");
+            if (type == "list") {
+                Ndm_Property* list = frame.list ? frame.list->CreatePropertyList(name.c_str())
+                                                : holder.CreatePropertyList(name.c_str());
+                if (!open(v, list)) return false;  // frame is not used after this
+                continue;  // the item moves on once the entries are read
+            }
+            if (!(frame.list ? Value(v, *frame.list, name.c_str(), type) : Value(v, holder, name.c_str(), type)))
+                return false;
+            ++frame.item;
+        }
+        return true;
+    }
+
+    template <class Holder>
+    bool Value(od::value v, Holder& holder, const char* name, const std::string& type) {
+        if (type == "bool") {
+            bool b;
+            if (error_code e = v.get_bool().get(b)) return JsonError(e, "a bool property needs true or false");
+            holder.CreatePropertyBool(name, b);
+        } else if (type == "int32") {
+            int64_t n;
+            if (error_code e = v.get_int64().get(n)) return JsonError(e, "an int32 property needs an integer");
+            if (n < INT32_MIN || n > INT32_MAX) return Shape("an int32 property is out of range");
+            holder.CreatePropertyInt32(name, static_cast<int32_t>(n));
+        } else if (type == "float64") {
+            double d;
+            od::json_type t;
+            if (error_code e = v.type().get(t)) return JsonError(e, "bad float64 property");
+            if (t == od::json_type::string) {
+                std::string_view text;
+                if (!String(v, text, "float64 property")) return false;
+                if (text == "inf")
+                    d = HUGE_VAL;
+                else if (text == "-inf")
+                    d = -HUGE_VAL;
+                else if (text == "nan")
+                    d = std::nan("");
+                else if (text == "-nan")
+                    d = -std::nan("");
+                else
+                    return Shape("a float64 property needs a number, \"inf\", \"-inf\" or \"nan\"");
+            } else if (error_code e = v.get_double().get(d)) {
+                return JsonError(e, "a float64 property needs a number");
+            }
+            holder.CreatePropertyFloat64(name, d);
+        } else if (type == "string") {
+            std::string_view text;
+            if (!String(v, text, "string property")) return false;
+            holder.CreatePropertyString(name, std::string(text).c_str());
+        } else if (type == "string_list") {
+            od::array array;
+            if (error_code e = v.get_array().get(array)) return JsonError(e, "a string_list property needs an array");
+            Ndm_Property* p = holder.CreatePropertyStringList(name);
+            for (auto item : array) {
+                od::value s;
+                std::string_view text;
+                if (error_code e = std::move(item).get(s)) return JsonError(e, "bad string_list entry");
+                if (!String(s, text, "string_list entry")) return false;
+                p->AddString(std::string(text).c_str());
+            }
+        } else {
+            return Shape(Port_Format("unknown property type '%s'", type.c_str()));
+        }
+        return true;
+    }
+
+    const char* path_;
+    Ndm_Design& design_;
+    Ndm_JsonInput::Input buf_;
+    od::parser parser_;
+    od::document doc_;
+    std::string scratch_;
+    std::vector<Ndm_Signal*> signals_;  // by number
+    struct ListFrame {  // an array of property objects being read, and the list it fills
+        Ndm_Property* list;
+        od::array_iterator item, end;
+    };
+    std::vector<ListFrame> lists_;
+    std::string prop_name_, prop_type_;
+    std::vector<std::pair<Ndm_Pin*, uint64_t>> pending_;
+};
+
+}  // namespace
+
+std::unique_ptr<Ndm_Design> Ndm_ReadNative(const char* path) {
+    if (!path) return nullptr;
+    auto design = std::make_unique<Ndm_Design>("");
+    Reader reader(path, *design);
+    if (!reader.Read()) return nullptr;
+    return design;
+}
