@@ -179,7 +179,9 @@ void CstExtractor::WriteTimingLists(Ndm_Block* block, Port::Stream& out,
             // The stored texts keep names unquoted: a name holding a blank, ';', '#' or '"'
             // was warned of when it was annotated; say which statement it spoils.
             const std::string_view value = entry->GetValueString() ? entry->GetValueString() : "";
-            if (!Pr_NameReadsBack(entry->GetName()) || value.find_first_of(";#") != std::string_view::npos)
+            const bool one_name = Equals(entry->GetName(), "ENABLE") || Equals(entry->GetName(), "DISABLE");
+            if (!Pr_NameReadsBack(entry->GetName()) || value.find_first_of(";#") != std::string_view::npos ||
+                (one_name && !Pr_NameReadsBack(value)))
                 Msg(__LINE__).issueWarning("The statement '%s' will not read back as written: a name in it holds a "
                                            "blank, ';', '#' or '\"'.\n",
                                            line.substr(0, line.size() - 1).c_str());

@@ -59,6 +59,17 @@ std::vector<std::string> QuillmapInputs::Paths() const {
     return paths;
 }
 
+bool QuillmapProjectNameIsValid(const std::string& project) {
+    bool ok = project.size() >= 5 && project[project.size() - 4] == '.' && project[project.size() - 5] != '/';
+    for (size_t i = project.size() - 3; ok && i < project.size(); ++i) ok = project[i] != '.' && project[i] != '/';
+    if (!ok)
+        Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+            .issueError("The project file name '%s' must end in a three-letter extension such as .qpf: the "
+                        "constraint repository is kept in the folder named by the rest of it.\n",
+                        project.c_str());
+    return ok;
+}
+
 int QuillmapMain(int argc, char** argv) {
     CLI::App app{kDescription, "quillmap"};
     // The tool's version is the one it was built as; the library's is the one it loaded.
@@ -110,9 +121,14 @@ int QuillmapMain(int argc, char** argv) {
         int status = run ? run() : kStatusFatal;
         // Output lost on a full device or a closed pipe is an error the user must see.
         std::cout.flush();
-        if (std::fflush(stdout) != 0 || std::ferror(stdout) || !std::cout) {
+        // The reason: the final flush's, else what the failed write left.
+        const int earlier = errno;
+        errno = 0;
+        const bool flushed = std::fflush(stdout) == 0;
+        const int why = !flushed && errno ? errno : (earlier ? earlier : EIO);
+        if (!flushed || std::ferror(stdout) || !std::cout) {
             Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
-                .issueError("Cannot write to the standard output: %s.\n", std::strerror(errno ? errno : EIO));
+                .issueError("Cannot write to the standard output: %s.\n", std::strerror(why));
             if (status == kStatusOk) status = kStatusErrors;
         }
         // An internal error is an error the library found in its own state: it counts as one.

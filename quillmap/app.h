@@ -103,10 +103,14 @@ struct QuillmapRoadRequest {
     bool allow_unmatched_io = false;
     bool allow_unmatched_maxdelay = false;
     std::string output;
+    std::string file_road_options;  // options given that only the file road uses, for the message
 };
 // Runs the constraint files through the repository bridge by its mode; modes that do not use
 // the repository run file_road, the annotators as without a project.
 int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::function<int()>& file_road);
 void AddRepoCommand(CLI::App& app, QuillmapAction& run);
+// False, after an error, when a project file name does not end in a three-letter extension:
+// the repository is kept in the folder named by the rest of it.
+bool QuillmapProjectNameIsValid(const std::string& project);
 
 int QuillmapMain(int argc, char** argv);

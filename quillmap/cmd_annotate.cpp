@@ -75,9 +75,18 @@ int RunAnnotate(const AnnotateArgs& args, const QuillmapOptions& options) {
     if (!args.project.empty()) inputs.push_back(Ta_LunCSHelper::RepositoryPath(args.project.c_str()).str());
     if (!QuillmapOutputIsNew(args.output, inputs)) return kStatusFatal;
     if (args.project.empty()) return RunFileRoad(args, options);
+    std::string file_road_only;
+    auto note = [&](bool given, const char* option) {
+        if (given) file_road_only += (file_road_only.empty() ? "" : ", ") + std::string(option);
+    };
+    note(!args.filter.empty(), "--filter");
+    note(args.case_sensitive, "--case-sensitive");
+    note(args.case_insensitive, "--case-insensitive");
+    note(args.second_pass, "--second-pass");
+    note(args.best_effort_opt && args.best_effort_opt->count() > 0, "--best-effort");
     QuillmapRoadRequest request{args.in.design, args.in.top, args.in.ucf, !args.in.ncf.empty(),
                                 args.project, args.drc, args.allow_unmatched_locs, args.allow_unmatched_maxdelay,
-                                args.output};
+                                args.output, file_road_only};
     return QuillmapRepositoryRoad(request, [&] { return RunFileRoad(args, options); });
 }
 

@@ -33,15 +33,6 @@ private:
     std::string file_;
 };
 
-// A project file name ends in a three-letter extension: the bridge keeps the repository in
-// the folder named by the rest.
-bool HasExtension(const std::string& project) {
-    if (project.size() < 5 || project[project.size() - 4] != '.') return false;
-    for (size_t i = project.size() - 3; i < project.size(); ++i)
-        if (project[i] == '.' || project[i] == '/') return false;
-    return project[project.size() - 5] != '/';
-}
-
 // The findings of the last resolution (no design match, groups nobody defines): the parse
 // statuses are reported where the files are read.
 Cs_ReturnCode ResolutionFindings(const Cs_ConstraintMgr& mgr) {
@@ -49,6 +40,14 @@ Cs_ReturnCode ResolutionFindings(const Cs_ConstraintMgr& mgr) {
     for (const auto& status : mgr.GetFindings())
         if (!dynamic_cast<const Cs_Status_Parse*>(status.get())) findings.Add(status);
     return findings;
+}
+
+// Whether every file can be read now (a restored repository still holds what a file that has
+// gone away gave; reading the files again reports it).
+bool AllReadable(const std::vector<std::string>& files) {
+    for (const std::string& file : files)
+        if (::access(file.c_str(), R_OK) != 0) return false;
+    return true;
 }
 
 // Whether the repository restored by Init holds exactly the given files, in their order.
@@ -67,13 +66,7 @@ std::string Count(size_t n, const char* noun) {
 }  // namespace
 
 int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::function<int()>& file_road) {
-    if (!HasExtension(request.project)) {
-        Msg(__LINE__).issueError(
-            "The project file name '%s' must end in a three-letter extension such as .qpf: the constraint "
-            "repository is kept in the folder named by the rest of it.\n",
-            request.project.c_str());
-        return kStatusFatal;
-    }
+    if (!QuillmapProjectNameIsValid(request.project)) return kStatusFatal;
     if (!request.drc.empty()) ::setenv("ZEP_QUILLMAP_CONSTRAINT_DRC", request.drc.c_str(), 1);
     Ta_LunCSHelper::GetDrcLevel();  // a bad level is fatal before anything is written
 
@@ -97,6 +90,13 @@ int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::functi
             "ZEP_QUILLMAP_CS to 0 to read every file without the repository.\n");
         return kStatusFatal;
     }
+    if (!request.file_road_options.empty()) {
+        Msg(__LINE__).issueError(
+            "%s cannot be used with the constraint repository, which reads the files by its own rules: give them "
+            "without --project, or set ZEP_QUILLMAP_CS to 0.\n",
+            request.file_road_options.c_str());
+        return kStatusFatal;
+    }
 
     auto design = QuillmapLoadDesign(request.design, request.top);
     if (!design) return kStatusErrors;
@@ -115,6 +115,11 @@ int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::functi
             copy->Report();
         }
         Msg(__LINE__).issueStatus("The constraints are read from the constraint files again.\n");
+        mgr.DeleteAllConstraints();
+    } else if (had_repository && SameSources(mgr, request.ucf) && !AllReadable(request.ucf)) {
+        Msg(__LINE__).issueStatus(
+            "A constraint file of the constraint repository '%s' cannot be read: every file is read again.\n",
+            bcd.c_str());
         mgr.DeleteAllConstraints();
     } else if (had_repository && SameSources(mgr, request.ucf)) {
         size_t again = 0;

@@ -35,10 +35,11 @@ std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_mod
     const bool known = ::stat(path, &st) == 0 && S_ISREG(st.st_mode);
     auto stamp = [&](std::unique_ptr<Ndm_Design> design) {
         if (design && known)
-            design->SetSourceStamp(Port_Format("%llu:%llu:%lld:%lld.%09ld", static_cast<unsigned long long>(st.st_dev),
+            design->SetSourceStamp(Port_Format("%llu:%llu:%lld:%lld.%09ld:", static_cast<unsigned long long>(st.st_dev),
                                                static_cast<unsigned long long>(st.st_ino),
                                                static_cast<long long>(st.st_size),
-                                               static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec));
+                                               static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec) +
+                                   design->GetName());  // the top module chosen counts too
         return design;
     };
     if (!Ndm_IsNativeText(head, got)) return stamp(Ndm_ReadYosysJson(path, top_module, max_cells));

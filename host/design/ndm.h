@@ -271,7 +271,8 @@ public:
     const char* FindInterned(std::string_view name) const;
 
     // What the design was read from, for caches of what its names resolve to: the loader sets
-    // the identity of the file (device, inode, size, modification time). Empty for a design
+    // the identity of the file (device, inode, size, modification time) and the design's name
+    // (its top module). Empty for a design
     // made in memory, which no such cache can trust.
     const std::string& GetSourceStamp() const { return source_stamp_; }
     void SetSourceStamp(std::string stamp) { source_stamp_ = std::move(stamp); }

@@ -5,6 +5,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 #include <csignal>
 #include <cstdlib>
@@ -23,19 +24,20 @@ bool Step(const char* step) { return !g_hook || g_hook(step); }
 constexpr int kSlots = 16;
 constexpr size_t kPathMax = 4096;
 char g_temps[kSlots][kPathMax];
-volatile sig_atomic_t g_used[kSlots];
+// 0 free, 1 taken while its path is written, 2 a temporary the handler removes.
+std::atomic<int> g_state[kSlots];
+static_assert(std::atomic<int>::is_always_lock_free, "the signal handler reads the slots");
 
 void RemoveTemporaries(int sig) {
     for (int i = 0; i < kSlots; ++i)
-        if (g_used[i]) ::unlink(g_temps[i]);
+        if (g_state[i].load() == 2) ::unlink(g_temps[i]);
     std::signal(sig, SIG_DFL);
     std::raise(sig);
 }
 
 void InstallHandlers() {
-    static bool installed = false;
-    if (installed) return;
-    installed = true;
+    static std::atomic<bool> installed{false};
+    if (installed.exchange(true)) return;
     for (int sig : {SIGINT, SIGTERM}) {
         struct sigaction old {};
         if (::sigaction(sig, nullptr, &old) == 0 && old.sa_handler == SIG_DFL) std::signal(sig, RemoveTemporaries);
@@ -45,13 +47,14 @@ void InstallHandlers() {
 int Register(const std::string& temp) {
     if (temp.size() >= kPathMax) return -1;
     for (int i = 0; i < kSlots; ++i) {
-        if (g_used[i]) continue;
+        int free = 0;
+        if (!g_state[i].compare_exchange_strong(free, 1)) continue;
         std::memcpy(g_temps[i], temp.c_str(), temp.size() + 1);
-        g_used[i] = 1;
+        g_state[i].store(2);  // the path is complete before the handler may read it
         InstallHandlers();
         return i;
     }
-    return -1;
+    return -1;  // more saves at once than slots: this temporary is left to the next save
 }
 
 std::string DirectoryOf(const std::string& path) {
@@ -64,12 +67,22 @@ std::string NameOf(const std::string& path) {
     return slash == std::string::npos ? path : path.substr(slash + 1);
 }
 
-// Temporaries are named ".NAME.PID.partial" beside NAME; those of processes that are gone are
-// leftovers of a crash.
+// This machine's name, in temporaries' names: a process is known gone only on its own machine.
+std::string HostName() {
+    char host[256] = {};
+    if (::gethostname(host, sizeof host - 1) != 0 || !*host) return "host";
+    std::string name(host);
+    for (char& c : name)
+        if (c == '/' || c == '.') c = '_';
+    return name;
+}
+
+// Temporaries are named ".NAME.HOST.PID.partial" beside NAME; those of this machine's
+// processes that are gone are leftovers of a crash.
 void RemoveStaleTemporaries(const std::string& dir, const std::string& name) {
     DIR* d = ::opendir(dir.c_str());
     if (!d) return;
-    const std::string prefix = "." + name + ".";
+    const std::string prefix = "." + name + "." + HostName() + ".";
     while (dirent* e = ::readdir(d)) {
         std::string entry = e->d_name;
         if (entry.size() <= prefix.size() + 8 || entry.compare(0, prefix.size(), prefix) != 0 ||
@@ -106,7 +119,10 @@ AtomicFile::AtomicFile(std::string path, Content content) : path_(std::move(path
         if (S_ISLNK(st.st_mode)) {
             char* real = ::realpath(path_.c_str(), nullptr);
             if (!real) {
-                error_ = "'" + path_ + "' is a symbolic link to nothing";
+                if (errno == ENOENT)
+                    error_ = "'" + path_ + "' is a symbolic link to nothing";
+                else
+                    Fail("cannot follow the symbolic link '" + path_ + "'", errno);
                 return;
             }
             target_ = real;
@@ -131,7 +147,7 @@ AtomicFile::AtomicFile(std::string path, Content content) : path_(std::move(path
     }
     const std::string dir = DirectoryOf(target_), name = NameOf(target_);
     RemoveStaleTemporaries(dir, name);
-    temp_ = dir + "/." + name + "." + std::to_string(::getpid()) + ".partial";
+    temp_ = dir + "/." + name + "." + HostName() + "." + std::to_string(::getpid()) + ".partial";
     slot_ = Register(temp_);
     if (!Step("open")) {
         Fail("cannot create '" + temp_ + "'", EIO);
@@ -153,7 +169,7 @@ AtomicFile::AtomicFile(std::string path, Content content) : path_(std::move(path
 AtomicFile::~AtomicFile() {
     if (fd_ >= 0) ::close(fd_);
     if (!temp_.empty()) ::unlink(temp_.c_str());
-    if (slot_ >= 0) g_used[slot_] = 0;
+    if (slot_ >= 0) g_state[slot_].store(0);
 }
 
 bool AtomicFile::Fail(const std::string& what, int err) {
@@ -188,7 +204,7 @@ bool AtomicFile::Commit() {
     if (::rename(temp_.c_str(), target_.c_str()) != 0)
         return Fail("cannot move the new file into place as '" + target_ + "'", errno);
     SyncDirectory(DirectoryOf(target_));
-    if (slot_ >= 0) g_used[slot_] = 0;
+    if (slot_ >= 0) g_state[slot_].store(0);
     slot_ = -1;
     temp_.clear();
     return true;

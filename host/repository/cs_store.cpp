@@ -644,8 +644,10 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     mgr.texts_ = std::move(staged.texts_);
     mgr.object_lists_ = std::move(staged.object_lists_);
     staged.texts_ = std::make_unique<Ndm_NamePool>();
-    mgr.same_as_file_.clear();
-    if (view && !same_design) mgr.Resolve();
+    if (view && !same_design)
+        mgr.Resolve();  // what the file holds is no longer what the repository holds
+    else
+        mgr.Unchanged(path);
     return outcome;
 }
 
@@ -676,7 +678,5 @@ Cs_ReturnCode Cs_ConstraintMgr::Commit(const Port::StringBase<char>& file) const
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::Restore(const Port::StringBase<char>& file) {
-    store_outcome_ = Cs_Store::Restore(*this, file.str());
-    if (store_outcome_ && same_as_file_.empty()) Unchanged(file.str());  // unless it had to resolve again
-    return store_outcome_;
+    return store_outcome_ = Cs_Store::Restore(*this, file.str());
 }

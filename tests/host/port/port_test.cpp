@@ -1,5 +1,6 @@
 // Portability layer: string helpers, formatting, the host string, messages, atomic files.
 #include <gtest/gtest.h>
+#include <algorithm>
 #include <simdjson.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -247,9 +248,18 @@ TEST(FileTest, SavesReplaceOnlyWhatTheyMay) {
     EXPECT_TRUE(fs::is_symlink(dir / "link"));
     EXPECT_EQ(content(target), "through");
     // a leftover of a process that is gone is removed by the next save of the same file
-    std::ofstream(dir / ".out.txt.999999999.partial") << "stale";
+    char host[256] = {};
+    ::gethostname(host, sizeof host - 1);
+    std::string machine = *host ? host : "host";  // as temporaries name it
+    std::replace(machine.begin(), machine.end(), '.', '_');
+    std::replace(machine.begin(), machine.end(), '/', '_');
+    const std::string stale = ".out.txt." + machine + ".999999999.partial";
+    std::ofstream(dir / stale) << "stale";
+    std::ofstream(dir / ".out.txt.otherhost.999999999.partial") << "another machine's";
     ASSERT_EQ(save(target, "again"), "");
-    EXPECT_FALSE(fs::exists(dir / ".out.txt.999999999.partial"));
+    EXPECT_FALSE(fs::exists(dir / stale));
+    EXPECT_TRUE(fs::exists(dir / ".out.txt.otherhost.999999999.partial"));
+    fs::remove(dir / ".out.txt.otherhost.999999999.partial");
 
     // a save stopped by SIGTERM takes its temporary with it
     if (pid_t child = ::fork(); child == 0) {

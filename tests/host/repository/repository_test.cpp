@@ -338,6 +338,10 @@ TEST_F(Repo, CommitThenRestoreGivesTheSameRepository) {
             if (std::string(c->GetTarget()) == "dbg_probe") probe = c;
         ASSERT_NE(probe, nullptr);
         EXPECT_EQ(probe->GetAssociatedDesignObjs().size(), same ? 0u : 1u);
+        // resolved again, the repository no longer holds what the file holds: a commit writes it
+        const auto before = inode(file);
+        ASSERT_TRUE(again.Commit(file.c_str()));
+        EXPECT_EQ(inode(file) == before, same);
     }
     Cs_ConstraintMgr unbound;
     ASSERT_TRUE(unbound.Restore(file.c_str()));
