@@ -474,6 +474,12 @@ Ndh_PropInFilter::Ndh_PropInFilter(const char* definition_file, const PM_SPEC* /
 
 Ndh_PropInFilter::~Ndh_PropInFilter() = default;
 
+void Ndh_PropInFilter::ForgetReadDefinitions() {
+    Cache& cache = TheCache();
+    std::lock_guard<std::mutex> lock(cache.mutex);
+    cache.by_path.clear();
+}
+
 std::string Ndh_PropInFilter::CanonicalName(const char* name) const {
     if (!defs_ || !name) return {};
     return Lookup(*defs_, name, kAllKinds).stored;

@@ -61,6 +61,10 @@ public:
     Ndh_PropInFilter(const Ndh_PropInFilter&) = default;
     Ndh_PropInFilter& operator=(const Ndh_PropInFilter&) = default;
 
+    // Forgets the definitions read so far: a later filter reads its file again. For a tool
+    // that rewrites a definition file within one process.
+    static void ForgetReadDefinitions();
+
     bool IsValid() const { return defs_ != nullptr; }
     // Text of the error issued at construction; empty for a valid filter.
     const std::string& GetError() const { return error_; }

@@ -293,6 +293,9 @@ TEST(FilterDefinitions, BareNamesResolveThroughDataDirAndParseOnce) {
     dir.Write("once.pfd", "SECOND string net\n");
     EXPECT_EQ(Ndh_PropInFilter(path.c_str(), nullptr).CanonicalName("FIRST"), "FIRST");
     EXPECT_EQ(Ndh_PropInFilter(path.c_str(), nullptr).CanonicalName("SECOND"), "");
+    // Until the definitions read are forgotten.
+    Ndh_PropInFilter::ForgetReadDefinitions();
+    EXPECT_EQ(Ndh_PropInFilter(path.c_str(), nullptr).CanonicalName("SECOND"), "SECOND");
 }
 
 struct ShippedFilter : ::testing::TestWithParam<const char*> {};
