@@ -99,7 +99,7 @@ bool IsPredefinedGroup(std::string_view name) {
 }
 
 // Statements that name groups: TIMESPEC, TIMEGRP and the OFFSET forms. ENABLE and DISABLE name
-// timing specifications.
+// TIMESPEC entries.
 bool NamesGroups(const Cs_Constraint& c) {
     if (c.GetScope() != Cs_Scope::TimeSpec && c.GetScope() != Cs_Scope::TimeGroup) return false;
     return !Is(c.GetAttribute(), "ENABLE") && !Is(c.GetAttribute(), "DISABLE");

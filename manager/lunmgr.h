@@ -1,7 +1,7 @@
 // Ta_LunMgr: the annotator for every kind of constraint statement. It resolves the names of
 // INST, NET and PIN statements to design objects (exactly, ignoring case, with ".PAD" and
 // bus-delimiter retries, with wildcards), turns each constraint into a typed property,
-// stores timing specifications and global settings on constraint blocks, and reports names
+// stores TIMESPEC entries and global settings on constraint blocks, and reports names
 // that match nothing through the unmatched-object policy.
 #pragma once
 

@@ -1,5 +1,5 @@
 // Ta_LunMgr: TIMESPEC statements (periods, path delays, timing ignores, dropped
-// specifications) and ENABLE/DISABLE, stored as entries of the TIMESPEC constraint block.
+// timing entries) and ENABLE/DISABLE, stored as entries of the TIMESPEC constraint block.
 #include "host/parser/pr_block_texts.h"
 #include "host/port/msgman.h"
 #include "manager/lunmgr.h"

@@ -98,7 +98,7 @@ void AddAnnotateCommand(CLI::App& app, QuillmapAction& run, const QuillmapOption
         "annotate",
         "Annotate a design with the constraints of UCF and NCF files.\n"
         "The files are applied in the order given. Every INST, NET and PIN statement puts its\n"
-        "constraints on the objects it names; timing specifications, groups and global\n"
+        "constraints on the objects it names; TIMESPEC entries, groups and global\n"
         "settings go to constraint blocks. Unmatched names, illegal values and conflicts are\n"
         "reported with the file name and line.\n"
         "Before the annotator reads a UCF, the part reader takes its CONFIG PART (and the PART\n"
