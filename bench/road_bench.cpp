@@ -28,7 +28,7 @@ double Run(Ndm_Design* design, const std::string& project, const std::string& uc
     Util_FNameGroup files;
     if (!restored) files.add_fname(ucf.c_str());
     bridge.Annotate(&files, files.num_fnames(), true);
-    Ta_LunCSHelper::AssociationDrc(mgr.GetFindings(), false, false);
+    Ta_LunCSHelper::AssociationDrc(mgr.GetResolutionFindings(), false, false);
     bridge.ReportConflicts();
     bridge.Commit();
     bridge.WriteConstraintsToNgd(true);

@@ -22,11 +22,15 @@ const char* kDescription =
 
 }  // namespace
 
+Port_MsgManData QuillmapMsg(int line) {
+    return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0");
+}
+
 bool QuillmapOutputIsNew(const std::string& output, const std::vector<std::string>& inputs) {
     if (output.empty()) return true;
     for (const std::string& input : inputs) {
         if (input.empty() || !Port::SameFile(output, input)) continue;
-        Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+        QuillmapMsg(__LINE__)
             .issueError("The output file '%s' is the input file '%s': give another output file.\n", output.c_str(),
                         input.c_str());
         return false;
@@ -63,7 +67,7 @@ bool QuillmapProjectNameIsValid(const std::string& project) {
     bool ok = project.size() >= 5 && project[project.size() - 4] == '.' && project[project.size() - 5] != '/';
     for (size_t i = project.size() - 3; ok && i < project.size(); ++i) ok = project[i] != '.' && project[i] != '/';
     if (!ok)
-        Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+        QuillmapMsg(__LINE__)
             .issueError("The project file name '%s' must end in a three-letter extension such as .qpf: the "
                         "constraint repository is kept in the folder named by the rest of it.\n",
                         project.c_str());
@@ -127,7 +131,7 @@ int QuillmapMain(int argc, char** argv) {
         const bool flushed = std::fflush(stdout) == 0;
         const int why = !flushed && errno ? errno : (earlier ? earlier : EIO);
         if (!flushed || std::ferror(stdout) || !std::cout) {
-            Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+            QuillmapMsg(__LINE__)
                 .issueError("Cannot write to the standard output: %s.\n", std::strerror(why));
             if (status == kStatusOk) status = kStatusErrors;
         }

@@ -16,6 +16,10 @@ class Ndm_Block;
 class Ndm_Design;
 class Ndm_View;
 class Pr_FileText;
+class Port_MsgManData;
+
+// The message object of quillmap's own messages.
+Port_MsgManData QuillmapMsg(int line);
 
 // Exit statuses of quillmap.
 enum QuillmapStatus { kStatusOk = 0, kStatusErrors = 1, kStatusFatal = 2 };

@@ -22,13 +22,11 @@ struct CheckArgs {
     std::vector<std::string> disable;
 };
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
-
 int RunCheck(const CheckArgs& args) {
     if (!QuillmapOutputIsNew(args.report, args.in.Paths())) return kStatusFatal;
     const auto files = args.in.FilesInOrder();
     if (files.empty()) {
-        Msg(__LINE__).issueError("Give the constraint files to check with --ucf or --ncf.\n");
+        QuillmapMsg(__LINE__).issueError("Give the constraint files to check with --ucf or --ncf.\n");
         return kStatusFatal;
     }
     Ck_KindSet kinds;
@@ -68,7 +66,7 @@ int RunCheck(const CheckArgs& args) {
     if (!args.report.empty()) {
         std::string error;
         if (!Ck_WriteHtmlReport(check, args.in.design, args.report, error)) {
-            Msg(__LINE__).issueError("Could not write '%s': %s\n", args.report.c_str(), error.c_str());
+            QuillmapMsg(__LINE__).issueError("Could not write '%s': %s\n", args.report.c_str(), error.c_str());
             return kStatusErrors;
         }
     }

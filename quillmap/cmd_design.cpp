@@ -62,7 +62,7 @@ std::unique_ptr<Ndm_Design> QuillmapLoadDesign(const std::string& path, const st
 
 Ndm_View* QuillmapWorkView(Ndm_Design& design, const std::string& path, const char* purpose) {
     if (Ndm_View* view = design.GetWorkView()) return view;
-    Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+    QuillmapMsg(__LINE__)
         .issueError("Design '%s' has no view to %s.\n", path.c_str(), purpose);
     return nullptr;
 }
@@ -92,7 +92,7 @@ static void AddDumpCommand(CLI::App& app, QuillmapAction& run) {
             std::ostream text(&buf);
             Ndm_Dump(*design, text);
             if (!text || !out.Commit()) {
-                Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0")
+                QuillmapMsg(__LINE__)
                     .issueError("Could not write '%s': %s\n", args.output.c_str(), out.error().c_str());
                 return static_cast<int>(kStatusErrors);
             }

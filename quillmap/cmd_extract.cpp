@@ -19,8 +19,6 @@ struct ExtractArgs {
     std::string output;
 };
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
-
 int RunExtract(const ExtractArgs& args) {
     if (!QuillmapOutputIsNew(args.output, {args.design})) return kStatusFatal;
     auto design = QuillmapLoadDesign(args.design, args.top);
@@ -42,7 +40,7 @@ int RunExtract(const ExtractArgs& args) {
     }
     Port::AtomicFile out(args.output);
     if (!out.Write(text.str()) || !out.Commit()) {
-        Msg(__LINE__).issueError("Could not write '%s': %s\n", args.output.c_str(), out.error().c_str());
+        QuillmapMsg(__LINE__).issueError("Could not write '%s': %s\n", args.output.c_str(), out.error().c_str());
         return kStatusErrors;
     }
     return kStatusOk;

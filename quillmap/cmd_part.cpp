@@ -13,8 +13,6 @@
 
 namespace {
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
-
 // The part reader as annotate runs it ahead of the manager over a UCF: it keeps only the PART
 // (the manager passes over a UCF's PART and stores every other CONFIG setting itself), is
 // silent about parse errors, which the manager reports, and warns when the PART constraint of
@@ -55,7 +53,7 @@ private:
         bool ok = handle_statement();
         std::string after = Part();
         if (!before.empty() && after != before)
-            Msg(__LINE__).issueWarning("Line %i in '%s': PART = %s replaces the part %s read before.\n",
+            QuillmapMsg(__LINE__).issueWarning("Line %i in '%s': PART = %s replaces the part %s read before.\n",
                                        handle ? handle->getline() : 0, constraint_filename, after.c_str(),
                                        before.c_str());
         return ok;
@@ -121,7 +119,7 @@ int RunPart(const PartArgs& args, const QuillmapOptions& options) {
                 out.push_back(args.files.size() > 1 ? file + ": " + line : line);
         }
     }
-    if (parts.empty()) Msg(__LINE__).issueWarning("No PART setting found in the constraint files.\n");
+    if (parts.empty()) QuillmapMsg(__LINE__).issueWarning("No PART setting found in the constraint files.\n");
     QuillmapWarnDifferentParts(parts, {});
     for (const std::string& line : out) std::cout << line << "\n";
     std::cout.flush();
@@ -164,9 +162,9 @@ void QuillmapWarnDifferentParts(const std::vector<QuillmapPartSource>& parts, co
         list += (list.empty() ? "" : ", ") + ("PART = " + p.part + " in '" + p.source + "'");
     for (const std::string& part : kept) after += (after.empty() ? "" : ", ") + ("PART = " + part);
     if (kept.empty())
-        Msg(__LINE__).issueWarning("The constraint files name different parts: %s.\n", list.c_str());
+        QuillmapMsg(__LINE__).issueWarning("The constraint files name different parts: %s.\n", list.c_str());
     else
-        Msg(__LINE__).issueWarning("The constraint files name different parts: %s. The design keeps %s.\n",
+        QuillmapMsg(__LINE__).issueWarning("The constraint files name different parts: %s. The design keeps %s.\n",
                                    list.c_str(), after.c_str());
 }
 

@@ -119,7 +119,7 @@ void PrintJson(const Cs_Constraint& c, const Resolved& r, std::string& out) {
 }
 
 int RunRepo(const RepoArgs& args) {
-    auto msg = Port_MsgManData::createObject("Quillmap", "quillmap", __LINE__, "1.0");
+    auto msg = QuillmapMsg(__LINE__);
     if (!QuillmapProjectNameIsValid(args.project)) return kStatusFatal;
     const std::string path = Ta_LunCSHelper::RepositoryPath(Port::StringBase<char>(args.project)).str();
     if (!Port::File::exist(path.c_str())) {

@@ -17,8 +17,6 @@
 
 namespace {
 
-Port_MsgManData Msg(int line) { return Port_MsgManData::createObject("Quillmap", "quillmap", line, "1.0"); }
-
 // The repository's folder, removed again when the run wrote nothing into it.
 class RepositoryFolder {
 public:
@@ -32,15 +30,6 @@ public:
 private:
     std::string file_;
 };
-
-// The findings of the last resolution (no design match, groups nobody defines): the parse
-// statuses are reported where the files are read.
-Cs_ReturnCode ResolutionFindings(const Cs_ConstraintMgr& mgr) {
-    Cs_ReturnCode findings;
-    for (const auto& status : mgr.GetFindings())
-        if (!dynamic_cast<const Cs_Status_Parse*>(status.get())) findings.Add(status);
-    return findings;
-}
 
 // Whether every file can be read now (a restored repository still holds what a file that has
 // gone away gave; reading the files again reports it).
@@ -74,7 +63,7 @@ int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::functi
     try {
         bridge.emplace(Port::StringBase<char>(request.project), Port::StringBase<char>("ovi"));
     } catch (const Util::IllegalMethodCalledException&) {
-        Msg(__LINE__).issueInternal("A constraint repository bridge exists already.\n");
+        QuillmapMsg(__LINE__).issueInternal("A constraint repository bridge exists already.\n");
         return kStatusErrors;
     }
     const std::string bcd = bridge->GetBcdPath().str();
@@ -85,13 +74,13 @@ int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::functi
         return file_road();
     }
     if (request.has_ncf) {
-        Msg(__LINE__).issueError(
+        QuillmapMsg(__LINE__).issueError(
             "NCF files cannot be read through the constraint repository: give them without --project, or set "
             "ZEP_QUILLMAP_CS to 0 to read every file without the repository.\n");
         return kStatusFatal;
     }
     if (!request.file_road_options.empty()) {
-        Msg(__LINE__).issueError(
+        QuillmapMsg(__LINE__).issueError(
             "%s cannot be used with the constraint repository, which reads the files by its own rules: give them "
             "without --project, or set ZEP_QUILLMAP_CS to 0.\n",
             request.file_road_options.c_str());
@@ -114,22 +103,22 @@ int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::functi
             copy->SetSeverity(Cs_Status::WARNING);
             copy->Report();
         }
-        Msg(__LINE__).issueStatus("The constraints are read from the constraint files again.\n");
+        QuillmapMsg(__LINE__).issueStatus("The constraints are read from the constraint files again.\n");
         mgr.DeleteAllConstraints();
     } else if (had_repository && SameSources(mgr, request.ucf) && !AllReadable(request.ucf)) {
-        Msg(__LINE__).issueStatus(
+        QuillmapMsg(__LINE__).issueStatus(
             "A constraint file of the constraint repository '%s' cannot be read: every file is read again.\n",
             bcd.c_str());
         mgr.DeleteAllConstraints();
     } else if (had_repository && SameSources(mgr, request.ucf)) {
         size_t again = 0;
         for (const Cs_FileInfo* source : mgr.GetConstraintSources()) again += source->ReadHere();
-        Msg(__LINE__).issueStatus("Restored the constraint repository '%s': %zu constraints of %s, %s.\n", bcd.c_str(),
+        QuillmapMsg(__LINE__).issueStatus("Restored the constraint repository '%s': %zu constraints of %s, %s.\n", bcd.c_str(),
                                   mgr.GetNumConstraints(), Count(request.ucf.size(), "file").c_str(),
                                   again == 0 ? "none changed" : (Count(again, "file") + " read again").c_str());
         restored = true;
     } else if (had_repository) {
-        Msg(__LINE__).issueStatus(
+        QuillmapMsg(__LINE__).issueStatus(
             "The constraint files differ from those of the constraint repository '%s': every file is read again.\n",
             bcd.c_str());
         mgr.DeleteAllConstraints();
@@ -141,7 +130,7 @@ int QuillmapRepositoryRoad(const QuillmapRoadRequest& request, const std::functi
         for (const std::string& file : request.ucf) files.add_fname(file.c_str());
     bridge->Annotate(&files, files.num_fnames(), true);
 
-    Ta_LunCSHelper::AssociationDrc(ResolutionFindings(mgr), request.allow_unmatched_io,
+    Ta_LunCSHelper::AssociationDrc(mgr.GetResolutionFindings(), request.allow_unmatched_io,
                                    request.allow_unmatched_maxdelay);
     bridge->ReportConflicts();
     if (!bridge->Commit())

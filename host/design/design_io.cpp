@@ -1,6 +1,5 @@
 #include "host/design/design_io.h"
 
-#include <sys/stat.h>
 
 #include "host/design/json_input.h"
 
@@ -11,6 +10,7 @@
 
 #include "host/design/native_format.h"
 #include "host/design/yosys_reader.h"
+#include "host/port/file.h"
 #include "host/port/msgman.h"
 
 namespace {
@@ -31,15 +31,11 @@ std::unique_ptr<Ndm_Design> Ndm_LoadDesign(const char* path, const char* top_mod
         Msg().issueError("%s", Port_Format("Cannot read design file '%s': %s.", path, std::strerror(errno)).c_str());
         return nullptr;
     }
-    struct stat st {};
-    const bool known = ::stat(path, &st) == 0 && S_ISREG(st.st_mode);
+    // The file as it was before it was read (a change while reading makes a new stamp).
+    const std::string identity = Port::File::Identity(path);
     auto stamp = [&](std::unique_ptr<Ndm_Design> design) {
-        if (design && known)
-            design->SetSourceStamp(Port_Format("%llu:%llu:%lld:%lld.%09ld:", static_cast<unsigned long long>(st.st_dev),
-                                               static_cast<unsigned long long>(st.st_ino),
-                                               static_cast<long long>(st.st_size),
-                                               static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec) +
-                                   design->GetName());  // the top module chosen counts too
+        if (design && !identity.empty())
+            design->SetSourceStamp(identity + ":" + design->GetName());  // the top module chosen counts too
         return design;
     };
     if (!Ndm_IsNativeText(head, got)) return stamp(Ndm_ReadYosysJson(path, top_module, max_cells));

@@ -45,6 +45,13 @@ bool File::exist(const char* path) {
     return path && ::stat(path, &st) == 0;
 }
 
+std::string File::Identity(const char* path) {
+    struct stat st;
+    if (!path || ::stat(path, &st) != 0) return {};
+    return std::to_string(st.st_dev) + ":" + std::to_string(st.st_ino) + ":" + std::to_string(st.st_size) + ":" +
+           std::to_string(st.st_mtim.tv_sec) + "." + std::to_string(st.st_mtim.tv_nsec);
+}
+
 bool File::mkdir(const char* path, bool parents) {
     if (!path || !*path) return false;
     if (parents) {

@@ -89,6 +89,8 @@ public:
     // What the repository found about its content: the parse statuses of every source, then
     // the statuses of the last resolution.
     Cs_ReturnCode GetFindings() const;
+    // The statuses of the last resolution only.
+    const Cs_ReturnCode& GetResolutionFindings() const { return resolution_; }
     // Empties the repository: constraints and sources (the design stays bound).
     void DeleteAllConstraints();
     // A new, empty repository for the same design, owned by the caller.

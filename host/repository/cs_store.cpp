@@ -1,8 +1,6 @@
 // The repository file: an SQLite database that Commit builds beside the old file and renames
 // into place, and that Restore reads back after checking its format, its structure and the
 // checksum of its content. docs/repository.md documents the schema.
-#include <fcntl.h>
-#include <sys/stat.h>
 #include <sqlite3.h>
 #include <unistd.h>
 
@@ -18,6 +16,7 @@
 #include "host/design/ndm.h"
 #include "host/design/ndm_lookup.h"
 #include "host/port/atomic_file.h"
+#include "host/port/file.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
 
@@ -651,26 +650,15 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     return outcome;
 }
 
-namespace {
-
-std::string FileIdentity(const std::string& path) {
-    struct stat st {};
-    if (::stat(path.c_str(), &st) != 0) return {};
-    return Port_Format("%llu:%llu:%lld:%lld.%09ld", static_cast<unsigned long long>(st.st_dev),
-                       static_cast<unsigned long long>(st.st_ino), static_cast<long long>(st.st_size),
-                       static_cast<long long>(st.st_mtim.tv_sec), st.st_mtim.tv_nsec);
-}
-
-}  // namespace
 
 void Cs_ConstraintMgr::Unchanged(const std::string& file) const {
     same_as_file_ = file;
-    same_as_identity_ = FileIdentity(file);
+    same_as_identity_ = Port::File::Identity(file.c_str());
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::Commit(const Port::StringBase<char>& file) const {
     const std::string path = file.str();
-    if (!same_as_file_.empty() && same_as_file_ == path && same_as_identity_ == FileIdentity(path))
+    if (!same_as_file_.empty() && same_as_file_ == path && same_as_identity_ == Port::File::Identity(path.c_str()))
         return store_outcome_ = Cs_ReturnCode();
     store_outcome_ = Cs_Store::Commit(*this, path);
     if (store_outcome_) Unchanged(path);
