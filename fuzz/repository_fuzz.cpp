@@ -1,10 +1,12 @@
 // The repository file reader. Bit 0 of the first byte: the rest is the file (0), or groups of
 // four bytes flip bytes of a file committed from the example (1): a 24-bit offset and the bits
-// to flip. Bit 1: restore without the design bound. A file restored is committed again, and
-// that file must restore.
+// to flip. Bit 1: restore without the design bound. Bit 2: seal the file again, so that restoring
+// trusts and decodes its damaged snapshot. A file restored is committed again, and that file must
+// restore.
 #include "fuzz/fuzz_support.h"
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
+#include "host/repository/cs_rows.h"
 
 namespace {
 
@@ -46,6 +48,8 @@ int LunFuzzRepository(const uint8_t* data, size_t size) {
         bytes.assign(reinterpret_cast<const char*>(data) + 1, size - 1);
     }
     const std::string path = lun_fuzz::Write("input.qbcd", bytes);
+    std::string error;
+    if (data[0] & 4) Cs_Rows::SealFile(path, error);
     try {
         auto design = lun_fuzz::Blinky();
         const Ndm_Design* bound = (data[0] & 2) ? nullptr : design.get();

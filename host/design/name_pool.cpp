@@ -64,6 +64,12 @@ const char* Ndm_NamePool::Intern(std::string_view text) {
     return stored;
 }
 
+char* Ndm_NamePool::Keep(size_t size) {
+    chunks_.emplace_back(new char[size ? size : 1]);  // Store fills its chunk through cursor_
+    bytes_ += size;
+    return chunks_.back().get();
+}
+
 const char* Ndm_NamePool::Store(std::string_view text) {
     size_t need = text.size() + 1;
     if (need > left_) {

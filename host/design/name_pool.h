@@ -15,6 +15,9 @@ public:
     // Stored copy when the text was interned before, else null.
     const char* Find(std::string_view text) const;
     size_t bytes() const { return bytes_; }
+    // A block of size bytes that the pool keeps with its texts, for texts a caller lays out
+    // itself (they are not interned).
+    char* Keep(size_t size);
 
     static uint64_t Hash(std::string_view text);
 

@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "host/port/msgman.h"
+#include "host/repository/cs_rows.h"
 
 #define LUN_CS_TYPE(Name)                                  \
     const Cs_ConstraintType& Cs_Constraint_##Name::Type() { \
@@ -30,7 +31,8 @@ LUN_CS_TYPE(Unsupported)
 
 namespace {
 
-// Every typed class, for the factory and the repository file (which stores type names).
+// Every typed class, for the factory and the repository file (whose tables store type names and
+// whose snapshot stores their numbers here: append new classes at the end).
 template <class T>
 std::unique_ptr<Cs_Constraint> Make() {
     return std::make_unique<T>();
@@ -65,6 +67,16 @@ std::unique_ptr<Cs_Constraint> Cs_MakeConstraint(const Cs_ConstraintType& type) 
     for (const TypeEntry& e : kTypes)
         if (e.type() == type) return e.make();
     return nullptr;
+}
+
+int Cs_Rows::TypeNumber(const Cs_ConstraintType& type) {
+    for (size_t i = 0; i < std::size(kTypes); ++i)
+        if (kTypes[i].type() == type) return static_cast<int>(i);
+    return -1;
+}
+
+const Cs_ConstraintType* Cs_Rows::TypeAt(int64_t number) {
+    return number >= 0 && static_cast<size_t>(number) < std::size(kTypes) ? &kTypes[number].type() : nullptr;
 }
 
 const Cs_ConstraintType* Cs_FindConstraintType(const char* name) {

@@ -14,6 +14,10 @@
 
 class Ndm_PropertyHolder;
 class Cs_Constraint;
+class Cs_ConstraintMgr;
+namespace Cs_Rows {
+class Builder;
+}
 
 // A kind of constraint; each typed class has one, compared by identity.
 class Cs_ConstraintType {
@@ -150,6 +154,7 @@ public:
     // The design objects: one is kept in the constraint, more in a list the constraints of one
     // statement share.
     std::span<Ndm_PropertyHolder* const> GetAssociatedDesignObjs() const {
+        if (lazy_) FindPending();
         if (many_) return *many_;
         return one_ ? std::span<Ndm_PropertyHolder* const>(&one_, 1) : std::span<Ndm_PropertyHolder* const>();
     }
@@ -158,7 +163,10 @@ public:
     }
     // The group names a TIMESPEC's paths run through (FROM, THRU, TO), as written.
     const std::vector<const char*>& GetAssociatedPaths() const { return extra_ ? extra_->paths : kNone.paths; }
-    const std::vector<Cs_Conflict>& GetConflicts() const { return extra_ ? extra_->conflicts : kNone.conflicts; }
+    const std::vector<Cs_Conflict>& GetConflicts() const {
+        if (lazy_) FindPending();
+        return extra_ ? extra_->conflicts : kNone.conflicts;
+    }
 
 protected:
     Cs_Constraint() = default;
@@ -167,6 +175,7 @@ private:
     friend class Cs_ConstraintMgr;
     friend class Cs_Loader;
     friend class Cs_Store;
+    friend class Cs_Rows::Builder;
 
     // What only some constraints have, kept aside so that the many constraints of objects
     // stay small: links to other constraints, group names, overrides, a stored entry.
@@ -188,14 +197,19 @@ private:
     Cs_Scope scope_ = Cs_Scope::Design;
     bool flag_ = false;
     Cs_Block block_ = Cs_Block::None;
+    bool lazy_ = false;  // restored, its objects still to be looked up by pending_
     const char* target_ = "";  // texts are owned by the repository
     const char* key_ = "";
     const char* value_ = "";
     const char* statement_ = "";
     Cs_ConstraintSourceInfo source_;
     Ndm_PropertyHolder* one_ = nullptr;
-    const std::vector<Ndm_PropertyHolder*>* many_ = nullptr;  // owned by the repository
+    union {
+        const std::vector<Ndm_PropertyHolder*>* many_ = nullptr;  // owned by the repository
+        Cs_ConstraintMgr* pending_;  // while lazy_: the repository that looks its objects up
+    };
     std::unique_ptr<Extra> extra_;
+    void FindPending() const;
 };
 
 #define LUN_CS_CONSTRAINT_CLASS(Name)                                                  \
@@ -273,6 +287,7 @@ public:
 private:
     friend class Cs_ConstraintMgr;
     friend class Cs_Store;
+    friend class Cs_Rows::Builder;
     std::string name_;
     int syntax_;
     uint64_t hash_ = 0;

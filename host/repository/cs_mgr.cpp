@@ -54,6 +54,7 @@ Cs_ConstraintMgr::Source& Cs_ConstraintMgr::AddSource(const std::string& name, i
 }
 
 Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const Pr_FileText> text) {
+    Settle();
     same_as_file_.clear();
     Cs_ReturnCode outcome;
     const std::string name = source.info->GetFileName();
@@ -104,6 +105,7 @@ Cs_ReturnCode Cs_ConstraintMgr::RemoveConstraintSource(const Port::StringBase<ch
     auto it = std::find_if(sources_.begin(), sources_.end(),
                            [&](const Source& s) { return file.str() == s.info->GetFileName(); });
     if (it == sources_.end()) return {};
+    Settle();
     sources_.erase(it);
     same_as_file_.clear();
     Changed();
@@ -182,6 +184,7 @@ Cs_SharedContainerT<Cs_Constraint*> Cs_ConstraintMgr::GetConstraints(const Cs_Fi
 
 void Cs_ConstraintMgr::DeleteAllConstraints() {
     same_as_file_.clear();
+    pending_.clear();
     sources_.clear();
     loose_.clear();
     object_lists_.clear();

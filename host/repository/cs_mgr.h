@@ -19,6 +19,9 @@
 
 class Ndm_Design;
 class Pr_FileText;
+namespace Cs_Rows {
+class Builder;
+}
 class Ndm_Property;
 
 // For tests: called at each step of a commit ("open", "write", "sync", "close", "rename"); false
@@ -151,6 +154,8 @@ public:
 private:
     friend class Cs_Loader;
     friend class Cs_Store;
+    friend class Cs_Rows::Builder;
+    friend class Cs_Constraint;
     using Constraints = std::vector<std::unique_ptr<Cs_Constraint>>;
     struct Source {
         std::unique_ptr<Cs_FileInfo> info;
@@ -194,4 +199,20 @@ private:
     mutable std::string same_as_identity_;
     void Unchanged(const std::string& file) const;
     std::unordered_map<const Cs_Constraint*, CommittedNames> committed_;
+    // The design objects of restored constraints, by full name, looked up when first asked for
+    // (cs_restore.cpp): a restore then costs what the repository holds, not what the design does.
+    struct PendingObject {
+        Cs_Constraint* constraint;
+        const char* name;                    // kept by texts_
+        uint8_t kind;                        // a Cs_Rows::Object
+        uint8_t conflict;                    // 0: an object it resolved to; else a conflict's type
+        const Cs_Constraint* by = nullptr;   // the conflict's winner
+    };
+    std::vector<PendingObject> pending_;
+    // Looks up every pending object (a constraint asked for its objects or conflicts).
+    void FindPendingObjects();
+    // Before constraints change or go: settles what is pending against the bound design.
+    void Settle() {
+        if (!pending_.empty()) FindPendingObjects();
+    }
 };

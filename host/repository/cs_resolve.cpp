@@ -41,7 +41,9 @@ Cs_ReturnCode Cs_ConstraintMgr::Resolve() {
     Cs_ReturnCode outcome;
     std::vector<Cs_Constraint*> all;
     object_lists_.clear();
+    pending_.clear();
     ForEach([&](Cs_Constraint& c) {
+        c.lazy_ = false;
         c.one_ = nullptr;
         c.many_ = nullptr;
         if (c.extra_) {

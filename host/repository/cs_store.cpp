@@ -1,6 +1,8 @@
-// The repository file: an SQLite database that Commit builds beside the old file and renames
-// into place, and that Restore reads back after checking its format, its structure and the
-// checksum of its content. docs/repository.md documents the schema.
+// The repository file: an SQLite database that Commit builds beside the old file, seals and
+// renames into place. It keeps the content twice: as tables a user queries, and as one snapshot
+// value that Restore decodes when the seal shows the file is as committed; otherwise Restore
+// reads the tables and checks them against the checksum of their content. docs/repository.md
+// documents the schema.
 #include <sqlite3.h>
 #include <unistd.h>
 
@@ -20,13 +22,14 @@
 #include "host/port/msgman.h"
 #include "host/repository/cs_mgr.h"
 
+#include "host/repository/cs_rows.h"
+
 const Cs_ConstraintType* Cs_FindConstraintType(const char* name);
-std::unique_ptr<Cs_Constraint> Cs_MakeConstraint(const Cs_ConstraintType& type);
 
 namespace {
 
 constexpr const char* kFormat = "lun-repository";
-constexpr int kVersion = 3;
+constexpr int kVersion = 4;
 
 Cs_CommitFaultHook g_fault_hook = nullptr;
 
@@ -46,6 +49,7 @@ CREATE TABLE conflict (constraint_id INTEGER REFERENCES constraints(id), type IN
 CREATE TABLE status (source_id INTEGER REFERENCES source(id), status_id INTEGER, severity INTEGER,
                      number INTEGER, message TEXT, file TEXT, line INTEGER,
                      constraint_id INTEGER REFERENCES constraints(id));
+CREATE TABLE snapshot (data BLOB);
 CREATE INDEX constraints_by_target ON constraints(target);
 CREATE INDEX association_by_object ON association(object);
 )";
@@ -112,7 +116,13 @@ public:
     RowRef operator[](size_t row) const { return {this, row}; }
     Iterator begin() const { return {this, 0}; }
     Iterator end() const { return {this, size()}; }
-    std::string_view Text(const Cell& c) const { return {texts_.data() + c.offset, c.size}; }
+    std::string_view Text(const Cell& c) const { return {(kept_ ? kept_ : texts_.data()) + c.offset, c.size}; }
+    // Moves the texts into pool, where they stay (terminated) after the table is gone.
+    void KeepTextsIn(Ndm_NamePool& pool) {
+        kept_ = pool.Keep(texts_.size());
+        std::memcpy(kept_, texts_.data(), texts_.size());
+        std::string().swap(texts_);
+    }
     // Appends the current row of a statement.
     void Add(sqlite3_stmt* st) {
         for (size_t i = 0; i < columns_; ++i) {
@@ -130,6 +140,7 @@ public:
                     cell.offset = static_cast<uint32_t>(texts_.size());
                     cell.size = static_cast<uint32_t>(sqlite3_column_bytes(st, col));
                     if (text) texts_.append(text, cell.size);
+                    texts_.push_back('\0');
                 }
             }
             cells_.push_back(cell);
@@ -140,6 +151,7 @@ private:
     size_t columns_;
     std::vector<Cell> cells_;
     std::string texts_;
+    char* kept_ = nullptr;
 };
 
 int64_t Int(Table::CellRef v) { return v.cell->kind == 1 ? v.cell->number : 0; }
@@ -156,7 +168,6 @@ void AddToChecksum(Checksum& sum, Table::RowRef row) {
     sum.Mix(0xff);
 }
 
-const char* ScopeName(Cs_Scope s) { return Cs_ScopeWord(s); }
 bool ScopeFrom(std::string_view word, Cs_Scope& out) {
     for (Cs_Scope s : {Cs_Scope::Instance, Cs_Scope::Net, Cs_Scope::Pin, Cs_Scope::Design, Cs_Scope::TimeSpec,
                        Cs_Scope::TimeGroup, Cs_Scope::AreaGroup, Cs_Scope::Set, Cs_Scope::Comment})
@@ -177,41 +188,19 @@ bool BlockFrom(std::string_view word, Cs_Block& out) {
 }
 
 // A design object as (kind, full name); networks by their top signal's full name.
-std::pair<const char*, std::string> ObjectName(const Ndm_PropertyHolder* o) {
+std::pair<Cs_Rows::Object, std::string> ObjectName(const Ndm_PropertyHolder* o) {
+    using Cs_Rows::Object;
     switch (o->GetKind()) {
-        case Ndm_ObjKind::Block: return {"block", static_cast<const Ndm_Block*>(o)->GetFullName()};
+        case Ndm_ObjKind::Block: return {Object::Block, static_cast<const Ndm_Block*>(o)->GetFullName()};
         case Ndm_ObjKind::Network: {
             const Ndm_Signal* top = static_cast<const Ndm_Network*>(o)->GetTopSignal();
-            return {"network", top ? top->GetFullName() : std::string()};
+            return {Object::Network, top ? top->GetFullName() : std::string()};
         }
-        case Ndm_ObjKind::Signal: return {"signal", static_cast<const Ndm_Signal*>(o)->GetFullName()};
-        case Ndm_ObjKind::Pin: return {"pin", static_cast<const Ndm_Pin*>(o)->GetFullName()};
-        default: return {"design", o->GetName() ? o->GetName() : ""};
+        case Ndm_ObjKind::Signal: return {Object::Signal, static_cast<const Ndm_Signal*>(o)->GetFullName()};
+        case Ndm_ObjKind::Pin: return {Object::Pin, static_cast<const Ndm_Pin*>(o)->GetFullName()};
+        default: return {Object::Design, o->GetName() ? o->GetName() : ""};
     }
 }
-
-// The object of the view named (kind, full name), or null.
-Ndm_PropertyHolder* FindObject(Ndm_View* view, std::string_view kind, std::string_view full_name) {
-    if (!view || !view->GetBlock()) return nullptr;
-    Ndm_Block* top = view->GetBlock();
-    Ndm_LookupReport silent;
-    const std::string name(full_name);
-    const std::string path = std::string(top->GetName()) + "/" + name;
-    if (kind == "block") return name.empty() ? top : Ndm_Lookup::FindBlockPath(top, path, true, silent);
-    if (kind == "network" || kind == "signal") {
-        Ndm_Signal* s = name.find('/') == std::string::npos ? top->GetSignalByName(name.c_str())
-                                                            : Ndm_Lookup::FindSignalPath(top, path.c_str(), true, silent);
-        if (!s) return nullptr;
-        if (kind == "signal") return s;
-        return s->GetNetwork();
-    }
-    if (kind == "pin") {
-        if (Ndm_Pin* p = top->GetPinByName(name.c_str())) return p;
-        return Ndm_Lookup::FindPinPath(top, path.c_str(), true, silent);
-    }
-    return nullptr;
-}
-
 
 class Db {
 public:
@@ -270,6 +259,24 @@ public:
         if (sum) sum->Add(row);
         return true;
     }
+    bool InsertBlob(const char* sql, const std::string& blob, std::string& error) {
+        sqlite3_stmt* st = Prepare(sql, error);
+        if (!st) return false;
+        sqlite3_bind_blob64(st, 1, blob.data(), blob.size(), SQLITE_STATIC);
+        if (sqlite3_step(st) == SQLITE_DONE) return true;
+        error = sqlite3_errmsg(db_);
+        return false;
+    }
+    // Hands the first column of the first row of a query to take, as bytes; false when there
+    // is none.
+    template <class Take>
+    bool SelectBlob(const char* sql, Take&& take, std::string& error) {
+        sqlite3_stmt* st = Prepare(sql, error);
+        if (!st || sqlite3_step(st) != SQLITE_ROW) return false;
+        const void* data = sqlite3_column_blob(st, 0);
+        take(static_cast<const char*>(data), static_cast<size_t>(sqlite3_column_bytes(st, 0)));
+        return true;
+    }
     // Reads every row of a query.
     bool Select(const char* sql, Table& rows, std::string& error) {
         sqlite3_stmt* st = Prepare(sql, error);
@@ -302,6 +309,168 @@ std::shared_ptr<Cs_Status> Problem(const char* verb, const std::string& path, co
 bool Step(const char* step) { return !g_fault_hook || g_fault_hook(step); }
 
 
+// Writes the rows into the tables, summing them up in the checksum the table reader checks.
+class TableWriter : public Cs_Rows::Sink {
+public:
+    explicit TableWriter(Db& db) : db_(db) {}
+    bool Add(const Cs_Rows::Source& r) override {
+        return Insert("INSERT INTO source VALUES (?,?,?,?,?,?)",
+                      {++sources_, Text(r.file), r.syntax, static_cast<int64_t>(r.hash), static_cast<int64_t>(r.size),
+                       int64_t{r.read}});
+    }
+    bool Add(const Cs_Rows::Constraint& r) override {
+        const bool block = r.block != Cs_Block::None;
+        return Insert("INSERT INTO constraints VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?)",
+                      {r.id, Id(r.source), r.line, std::string(r.type->GetName()), std::string(Cs_ScopeWord(r.scope)),
+                       Text(r.target), Text(r.key), Text(r.value), int64_t{r.flag}, Text(r.statement), Id(r.parent),
+                       block ? Value(std::string(Cs_BlockWord(r.block))) : Value(), block ? Text(r.entry) : Value(),
+                       block ? Text(r.stored) : Value()});
+    }
+    bool Add(const Cs_Rows::Path& r) override {
+        return Insert("INSERT INTO path VALUES (?,?)", {r.constraint, Text(r.group)});
+    }
+    bool Add(const Cs_Rows::Association& r) override {
+        const bool other = r.kind == Cs_Rows::Object::Constraint;
+        return Insert("INSERT INTO association VALUES (?,?,?,?)",
+                      {r.constraint, std::string(Cs_Rows::ObjectWord(r.kind)), other ? Value() : Text(r.object),
+                       other ? Id(r.other) : Value()});
+    }
+    bool Add(const Cs_Rows::Conflict& r) override {
+        const bool object = r.kind != Cs_Rows::Object::None;
+        return Insert("INSERT INTO conflict VALUES (?,?,?,?,?)",
+                      {r.constraint, r.type, object ? Value(std::string(Cs_Rows::ObjectWord(r.kind))) : Value(),
+                       object ? Text(r.object) : Value(), Id(r.by)});
+    }
+    bool Add(const Cs_Rows::Status& r) override {
+        const bool file = !r.file.empty();
+        return Insert("INSERT INTO status VALUES (?,?,?,?,?,?,?,?)",
+                      {Id(r.source), r.id, r.severity, r.number, Text(r.message), file ? Text(r.file) : Value(),
+                       file ? Value(r.line) : Value(), Id(r.constraint)});
+    }
+    uint64_t checksum() const { return sum_.h; }
+
+private:
+    static Value Text(std::string_view text) { return std::string(text); }
+    static Value Id(int64_t id) { return id ? Value(id) : Value(); }
+    bool Insert(const char* sql, const Row& row) { return db_.Insert(sql, row, &sum_, why_); }
+    Db& db_;
+    Checksum sum_;
+    int64_t sources_ = 0;
+};
+
+// Hands every row to both sinks.
+class BothSinks : public Cs_Rows::Sink {
+public:
+    BothSinks(Cs_Rows::Sink& a, Cs_Rows::Sink& b) : a_(a), b_(b) {}
+    bool Add(const Cs_Rows::Source& r) override { return Both(r); }
+    bool Add(const Cs_Rows::Constraint& r) override { return Both(r); }
+    bool Add(const Cs_Rows::Path& r) override { return Both(r); }
+    bool Add(const Cs_Rows::Association& r) override { return Both(r); }
+    bool Add(const Cs_Rows::Conflict& r) override { return Both(r); }
+    bool Add(const Cs_Rows::Status& r) override { return Both(r); }
+
+private:
+    template <class R>
+    bool Both(const R& r) {
+        if (a_.Add(r) && b_.Add(r)) return true;
+        why_ = !a_.why().empty() ? a_.why() : b_.why();
+        return false;
+    }
+    Cs_Rows::Sink& a_;
+    Cs_Rows::Sink& b_;
+};
+
+// Reads the tables back into rows after checking them against the checksum of their content.
+bool ReadTables(Db& db, const std::string& checksum, Ndm_NamePool& pool, Cs_Rows::Sink& sink, std::string& why) {
+    std::string error;
+    Table sources(6), constraints(14), paths(2), assocs(4), conflicts(5), statuses(8);
+    // Rows of the per-constraint tables come back in the order they were written, which
+    // interleaves them per constraint; read them that way so that the checksum agrees.
+    if (!db.Select("SELECT * FROM source ORDER BY rowid", sources, error) ||
+        !db.Select("SELECT * FROM constraints ORDER BY rowid", constraints, error) ||
+        !db.Select("SELECT * FROM path ORDER BY rowid", paths, error) ||
+        !db.Select("SELECT * FROM association ORDER BY rowid", assocs, error) ||
+        !db.Select("SELECT * FROM conflict ORDER BY rowid", conflicts, error) ||
+        !db.Select("SELECT * FROM status ORDER BY rowid", statuses, error)) {
+        why = "it is damaged (" + error + ")";
+        return false;
+    }
+    // The checksum covers the rows in writing order: the sources, each constraint with its
+    // paths, associations and conflicts, then the statuses.
+    {
+        Checksum again;
+        for (Table::RowRef r : sources) AddToChecksum(again, r);
+        size_t p = 0, a = 0, k = 0;
+        for (Table::RowRef c : constraints) {
+            AddToChecksum(again, c);
+            int64_t id = Int(c[0]);
+            while (p < paths.size() && Int(paths[p][0]) == id) AddToChecksum(again, paths[p++]);
+            while (a < assocs.size() && Int(assocs[a][0]) == id) AddToChecksum(again, assocs[a++]);
+            while (k < conflicts.size() && Int(conflicts[k][0]) == id) AddToChecksum(again, conflicts[k++]);
+        }
+        for (Table::RowRef r : statuses) AddToChecksum(again, r);
+        char hex[32];
+        std::snprintf(hex, sizeof hex, "%016llx", static_cast<unsigned long long>(again.h));
+        if (p != paths.size() || a != assocs.size() || k != conflicts.size() || checksum != hex) {
+            why = "it is damaged (its content does not match its checksum)";
+            return false;
+        }
+    }
+    for (Table* t : {&sources, &constraints, &paths, &assocs, &conflicts, &statuses}) t->KeepTextsIn(pool);
+    auto feed = [&](const auto& row) {
+        if (sink.Add(row)) return true;
+        why = sink.why();
+        return false;
+    };
+    auto damaged = [&](const char* what) {
+        why = std::string("it is damaged (") + what + ")";
+        return false;
+    };
+    for (Table::RowRef r : sources)
+        if (!feed(Cs_Rows::Source{Str(r[1]), Int(r[2]), static_cast<uint64_t>(Int(r[3])),
+                                  static_cast<uint64_t>(Int(r[4])), Int(r[5]) != 0}))
+            return false;
+    size_t p = 0, a = 0, k = 0;
+    for (Table::RowRef r : constraints) {
+        Cs_Rows::Constraint c;
+        c.id = Int(r[0]);
+        c.source = Int(r[1]);
+        c.line = Int(r[2]);
+        c.type = Cs_FindConstraintType(std::string(Str(r[3])).c_str());
+        if (!c.type || !ScopeFrom(Str(r[4]), c.scope)) return damaged("unknown constraint kind");
+        c.target = Str(r[5]);
+        c.key = Str(r[6]);
+        c.value = Str(r[7]);
+        c.flag = Int(r[8]) != 0;
+        c.statement = Str(r[9]);
+        c.parent = Int(r[10]);
+        if (!IsNull(r[11])) {
+            if (!BlockFrom(Str(r[11]), c.block)) return damaged("unknown constraint block");
+            c.entry = Str(r[12]);
+            c.stored = Str(r[13]);
+        }
+        if (!feed(c)) return false;
+        for (; p < paths.size() && Int(paths[p][0]) == c.id; ++p)
+            if (!feed(Cs_Rows::Path{c.id, Str(paths[p][1])})) return false;
+        for (; a < assocs.size() && Int(assocs[a][0]) == c.id; ++a) {
+            Cs_Rows::Association row{c.id, Cs_Rows::Object::None, Str(assocs[a][2]), Int(assocs[a][3])};
+            if (!Cs_Rows::ObjectFrom(Str(assocs[a][1]), row.kind)) return damaged("unknown kind of object");
+            if (!feed(row)) return false;
+        }
+        for (; k < conflicts.size() && Int(conflicts[k][0]) == c.id; ++k) {
+            Table::RowRef x = conflicts[k];
+            Cs_Rows::Conflict row{c.id, Int(x[1]), Cs_Rows::Object::None, Str(x[3]), Int(x[4])};
+            if (!IsNull(x[2]) && !Cs_Rows::ObjectFrom(Str(x[2]), row.kind)) return damaged("unknown kind of object");
+            if (!feed(row)) return false;
+        }
+    }
+    for (Table::RowRef r : statuses)
+        if (!feed(Cs_Rows::Status{Int(r[0]), Int(r[1]), Int(r[2]), Int(r[3]), Str(r[4]), Str(r[5]), Int(r[6]),
+                                  Int(r[7])}))
+            return false;
+    return true;
+}
+
 }  // namespace
 
 void Cs_SetCommitFaultHook(Cs_CommitFaultHook hook) {
@@ -311,9 +480,93 @@ void Cs_SetCommitFaultHook(Cs_CommitFaultHook hook) {
 
 class Cs_Store {
 public:
+    // Hands the repository's rows to sink in writing order.
+    static bool Collect(const Cs_ConstraintMgr& mgr, Cs_Rows::Sink& sink);
     static Cs_ReturnCode Commit(const Cs_ConstraintMgr& mgr, const std::string& path);
     static Cs_ReturnCode Restore(Cs_ConstraintMgr& mgr, const std::string& path);
 };
+
+bool Cs_Store::Collect(const Cs_ConstraintMgr& mgr, Cs_Rows::Sink& sink) {
+    std::unordered_map<const Cs_Constraint*, int64_t> ids;
+    int64_t next = 0;
+    mgr.ForEach([&](const Cs_Constraint& c) { ids[&c] = ++next; });
+    auto id_of = [&](const Cs_Constraint* c) -> int64_t {
+        auto it = c ? ids.find(c) : ids.end();
+        return it == ids.end() ? 0 : it->second;
+    };
+    std::unordered_map<std::string_view, int64_t> source_ids;
+    for (const auto& s : mgr.sources_) {
+        const Cs_FileInfo& info = *s.info;
+        source_ids[info.GetFileName()] = static_cast<int64_t>(source_ids.size()) + 1;
+        if (!sink.Add(Cs_Rows::Source{info.GetFileName(), info.GetSyntax(), info.GetHash(), info.GetSize(),
+                                      info.WasRead()}))
+            return false;
+    }
+    bool ok = true;
+    mgr.ForEach([&](const Cs_Constraint& c) {
+        if (!ok) return;
+        const Cs_SourceFile* where = c.GetSourceInfo()->GetSourceFile();
+        auto src = where ? source_ids.find(where->GetFile()) : source_ids.end();
+        Cs_Rows::Constraint row;
+        row.id = ids[&c];
+        row.source = src == source_ids.end() ? 0 : src->second;
+        row.line = where ? where->GetLine() : 0;
+        row.type = &c.GetType();
+        row.scope = c.GetScope();
+        row.target = c.GetTarget();
+        row.key = c.GetAttribute();
+        row.value = c.GetValueText();
+        row.flag = c.IsFlag();
+        row.statement = c.GetStatementText();
+        row.parent = id_of(c.Parent());
+        row.block = c.GetBlock();
+        row.entry = c.GetEntryName();
+        row.stored = c.GetStoredText();
+        ok = sink.Add(row);
+        for (const char* g : c.GetAssociatedPaths()) ok = ok && sink.Add(Cs_Rows::Path{row.id, g});
+        for (const Ndm_PropertyHolder* o : c.GetAssociatedDesignObjs()) {
+            auto [kind, name] = ObjectName(o);
+            ok = ok && sink.Add(Cs_Rows::Association{row.id, kind, name, 0});
+        }
+        for (const Cs_Constraint* other : c.GetAssociatedConstraints())
+            if (other != c.Parent())
+                ok = ok && sink.Add(Cs_Rows::Association{row.id, Cs_Rows::Object::Constraint, {}, id_of(other)});
+        for (const Cs_Conflict& k : c.GetConflicts()) {
+            std::pair<Cs_Rows::Object, std::string> object{Cs_Rows::Object::None, ""};
+            if (k.GetDesignEntity()) object = ObjectName(k.GetDesignEntity());
+            ok = ok && sink.Add(Cs_Rows::Conflict{row.id, int64_t{k.GetType()}, object.first, object.second,
+                                                  id_of(k.GetConflictingConstraint())});
+        }
+    });
+    if (!ok) return false;
+    auto status_row = [&](const Cs_Status& st, int64_t source) {
+        Cs_Rows::Status row;
+        row.source = source;
+        row.id = static_cast<int>(st.GetID());
+        row.severity = st.GetSeverity();
+        row.number = st.GetLocalizedMsgNum();
+        row.message = st.GetMessage();
+        if (auto* p = dynamic_cast<const Cs_Status_Parse*>(&st)) {
+            row.file = p->GetSourceFile()->GetFile() ? p->GetSourceFile()->GetFile() : "";
+            row.line = p->GetSourceFile()->GetLine();
+        }
+        if (auto* r = dynamic_cast<const Cs_Status_Resolution*>(&st)) {
+            row.constraint = id_of(r->GetConstraint());
+            const Cs_SourceFile* at = r->GetConstraint() ? r->GetConstraint()->GetSourceInfo()->GetSourceFile() : nullptr;
+            if (at) {
+                row.file = at->GetFile();
+                row.line = at->GetLine();
+            }
+        }
+        return sink.Add(row);
+    };
+    for (const auto& s : mgr.sources_)
+        for (const auto& st : s.parse)
+            if (!status_row(*st, source_ids[s.info->GetFileName()])) return false;
+    for (const auto& st : mgr.resolution_)
+        if (!status_row(*st, 0)) return false;
+    return true;
+}
 
 Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& path) {
     Cs_ReturnCode outcome;
@@ -333,106 +586,29 @@ Cs_ReturnCode Cs_Store::Commit(const Cs_ConstraintMgr& mgr, const std::string& p
         if (!db.Exec("PRAGMA journal_mode=OFF; PRAGMA synchronous=OFF; PRAGMA foreign_keys=OFF;", error) ||
             !db.Exec(kSchema, error) || !db.Exec("BEGIN", error))
             return fail(error);
-        Checksum sum;
-        std::unordered_map<const Cs_Constraint*, int64_t> ids;
-        int64_t next = 0;
-        mgr.ForEach([&](const Cs_Constraint& c) { ids[&c] = ++next; });
-        auto id_of = [&](const Cs_Constraint* c) -> Value {
-            auto it = c ? ids.find(c) : ids.end();
-            return it == ids.end() ? Value() : Value(it->second);
-        };
-        std::unordered_map<std::string, int64_t> source_ids;
-        int64_t source_id = 0;
-        bool ok = Step("write");
-        for (const auto& s : mgr.sources_) {
-            const Cs_FileInfo& info = *s.info;
-            source_ids[info.GetFileName()] = ++source_id;
-            ok = ok && db.Insert("INSERT INTO source VALUES (?,?,?,?,?,?)",
-                                 {source_id, std::string(info.GetFileName()), int64_t{info.GetSyntax()},
-                                  static_cast<int64_t>(info.GetHash()), static_cast<int64_t>(info.GetSize()),
-                                  int64_t{info.WasRead()}},
-                                 &sum, error);
-        }
-        mgr.ForEach([&](const Cs_Constraint& c) {
-            if (!ok) return;
-            const Cs_SourceFile* where = c.GetSourceInfo()->GetSourceFile();
-            Value src;
-            if (where && source_ids.count(where->GetFile())) src.emplace<int64_t>(source_ids[where->GetFile()]);
-            int64_t id = ids[&c];
-            Value block, entry, stored;
-            if (c.GetBlock() != Cs_Block::None) {
-                block = std::string(Cs_BlockWord(c.GetBlock()));
-                entry = std::string(c.GetEntryName());
-                stored = std::string(c.GetStoredText());
-            }
-            ok = db.Insert("INSERT INTO constraints VALUES (?,?,?,?,?,?,?,?,?,?,?,?,?,?)",
-                           {id, src, int64_t{where ? where->GetLine() : 0}, std::string(c.GetType().GetName()),
-                            std::string(ScopeName(c.GetScope())), std::string(c.GetTarget()),
-                            std::string(c.GetAttribute()), std::string(c.GetValueText()), int64_t{c.IsFlag()},
-                            std::string(c.GetStatementText()), id_of(c.Parent()), block, entry, stored},
-                           &sum, error);
-            for (const char* g : c.GetAssociatedPaths())
-                ok = ok && db.Insert("INSERT INTO path VALUES (?,?)", {id, std::string(g)}, &sum, error);
-            for (const Ndm_PropertyHolder* o : c.GetAssociatedDesignObjs()) {
-                auto [kind, name] = ObjectName(o);
-                ok = ok && db.Insert("INSERT INTO association VALUES (?,?,?,?)",
-                                     {id, std::string(kind), name, Value()}, &sum, error);
-            }
-            for (const Cs_Constraint* other : c.GetAssociatedConstraints()) {
-                if (other == c.Parent()) continue;
-                ok = ok && db.Insert("INSERT INTO association VALUES (?,?,?,?)",
-                                     {id, std::string("constraint"), Value(), id_of(other)}, &sum, error);
-            }
-            for (const Cs_Conflict& k : c.GetConflicts()) {
-                Value kind, name;
-                if (k.GetDesignEntity()) {
-                    auto [kk, nn] = ObjectName(k.GetDesignEntity());
-                    kind = std::string(kk);
-                    name = nn;
-                }
-                ok = ok && db.Insert("INSERT INTO conflict VALUES (?,?,?,?,?)",
-                                     {id, int64_t{k.GetType()}, kind, name, id_of(k.GetConflictingConstraint())},
-                                     &sum, error);
-            }
-        });
-        auto status_row = [&](const Cs_Status& st, Value source) {
-            Value file, line, constraint;
-            if (auto* p = dynamic_cast<const Cs_Status_Parse*>(&st)) {
-                file = std::string(p->GetSourceFile()->GetFile() ? p->GetSourceFile()->GetFile() : "");
-                line = int64_t{p->GetSourceFile()->GetLine()};
-            }
-            if (auto* r = dynamic_cast<const Cs_Status_Resolution*>(&st)) {
-                constraint = id_of(r->GetConstraint());
-                const Cs_SourceFile* at = r->GetConstraint() ? r->GetConstraint()->GetSourceInfo()->GetSourceFile() : nullptr;
-                if (at) {
-                    file = std::string(at->GetFile());
-                    line = int64_t{at->GetLine()};
-                }
-            }
-            ok = ok && db.Insert("INSERT INTO status VALUES (?,?,?,?,?,?,?,?)",
-                                 {source, int64_t{static_cast<int>(st.GetID())}, int64_t{st.GetSeverity()},
-                                  int64_t{st.GetLocalizedMsgNum()}, st.GetMessage(), file, line, constraint},
-                                 &sum, error);
-        };
-        for (const auto& s : mgr.sources_)
-            for (const auto& st : s.parse) status_row(*st, source_ids[s.info->GetFileName()]);
-        for (const auto& st : mgr.resolution_) status_row(*st, Value());
+        TableWriter tables(db);
+        Cs_Rows::SnapshotWriter snapshot;
+        BothSinks both(tables, snapshot);
+        if (!Step("write") || !Collect(mgr, both))
+            return fail(both.why().empty() ? "writing was interrupted" : both.why());
         const Ndm_Design* design = mgr.GetDesign();
         char hex[32];
-        std::snprintf(hex, sizeof hex, "%016llx", static_cast<unsigned long long>(sum.h));
-        ok = ok && db.Insert("INSERT INTO meta VALUES (?,?)", {std::string("format"), std::string(kFormat)}, nullptr, error) &&
-             db.Insert("INSERT INTO meta VALUES (?,?)", {std::string("version"), std::to_string(kVersion)}, nullptr, error) &&
-             db.Insert("INSERT INTO meta VALUES (?,?)",
-                       {std::string("design"), std::string(design && design->GetName() ? design->GetName() : "")},
-                       nullptr, error) &&
-             db.Insert("INSERT INTO meta VALUES (?,?)",
-                       {std::string("design_stamp"), design ? design->GetSourceStamp() : std::string()}, nullptr,
-                       error) &&
-             db.Insert("INSERT INTO meta VALUES (?,?)", {std::string("content_checksum"), std::string(hex)}, nullptr,
-                       error);
+        std::snprintf(hex, sizeof hex, "%016llx", static_cast<unsigned long long>(tables.checksum()));
+        const std::pair<const char*, std::string> meta[] = {
+            {"format", kFormat},
+            {"version", std::to_string(kVersion)},
+            {"design", design && design->GetName() ? design->GetName() : ""},
+            {"design_stamp", design ? design->GetSourceStamp() : std::string()},
+            {"content_checksum", hex},
+        };
+        bool ok = true;
+        for (const auto& [key, value] : meta)
+            ok = ok && db.Insert("INSERT INTO meta VALUES (?,?)", {std::string(key), value}, nullptr, error);
+        ok = ok && db.InsertBlob("INSERT INTO snapshot VALUES (?)", snapshot.Finish(), error);
         if (!ok) return fail(error.empty() ? "writing was interrupted" : error);
         if (!db.Exec("COMMIT", error)) return fail(error);
     }
+    if (!Step("seal") || !Cs_Rows::SealFile(temp, error)) return fail(error.empty() ? "cannot seal " + temp : error);
     if (!file.Commit()) return fail(file.error());
     return outcome;
 }
@@ -476,172 +652,45 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     if (version < kVersion)
         return fail(Port_Format("it was written in format %d by an older version; this program reads format %d",
                                 version, kVersion));
-    // No structure check of its own: a damaged page fails the reads below, and the checksum of
-    // every row read finds any other change.
-    Table sources(6), constraints(14), paths(2), assocs(4), conflicts(5), statuses(8);
-    if (!db.Select("SELECT * FROM source ORDER BY rowid", sources, error) ||
-        !db.Select("SELECT * FROM constraints ORDER BY rowid", constraints, error))
-        return fail("it is damaged (" + error + ")");
-    // Rows of the per-constraint tables come back in the order they were written, which
-    // interleaves them per constraint; read them that way so that the checksum agrees.
-    if (!db.Select("SELECT * FROM path ORDER BY rowid", paths, error) ||
-        !db.Select("SELECT * FROM association ORDER BY rowid", assocs, error) ||
-        !db.Select("SELECT * FROM conflict ORDER BY rowid", conflicts, error) ||
-        !db.Select("SELECT * FROM status ORDER BY rowid", statuses, error))
-        return fail("it is damaged (" + error + ")");
-    // The checksum covers the rows in writing order: each constraint, then its paths,
-    // associations and conflicts, then the statuses.
-    {
-        Checksum again;
-        for (Table::RowRef r : sources) AddToChecksum(again, r);
-        size_t p = 0, a = 0, k = 0;
-        for (Table::RowRef c : constraints) {
-            AddToChecksum(again, c);
-            int64_t id = Int(c[0]);
-            while (p < paths.size() && Int(paths[p][0]) == id) AddToChecksum(again, paths[p++]);
-            while (a < assocs.size() && Int(assocs[a][0]) == id) AddToChecksum(again, assocs[a++]);
-            while (k < conflicts.size() && Int(conflicts[k][0]) == id) AddToChecksum(again, conflicts[k++]);
-        }
-        for (Table::RowRef r : statuses) AddToChecksum(again, r);
-        char hex[32];
-        std::snprintf(hex, sizeof hex, "%016llx", static_cast<unsigned long long>(again.h));
-        if (p != paths.size() || a != assocs.size() || k != conflicts.size() || info["content_checksum"] != hex)
-            return fail("it is damaged (its content does not match its checksum)");
-    }
 
-    // Build the new content aside; the repository changes only when everything was read.
-    Cs_ConstraintMgr staged;
-    std::unordered_map<int64_t, size_t> source_index;
-    for (Table::RowRef r : sources) {
-        Cs_ConstraintMgr::Source& s = staged.AddSource(std::string(Str(r[1])), static_cast<int>(Int(r[2])));
-        s.info->hash_ = static_cast<uint64_t>(Int(r[3]));
-        s.info->size_ = static_cast<uint64_t>(Int(r[4]));
-        s.info->read_ = Int(r[5]) != 0;
-        source_index[Int(r[0])] = staged.sources_.size() - 1;
-    }
-    std::unordered_map<int64_t, Cs_Constraint*> by_id;
-    std::vector<std::pair<Cs_Constraint*, int64_t>> parents;
-    for (Table::RowRef r : constraints) {
-        const Cs_ConstraintType* type = Cs_FindConstraintType(std::string(Str(r[3])).c_str());
-        Cs_Scope scope;
-        if (!type || !ScopeFrom(Str(r[4]), scope)) return fail("it is damaged (unknown constraint kind)");
-        std::unique_ptr<Cs_Constraint> c = Cs_MakeConstraint(*type);
-        c->scope_ = scope;
-        c->target_ = staged.Text(Str(r[5]));
-        c->key_ = staged.Text(Str(r[6]));
-        c->value_ = staged.Text(Str(r[7]));
-        c->flag_ = Int(r[8]) != 0;
-        c->statement_ = staged.Text(Str(r[9]));
-        if (!IsNull(r[11]) && !BlockFrom(Str(r[11]), c->block_)) return fail("it is damaged (unknown constraint block)");
-        if (!IsNull(r[11])) {
-            c->More().entry = staged.Text(Str(r[12]));
-            c->More().stored = staged.Text(Str(r[13]));
-        }
-        const char* file = nullptr;
-        Cs_ConstraintMgr::Constraints* list = &staged.loose_;
-        if (!IsNull(r[1])) {
-            auto it = source_index.find(Int(r[1]));
-            if (it == source_index.end()) return fail("it is damaged (a constraint of an unknown source)");
-            Cs_ConstraintMgr::Source& s = staged.sources_[it->second];
-            file = staged.Text(s.info->GetFileName());
-            list = &s.constraints;
-        }
-        c->source_ = Cs_ConstraintSourceInfo(Cs_SourceFile(file, static_cast<int>(Int(r[2]))));
-        if (!IsNull(r[10])) parents.emplace_back(c.get(), Int(r[10]));
-        by_id[Int(r[0])] = c.get();
-        list->push_back(std::move(c));
-    }
-    auto constraint = [&](Table::CellRef v) -> Cs_Constraint* {
-        auto it = IsNull(v) ? by_id.end() : by_id.find(Int(v));
-        return it == by_id.end() ? nullptr : it->second;
-    };
-    for (auto& [c, parent] : parents) {
-        auto it = by_id.find(parent);
-        if (it == by_id.end()) continue;
-        c->More().parent = it->second;
-        c->More().constraints.push_back(it->second);
-    }
-    Ndm_View* view = mgr.design_ ? mgr.design_->GetWorkView() : nullptr;
-    for (Table::RowRef r : paths)
-        if (Cs_Constraint* c = constraint(r[0])) c->More().paths.push_back(staged.Text(Str(r[1])));
-    // What the constraints resolved to counts only for the design it was committed for; with no
+    // Build the new content aside; the repository changes only when everything was read. What
+    // the constraints resolved to counts only for the design it was committed for; with no
     // design bound the names are kept for listings.
+    Cs_ConstraintMgr staged;
+    Ndm_View* view = mgr.design_ ? mgr.design_->GetWorkView() : nullptr;
     const std::string& stamp = mgr.design_ ? mgr.design_->GetSourceStamp() : info["design_stamp"];
     const bool same_design = !stamp.empty() && stamp == info["design_stamp"];
-    // The rows of one constraint come together; the constraints of one statement that found
-    // the same objects share one list, as after a resolution.
-    Cs_Constraint* filling = nullptr;
-    const Cs_Constraint* filled = nullptr;
-    std::vector<Ndm_PropertyHolder*> found;
-    auto flush = [&] {
-        if (!filling) return;
-        const auto before = filled ? filled->GetAssociatedDesignObjs() : std::span<Ndm_PropertyHolder* const>();
-        if (filled && found.size() > 1 && filled->GetStatementText() == filling->GetStatementText() &&
-            std::equal(found.begin(), found.end(), before.begin(), before.end())) {
-            filling->many_ = filled->many_;
-            found.clear();
-        } else {
-            staged.SetObjects(*filling, found);
-        }
-        filled = filling;
-        filling = nullptr;
-    };
-    for (Table::RowRef r : assocs) {
-        Cs_Constraint* c = constraint(r[0]);
-        if (!c) return fail("it is damaged (an association of an unknown constraint)");
-        if (c != filling) flush();
-        if (Str(r[1]) == "constraint") {
-            if (Cs_Constraint* other = constraint(r[3])) c->More().constraints.push_back(other);
-        } else if (!view) {
-            staged.committed_[c].objects.emplace_back(Str(r[2]));
-        } else if (!same_design) {
-            continue;
-        } else if (Ndm_PropertyHolder* o = FindObject(view, Str(r[1]), Str(r[2]))) {
-            filling = c;
-            found.push_back(o);
-        }
+    Cs_Rows::Builder builder(mgr, staged, same_design);
+    // A sealed file is byte for byte what was committed: its snapshot holds the content. A file
+    // changed since (a user's index, a vacuum, damage) is read from its tables, which the
+    // checksum of their content guards.
+    std::string why;
+    bool read = false;
+    if (Cs_Rows::SealHolds(path)) {
+        const char* kept = nullptr;
+        size_t size = 0;
+        read = db.SelectBlob(
+            "SELECT data FROM snapshot",
+            [&](const char* data, size_t n) {
+                char* copy = staged.texts_->Keep(n);  // the snapshot's texts stay in use
+                if (n) std::memcpy(copy, data, n);
+                kept = copy;
+                size = n;
+            },
+            error);
+        if (read && !Cs_Rows::ReadSnapshot(kept, size, builder, why)) return fail(why);
     }
-    flush();
-    for (Table::RowRef r : conflicts) {
-        Cs_Constraint* c = constraint(r[0]);
-        if (!c) return fail("it is damaged (a conflict of an unknown constraint)");
-        if (!IsNull(r[2]) && !view) {
-            staged.committed_[c].overrides.emplace_back(constraint(r[4]), std::string(Str(r[3])));
-            continue;
-        }
-        if (!IsNull(r[2]) && !same_design) continue;
-        Ndm_PropertyHolder* entity = IsNull(r[2]) ? nullptr : FindObject(view, Str(r[2]), Str(r[3]));
-        if (!IsNull(r[2]) && !entity) continue;  // an object the bound design no longer has
-        c->More().conflicts.emplace_back(static_cast<Cs_Conflict::CONFLICTTYPE>(Int(r[1])), entity, constraint(r[4]));
-    }
-    for (Table::RowRef r : statuses) {
-        auto id = static_cast<Cs_StatusID>(Int(r[1]));
-        auto severity = static_cast<Cs_Status::SEVERITY>(Int(r[2]));
-        int number = static_cast<int>(Int(r[3]));
-        std::shared_ptr<Cs_Status> st;
-        if (IsNull(r[7])) {
-            auto parse =
-                std::make_shared<Cs_Status_Parse>(id, number, std::string(Str(r[4])), std::string(Str(r[5])),
-                                                  static_cast<int>(Int(r[6])));
-            parse->SetSeverity(severity);
-            st = parse;
-        } else {
-            st = std::make_shared<Cs_Status_Resolution>(id, severity, number, std::string(Str(r[4])), constraint(r[7]));
-        }
-        if (!IsNull(r[0])) {
-            auto it = source_index.find(Int(r[0]));
-            if (it == source_index.end()) return fail("it is damaged (a status of an unknown source)");
-            staged.sources_[it->second].parse.Add(st);
-        } else {
-            staged.resolution_.Add(st);
-        }
-    }
+    if (!read && !ReadTables(db, info["content_checksum"], *staged.texts_, builder, why)) return fail(why);
+    builder.Finish();
+
+    mgr.pending_.clear();  // of the content replaced
     mgr.sources_ = std::move(staged.sources_);
     mgr.loose_ = std::move(staged.loose_);
     mgr.resolution_ = std::move(staged.resolution_);
     mgr.committed_ = std::move(staged.committed_);
     mgr.texts_ = std::move(staged.texts_);
     mgr.object_lists_ = std::move(staged.object_lists_);
+    mgr.pending_ = std::move(staged.pending_);
     staged.texts_ = std::make_unique<Ndm_NamePool>();
     if (view && !same_design)
         mgr.Resolve();  // what the file holds is no longer what the repository holds
