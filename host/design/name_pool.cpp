@@ -93,7 +93,7 @@ void Ndm_NamePool::Grow() {
     size_t mask = slots_.size() - 1;
     for (const Slot& s : old) {
         if (!s.text) continue;
-        size_t i = Hash(std::string_view(s.text, s.size)) & mask;
+        size_t i = s.hash & mask;  // the low 32 bits of the hash are kept; tables stay below 2^32 slots
         while (slots_[i].text) i = (i + 1) & mask;
         slots_[i] = s;
     }

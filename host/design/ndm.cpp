@@ -249,8 +249,12 @@ Ndm_MemberIndex& Ndm_Block::Index() const {
 
 Ndm_Block* Ndm_Block::CreateBlock(const char* name, unsigned int /*flags*/) {
     if (!name) return nullptr;
+    return CreateBlock(Ndm_Interned{view_->GetDesign()->Intern(name)});
+}
+
+Ndm_Block* Ndm_Block::CreateBlock(Ndm_Interned name) {
     Ndm_Design* design = view_->GetDesign();
-    const char* stored = design->Intern(name);
+    const char* stored = name.name;
     Ndm_Block* block = &design->block_pool_.emplace_back(Ndm_Token(), stored, this, view_);
     block->order_ = blocks_.empty() ? 0 : blocks_.back()->order_ + 1;
     blocks_.push_back(block);
@@ -260,8 +264,12 @@ Ndm_Block* Ndm_Block::CreateBlock(const char* name, unsigned int /*flags*/) {
 
 Ndm_Signal* Ndm_Block::CreateSignal(const char* name) {
     if (!name) return nullptr;
+    return CreateSignal(Ndm_Interned{view_->GetDesign()->Intern(name)});
+}
+
+Ndm_Signal* Ndm_Block::CreateSignal(Ndm_Interned name) {
     Ndm_Design* design = view_->GetDesign();
-    const char* stored = design->Intern(name);
+    const char* stored = name.name;
     Ndm_Signal* signal = &design->signal_pool_.emplace_back(Ndm_Token(), stored, this);
     signal->order_ = signals_.empty() ? 0 : signals_.back()->order_ + 1;
     signals_.push_back(signal);
@@ -271,8 +279,12 @@ Ndm_Signal* Ndm_Block::CreateSignal(const char* name) {
 
 Ndm_Pin* Ndm_Block::CreatePin(const char* name, Ndm_Dir dir) {
     if (!name) return nullptr;
+    return CreatePin(Ndm_Interned{view_->GetDesign()->Intern(name)}, dir);
+}
+
+Ndm_Pin* Ndm_Block::CreatePin(Ndm_Interned name, Ndm_Dir dir) {
     Ndm_Design* design = view_->GetDesign();
-    const char* stored = design->Intern(name);
+    const char* stored = name.name;
     Ndm_Pin* pin = &design->pin_pool_.emplace_back(Ndm_Token(), stored, this, dir);
     pins_.push_back(pin);
     if (index_ && index_->built[kPins]) index_->Add(design, kPins, stored, pin);

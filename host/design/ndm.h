@@ -27,6 +27,12 @@ class Ndm_Network;
 class Ndm_NamePool;
 class Ndm_MemberIndex;
 
+// A name the design has interned already (Ndm_Design::Intern): objects created with it skip
+// interning it again, which readers that intern their names once save millions of times.
+struct Ndm_Interned {
+    const char* name;
+};
+
 // Only the database itself can make objects: constructors take this token.
 class Ndm_Token {
     Ndm_Token() = default;
@@ -112,6 +118,7 @@ public:
     // Cell type or module name the block was made from (empty for made-up blocks).
     const char* GetTypeName() const { return type_; }
     void SetTypeName(const char* type);
+    void SetTypeName(Ndm_Interned type) { type_ = type.name; }
 
     int GetNumBlocks() const { return static_cast<int>(blocks_.size()); }
     std::span<Ndm_Block* const> GetBlockItr() const { return blocks_; }
@@ -122,12 +129,15 @@ public:
 
     // Appends a child block; flags are reserved (pass 0). Null when name is null.
     Ndm_Block* CreateBlock(const char* name, unsigned int flags = 0);
+    Ndm_Block* CreateBlock(Ndm_Interned name);
     // Removes a child block and its whole subtree (signals leave their networks; the
     // objects' properties are released). False when child is not a child of this block.
     bool DeleteBlock(Ndm_Block* child);
     // Appends a signal or a pin.
     Ndm_Signal* CreateSignal(const char* name);
     Ndm_Pin* CreatePin(const char* name, Ndm_Dir dir = Ndm_Dir::None);
+    Ndm_Signal* CreateSignal(Ndm_Interned name);
+    Ndm_Pin* CreatePin(Ndm_Interned name, Ndm_Dir dir = Ndm_Dir::None);
     // Reserves room for that many more members of each kind (readers that know the counts
     // avoid regrowing the member lists).
     void Reserve(size_t blocks, size_t signals, size_t pins);

@@ -192,7 +192,23 @@ const char* Reader::BitName(const char* name, uint32_t width, int32_t offset, bo
     name_buf_ += '[';
     name_buf_ += std::to_string(index);
     name_buf_ += ']';
-    return name_buf_.c_str();
+    return design_.Intern(name_buf_);
+}
+
+const char* Reader::PinName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i) {
+    if (width == 1 && offset == 0) return name;
+    const size_t first = reinterpret_cast<uintptr_t>(pin_names_of_.Find(name));
+    if (first) {
+        const BitNames& known = pin_names_[first - 1];
+        if (known.width == width && known.offset == offset && known.upto == upto) return known.names[i];
+        return BitName(name, width, offset, upto, i);  // the same port name with another range: rare
+    }
+    BitNames made{width, offset, upto, {}};
+    made.names.reserve(width);
+    for (uint32_t k = 0; k < width; ++k) made.names.push_back(BitName(name, width, offset, upto, k));
+    pin_names_.push_back(std::move(made));
+    pin_names_of_.InsertIfAbsent(name, reinterpret_cast<void*>(static_cast<uintptr_t>(pin_names_.size())));
+    return pin_names_.back().names[i];
 }
 
 uint32_t Reader::Alloc(uint32_t count) {
@@ -239,7 +255,7 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
         b->Reserve(m.cells.size(), m.num_signals, 0);
         for (const Net& net : m.nets)
             for (uint32_t i = 0; i < net.bits.count; ++i)
-                b->CreateSignal(BitName(net.name, net.bits.count, net.offset, net.upto, i));
+                b->CreateSignal(Ndm_Interned{BitName(net.name, net.bits.count, net.offset, net.upto, i)});
         stack.push_back({b, mod, base});
     };
     enter(block, module, Alloc(modules_[module].num_bits));
@@ -251,7 +267,7 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
             continue;
         }
         const Cell& cell = m.cells[frame.next_cell++];
-        Ndm_Block* child = frame.block->CreateBlock(cell.name);
+        Ndm_Block* child = frame.block->CreateBlock(Ndm_Interned{cell.name});
         if (!ExpandCell(child, m, cell)) return false;
         if (cell.sub < 0) continue;
         const uint32_t child_base = Alloc(modules_[cell.sub].num_bits);
@@ -274,7 +290,10 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
 
 // The block of one cell of m: its type and its pins on the signals of the parent block.
 bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
-    child->SetTypeName(cell.type);
+    if (cell.type)
+        child->SetTypeName(Ndm_Interned{cell.type});
+    else
+        child->SetTypeName("");
     std::span<Ndm_Signal* const> signals = child->GetParent()->GetSignalItr();
     Module* sub = cell.sub >= 0 ? &modules_[cell.sub] : nullptr;
     uint32_t num_pins = 0;
@@ -289,9 +308,9 @@ bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
                                      cell.name, m.name, path_, conn.name, sub->name));
         Ndm_Dir dir = port ? port->dir : conn.dir;
         for (uint32_t i = 0; i < conn.bits.count; ++i) {
-            const char* name = port ? BitName(conn.name, conn.bits.count, port->offset, port->upto, i)
-                                    : BitName(conn.name, conn.bits.count, 0, false, i);
-            Ndm_Pin* pin = child->CreatePin(name, dir);
+            const char* name = port ? PinName(conn.name, conn.bits.count, port->offset, port->upto, i)
+                                    : PinName(conn.name, conn.bits.count, 0, false, i);
+            Ndm_Pin* pin = child->CreatePin(Ndm_Interned{name}, dir);
             int32_t bit = m.bits[conn.bits.first + i];
             if (bit >= 0 && m.bit_signal[bit] >= 0) pin->SetSignal(signals[m.bit_signal[bit]]);
         }
@@ -313,7 +332,8 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
         const Net* net = v ? &m.nets[FromValue(v)] : nullptr;
         bool same = net && net->bits.count == port.bits.count;
         for (uint32_t i = 0; i < port.bits.count; ++i) {
-            Ndm_Pin* pin = block->CreatePin(BitName(port.name, port.bits.count, port.offset, port.upto, i), port.dir);
+            Ndm_Pin* pin =
+                block->CreatePin(Ndm_Interned{BitName(port.name, port.bits.count, port.offset, port.upto, i)}, port.dir);
             int32_t bit = m.bits[port.bits.first + i];
             if (same)
                 pin->SetSignal(signals[m.net_first_signal[FromValue(v)] + i]);

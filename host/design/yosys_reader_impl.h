@@ -188,7 +188,10 @@ private:
     void Count(Module& m);
     bool CheckSize(uint32_t top);
     const Port* FindPort(Module& m, const char* name);
+    // The interned name of bit i of a port or net: the name itself for a single bit at 0, else
+    // "name[index]". PinName keeps those of ports, which every cell of a type repeats.
     const char* BitName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i);
+    const char* PinName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i);
     uint32_t Alloc(uint32_t count);
     uint32_t Find(uint32_t id);
     void Union(uint32_t a, uint32_t b);
@@ -207,6 +210,14 @@ private:
     od::document doc_;
     std::string scratch_;
     std::string name_buf_;
+    struct BitNames {
+        uint32_t width;
+        int32_t offset;
+        bool upto;
+        std::vector<const char*> names;
+    };
+    std::vector<BitNames> pin_names_;
+    Ndm_PtrMap pin_names_of_;  // port name -> its first entry in pin_names_, plus one
     const char* module_name_ = "";
     enum { kSeenPorts, kSeenCells, kSeenNets, kSeenConns };
     Ndm_PtrMap seen_[4];    // names of the ports, cells and netnames of the module being read,
