@@ -210,13 +210,13 @@ private:
                 if (!Name(field.value(), name, "block \"name\"")) return false;
                 if (frame.block) return Shape("a block has two names");
                 Ndm_Block* parent = stack.size() > 1 ? stack[stack.size() - 2].block : nullptr;
-                frame.block = parent ? parent->CreateBlock(name) : view->CreateTopBlock(name);
+                frame.block = parent ? parent->CreateBlock(Ndm_Interned{name}) : view->CreateTopBlock(name);
             } else if (!frame.block) {
                 return Shape("a block must start with its \"name\"");
             } else if (key == "type") {
                 const char* type;
                 if (!Name(field.value(), type, "block \"type\"")) return false;
-                frame.block->SetTypeName(type);
+                frame.block->SetTypeName(Ndm_Interned{type});
             } else if (key == "properties") {
                 if (!Properties(field.value(), *frame.block)) return false;
             } else if (key == "signals") {
@@ -253,7 +253,7 @@ private:
                     const char* name;
                     if (!Name(field.value(), name, "signal \"name\"")) return false;
                     if (signal) return Shape("a signal has two names");
-                    signal = block.CreateSignal(name);
+                    signal = block.CreateSignal(Ndm_Interned{name});
                     signals_.push_back(signal);
                 } else if (key == "properties") {
                     if (!signal) return Shape("a signal must start with its \"name\"");
@@ -275,7 +275,7 @@ private:
             const char* name = nullptr;
             Ndm_Dir dir = Ndm_Dir::None;
             auto make = [&] {
-                if (!pin) pin = block.CreatePin(name, dir);
+                if (!pin) pin = block.CreatePin(Ndm_Interned{name}, dir);
             };
             for (auto fitem : object) {
                 od::field field;
