@@ -1,6 +1,7 @@
 #include "host/repository/cs_mgr.h"
 
 #include <algorithm>
+#include <unordered_set>
 
 #include "host/parser/pr_logical.h"
 #include "host/port/msgman.h"
@@ -53,8 +54,14 @@ Cs_ConstraintMgr::Source& Cs_ConstraintMgr::AddSource(const std::string& name, i
     return sources_.back();
 }
 
+void Cs_ConstraintMgr::ForgetPending(const Constraints& going) {
+    if (pending_.empty() || going.empty()) return;
+    std::unordered_set<const Cs_Constraint*> gone;
+    for (const auto& c : going) gone.insert(c.get());
+    std::erase_if(pending_, [&](const PendingObject& p) { return gone.count(p.constraint) || gone.count(p.by); });
+}
+
 Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const Pr_FileText> text) {
-    Settle();
     same_as_file_.clear();
     Cs_ReturnCode outcome;
     const std::string name = source.info->GetFileName();
@@ -65,6 +72,7 @@ Cs_ReturnCode Cs_ConstraintMgr::ReadSource(Source& source, std::shared_ptr<const
     }
     Cs_Loader loader(*this, name.c_str(), source.info->GetSyntax() != Cs_ConstraintSyntax::NCF);
     loader.Read(text);
+    ForgetPending(source.constraints);
     source.constraints = std::move(loader.constraints());
     source.info->hash_ = ContentHash(*text);
     source.info->size_ = text->size();
@@ -105,7 +113,7 @@ Cs_ReturnCode Cs_ConstraintMgr::RemoveConstraintSource(const Port::StringBase<ch
     auto it = std::find_if(sources_.begin(), sources_.end(),
                            [&](const Source& s) { return file.str() == s.info->GetFileName(); });
     if (it == sources_.end()) return {};
-    Settle();
+    ForgetPending(it->constraints);
     sources_.erase(it);
     same_as_file_.clear();
     Changed();

@@ -211,8 +211,6 @@ private:
     std::vector<PendingObject> pending_;
     // Looks up every pending object (a constraint asked for its objects or conflicts).
     void FindPendingObjects();
-    // Before constraints change or go: settles what is pending against the bound design.
-    void Settle() {
-        if (!pending_.empty()) FindPendingObjects();
-    }
+    // Before constraints go: forgets what is pending for them.
+    void ForgetPending(const Constraints& going);
 };
