@@ -44,7 +44,14 @@ Ndm_PropertyHolder* FindObject(Ndm_View* view, Cs_Rows::Object kind, const char*
 
 }  // namespace
 
-void Cs_Constraint::FindPending() const { pending_->FindPendingObjects(); }
+void Cs_Constraint::FindPending() const {
+    // This constraint is done with, even when none of the rows left is its own.
+    auto* self = const_cast<Cs_Constraint*>(this);  // constraints are made mutable, handed out const
+    Cs_ConstraintMgr* mgr = self->pending_;
+    self->lazy_ = false;
+    self->many_ = nullptr;
+    mgr->FindPendingObjects();
+}
 
 void Cs_ConstraintMgr::FindPendingObjects() {
     std::vector<PendingObject> rows;
