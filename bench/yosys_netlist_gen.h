@@ -98,6 +98,15 @@ private:
         Put(" ]\n        }\n      },\n");
     }
 
+    // Ends the cells and starts the netnames with those of the inputs (the last one left open).
+    void InputNetnames() {
+        Put("\n      },\n      \"netnames\": {\n");
+        Put("        \"clk\": {\n          \"hide_name\": 0,\n          \"bits\": [ 2 ]\n        },\n");
+        Put("        \"rst\": {\n          \"hide_name\": 0,\n          \"bits\": [ 3 ]\n        },\n");
+        Put("        \"in\": {\n          \"hide_name\": 0,\n          \"bits\": ");
+        Bits(InputBit(0), kInputs, 1);
+    }
+
     std::string OutputBits(int64_t first, int64_t step) {
         std::string bits;
         for (int i = 0; i < kOutputs; ++i) bits += (i ? ", " : "") + std::to_string(first + i * step);
@@ -124,11 +133,7 @@ private:
             Bits(outs + int64_t{k} * kOutputs, kOutputs, 1);
             Put("\n          }\n        }");
         }
-        Put("\n      },\n      \"netnames\": {\n");
-        Put("        \"clk\": {\n          \"hide_name\": 0,\n          \"bits\": [ 2 ]\n        },\n");
-        Put("        \"rst\": {\n          \"hide_name\": 0,\n          \"bits\": [ 3 ]\n        },\n");
-        Put("        \"in\": {\n          \"hide_name\": 0,\n          \"bits\": ");
-        Bits(InputBit(0), kInputs, 1);
+        InputNetnames();
         Put("\n        }");
         for (int k = 0; k < modules_; ++k) {
             Put(",\n        \"");
@@ -185,11 +190,7 @@ private:
             Put(FfBit(p));
             Put(" ],\n            \"R\": [ 3 ]\n          }\n        }");
         }
-        Put("\n      },\n      \"netnames\": {\n");
-        Put("        \"clk\": {\n          \"hide_name\": 0,\n          \"bits\": [ 2 ]\n        },\n");
-        Put("        \"rst\": {\n          \"hide_name\": 0,\n          \"bits\": [ 3 ]\n        },\n");
-        Put("        \"in\": {\n          \"hide_name\": 0,\n          \"bits\": ");
-        Bits(InputBit(0), kInputs, 1);
+        InputNetnames();
         Put("\n        },\n        \"out\": {\n          \"hide_name\": 0,\n          \"bits\": [ ");
         for (int i = 0; i < kOutputs; ++i) {
             if (i) Put(", ");
