@@ -3,6 +3,7 @@
 // per database object. LUN_BENCH_CELLS overrides the cell count.
 #include <benchmark/benchmark.h>
 #include <malloc.h>
+#include <sys/resource.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -68,7 +69,22 @@ std::string TempPath(const char* suffix) {
         .string();
 }
 
+// What one load cost: processor seconds and peak resident megabytes.
+struct Cost {
+    double cpu = 0, peak_mb = 0;
+};
+
+// Processor seconds this process has used.
+double CpuSeconds() {
+    struct rusage usage {};
+    ::getrusage(RUSAGE_SELF, &usage);
+    return static_cast<double>(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) +
+           static_cast<double>(usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1e6;
+}
+
 struct Shared {
+    Cost netlist_load;
+    uint64_t netlist_bytes = 0;
     std::unique_ptr<NetlistFile> netlist;
     std::unique_ptr<Ndm_Design> design;
     std::string native = TempPath(".lun");
@@ -86,8 +102,8 @@ size_t Objects(const Ndm_Design& design) {
 }
 
 // Load time, heap held by the design per object, and the peak resident size while loading.
-void Report(benchmark::State& state, const char* what, const Ndm_Design& design, int64_t heap_before,
-            double seconds) {
+Cost Report(benchmark::State& state, const char* what, const Ndm_Design& design, int64_t heap_before,
+            double seconds, double cpu) {
     int64_t heap = HeapInUse() - heap_before;
     int64_t peak = StatusKb("VmHWM");
     Ndm_Design::Stats s = design.GetStats();
@@ -99,11 +115,12 @@ void Report(benchmark::State& state, const char* what, const Ndm_Design& design,
     state.counters["bytes_per_object_without_names"] = objects ? (static_cast<double>(heap) - names) / objects : 0;
     state.counters["peak_MB"] = static_cast<double>(peak) / 1024.0;
     state.counters["design_MB"] = static_cast<double>(heap) / (1 << 20);
-    std::printf("%s: %.2f s; %zu blocks, %zu signals, %zu pins, %zu networks; design %.0f MB "
+    std::printf("%s: %.2f s (%.2f s CPU); %zu blocks, %zu signals, %zu pins, %zu networks; design %.0f MB "
                 "(%.0f bytes per object, %.0f without the %.0f MB of names); peak resident %.0f MB\n",
-                what, seconds, s.blocks, s.signals, s.pins, s.networks, static_cast<double>(heap) / (1 << 20),
+                what, seconds, cpu, s.blocks, s.signals, s.pins, s.networks, static_cast<double>(heap) / (1 << 20),
                 per_object, objects ? (static_cast<double>(heap) - names) / objects : 0, names / (1 << 20),
                 static_cast<double>(peak) / 1024.0);
+    return {cpu, static_cast<double>(peak) / 1024.0};
 }
 
 double Seconds(const std::chrono::steady_clock::time_point& start) {
@@ -123,6 +140,7 @@ void BM_LoadYosysJson(benchmark::State& state) {
         int64_t heap_before = HeapInUse();
         ResetPeak();
         auto start = std::chrono::steady_clock::now();
+        const double cpu = CpuSeconds();
         state.ResumeTiming();
         shared.design = Ndm_ReadYosysJson(shared.netlist->path(), nullptr);
         state.PauseTiming();
@@ -130,7 +148,10 @@ void BM_LoadYosysJson(benchmark::State& state) {
             state.SkipWithError("the netlist did not load");
             break;
         }
-        Report(state, "Yosys JSON load", *shared.design, heap_before, Seconds(start));
+        shared.netlist_load =
+            Report(state, "Yosys JSON load", *shared.design, heap_before, Seconds(start), CpuSeconds() - cpu);
+        shared.netlist_bytes = shared.netlist->bytes();
+        std::printf("  targets for 1,000,000 cells: <= 1.0 s CPU, <= 450 MB peak\n");
         state.ResumeTiming();
     }
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * shared.netlist->bytes()));
@@ -148,6 +169,8 @@ void BM_WriteNative(benchmark::State& state) {
     }
     uint64_t bytes = std::filesystem::file_size(shared.native);
     state.counters["file_MB"] = static_cast<double>(bytes) / (1 << 20);
+    std::printf("native file: %.0f MB against the netlist's %.0f MB (target: not larger)\n",
+                static_cast<double>(bytes) / (1 << 20), static_cast<double>(shared.netlist_bytes) / (1 << 20));
     state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * bytes));
 }
 BENCHMARK(BM_WriteNative)->Iterations(1)->Unit(benchmark::kMillisecond)->UseRealTime();
@@ -166,6 +189,7 @@ void BM_ReadNative(benchmark::State& state) {
         int64_t heap_before = HeapInUse();
         ResetPeak();
         auto start = std::chrono::steady_clock::now();
+        const double cpu = CpuSeconds();
         state.ResumeTiming();
         auto design = Ndm_ReadNative(shared.native.c_str());
         state.PauseTiming();
@@ -173,7 +197,9 @@ void BM_ReadNative(benchmark::State& state) {
             state.SkipWithError("the native file did not load");
             break;
         }
-        Report(state, "native read", *design, heap_before, Seconds(start));
+        const Cost read = Report(state, "native read", *design, heap_before, Seconds(start), CpuSeconds() - cpu);
+        std::printf("  against the netlist load: %.2f of its CPU time, %.2f of its peak (targets: <= 1)\n",
+                    read.cpu / shared.netlist_load.cpu, read.peak_mb / shared.netlist_load.peak_mb);
         design.reset();
         state.ResumeTiming();
     }

@@ -227,6 +227,7 @@ private:
                 od::array children;
                 if (error_code e = field.value().get_array().get(children))
                     return JsonError(e, "\"blocks\" must be an array");
+                Reserve(children, *frame.block, 0);
                 if (error_code e = children.begin().get(frame.child)) return JsonError(e, "bad block");
                 if (error_code e = children.end().get(frame.children_end)) return JsonError(e, "bad block");
                 frame.in_children = true;
@@ -237,9 +238,19 @@ private:
         return true;
     }
 
+    // Makes room for the members an array lists (0 blocks, 1 signals, 2 pins), so that the
+    // member lists do not keep the slack of their growth. A malformed array is left to the
+    // reading that follows to report.
+    static void Reserve(od::array& array, Ndm_Block& block, int kind) {
+        size_t n = 0;
+        if (array.count_elements().get(n) != simdjson::SUCCESS || n == 0) return;
+        block.Reserve(kind == 0 ? n : 0, kind == 1 ? n : 0, kind == 2 ? n : 0);
+    }
+
     bool Signals(od::value value, Ndm_Block& block) {
         od::array array;
         if (error_code e = value.get_array().get(array)) return JsonError(e, "\"signals\" must be an array");
+        Reserve(array, block, 1);
         for (auto item : array) {
             od::object object;
             if (error_code e = std::move(item).get_object().get(object))
@@ -268,6 +279,7 @@ private:
     bool Pins(od::value value, Ndm_Block& block) {
         od::array array;
         if (error_code e = value.get_array().get(array)) return JsonError(e, "\"pins\" must be an array");
+        Reserve(array, block, 2);
         for (auto item : array) {
             od::object object;
             if (error_code e = std::move(item).get_object().get(object)) return JsonError(e, "a pin must be an object");
