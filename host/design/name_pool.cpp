@@ -42,7 +42,7 @@ const char* Ndm_NamePool::Find(std::string_view text) const {
         const Slot& s = slots_[i];
         if (!s.text) return nullptr;
         if (s.hash == static_cast<uint32_t>(h) && s.size == text.size() &&
-            std::memcmp(s.text, text.data(), text.size()) == 0)
+            (text.empty() || std::memcmp(s.text, text.data(), text.size()) == 0))
             return s.text;
     }
 }
@@ -55,7 +55,7 @@ const char* Ndm_NamePool::Intern(std::string_view text) {
         Slot& s = slots_[i];
         if (!s.text) break;
         if (s.hash == static_cast<uint32_t>(h) && s.size == text.size() &&
-            std::memcmp(s.text, text.data(), text.size()) == 0)
+            (text.empty() || std::memcmp(s.text, text.data(), text.size()) == 0))
             return s.text;
     }
     const char* stored = Store(text);
