@@ -176,6 +176,7 @@ bool Builder::Add(const Association& row) {
 bool Builder::Add(const Conflict& row) {
     Cs_Constraint* c = ById(row.constraint);
     if (!c) return Fail("a conflict of an unknown constraint");
+    if (row.type != Cs_Conflict::OVERRIDE) return Fail("a conflict of an unknown kind");
     if (row.kind == Object::None) {
         links_.push_back({Link::Conflict, c, row.by, row.type, {}, 0});
     } else if (!view_) {
@@ -183,7 +184,7 @@ bool Builder::Add(const Conflict& row) {
     } else if (same_design_) {
         links_.push_back({Link::PendingConflict, c, row.by, row.type, {}, staged_.pending_.size()});
         staged_.pending_.push_back(
-            {c, Kept(row.object), static_cast<uint8_t>(row.kind), static_cast<uint8_t>(row.type ? row.type : 1)});
+            {c, Kept(row.object), static_cast<uint8_t>(row.kind), static_cast<uint8_t>(row.type)});
         c->lazy_ = true;
         c->pending_ = &target_;
     }
@@ -191,6 +192,9 @@ bool Builder::Add(const Conflict& row) {
 }
 
 bool Builder::Add(const Status& row) {
+    if (row.id < static_cast<int>(Cs_StatusID::FILE_ERROR) || row.id > static_cast<int>(Cs_StatusID::REPOSITORY_ERROR) ||
+        row.severity < Cs_Status::INFO || row.severity > Cs_Status::ERROR)
+        return Fail("a status of an unknown kind");
     const auto id = static_cast<Cs_StatusID>(row.id);
     const auto severity = static_cast<Cs_Status::SEVERITY>(row.severity);
     const int number = static_cast<int>(row.number);
