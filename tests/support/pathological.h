@@ -75,6 +75,22 @@ inline const std::vector<PathologicalInput>& PathologicalInputs() {
                     "INST \"*a*a*a*a*a*a*a*a*a*b/*\" TNM = w3;\nNET \"*a*a*a*a*a*a*a*a*a*c\" TIG;\n"
                     "PIN \"*a*a*a*a*a*a*a*a*a*b.P\" TIG;\nTIMEGRP w4 = NETS(\"*a*a*a*a*a*a*a*a*a*b\");\n";
          }},
+        // A piece of n / 20 a's between stars against names of n bytes that nearly hold it at
+        // every place (runs of n / 20 - 1 a's).
+        {"*aaa...aaa*", "name bytes", 1000000,
+         [](size_t n) {
+             auto design = PathologicalDesign();
+             Ndm_View* view = design->GetWorkView();
+             std::string name;
+             while (name.size() < n) name += std::string(n / 20 - 1, 'a') + "x";
+             for (const char* end : {"", "y"})
+                 view->CreateNetwork()->AddSignal(view->GetBlock()->CreateSignal((name + end).c_str()));
+             return design;
+         },
+         [](size_t n) {
+             const std::string piece(n / 20, 'a');
+             return "NET \"*" + piece + "*\" TIG;\nINST \"*" + piece + "*\" TNM = t;\nNET \"*x" + piece + "*\" TIG;\n";
+         }},
         // n subscripts nested in one name, of one delimiter and of the four in turn.
         {"nested subscripts", "levels", 100000, [](size_t) { return PathologicalDesign(); },
          [](size_t n) {
