@@ -75,6 +75,17 @@ TEST(UtStrTest, WildcardMatchingAgreesWithReference) {
         ASSERT_EQ(UT_STR::Match(t.c_str(), p.c_str()) != 0, reference(t, p, false)) << t << " ~ " << p;
         ASSERT_EQ(UT_STR::IMatch(t.c_str(), p.c_str()) != 0, reference(t, p, true)) << t << " ~ " << p;
     }
+    // Pieces of more than 16 bytes between stars, taken from the text so that some match.
+    for (int i = 0; i < 3000; ++i) {
+        std::string t = word("aab", 80);
+        while (t.size() < 24) t += "ab";
+        const std::string piece = t.substr(random() % (t.size() - 20), 17 + random() % 4);
+        std::string p = "*" + piece + "*";
+        if (random() % 2) p[1 + random() % piece.size()] ^= 'a' ^ 'b';
+        if (random() % 2) p += t.substr(t.size() - std::min<size_t>(t.size(), 2));
+        ASSERT_EQ(UT_STR::Match(t.c_str(), p.c_str()) != 0, reference(t, p, false)) << t << " ~ " << p;
+        ASSERT_EQ(UT_STR::IMatch(t.c_str(), p.c_str()) != 0, reference(t, p, true)) << t << " ~ " << p;
+    }
     // Long pieces between stars, where the long search is used.
     const std::string piece = "abababababababababac", text = "xx" + std::string(30, 'a') + "ababababababababababac" + "yy";
     EXPECT_TRUE(UT_STR::Match(text.c_str(), ("*" + piece + "*").c_str()));
