@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
-# Installs the Debian packages the build, the tests and the examples need, when missing.
+# Installs the Debian packages the build, the tests, the fuzzers (clang and its sanitizer and
+# libFuzzer runtimes) and the examples need, when missing.
 set -euo pipefail
-packages=(g++ clang cmake ninja-build libsimdjson-dev libcli11-dev libsqlite3-dev sqlite3 libgtest-dev
+packages=(g++ clang libclang-rt-dev cmake ninja-build libsimdjson-dev libcli11-dev libsqlite3-dev sqlite3 libgtest-dev
           libgmock-dev libbenchmark-dev yosys help2man dpkg-dev file pkgconf
           chromium)
 missing=()

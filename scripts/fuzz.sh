@@ -1,13 +1,14 @@
 #!/usr/bin/env bash
 # Builds the fuzzers (clang, instrumented, in build/fuzz) and runs one for a while over its seed
-# corpus with the constraint-language dictionary. New inputs go to build/fuzz/corpus/TARGET;
-# crashes to build/fuzz/artifacts/TARGET/.
-#   scripts/fuzz.sh TARGET SECONDS [-- extra libFuzzer arguments, e.g. -max_len=2000000 -jobs=2]
+# corpus with the constraint-language dictionary. New inputs go to build/fuzz/corpus/TARGET
+# (or FUZZ_CORPUS); crashes to build/fuzz/artifacts/TARGET/ (or FUZZ_ARTIFACTS). fuzz/corpus
+# is only read.
+#   scripts/fuzz.sh TARGET SECONDS [-- extra libFuzzer arguments, e.g. -max_len=2000000]
 # Targets: annotate yosys native filter repository extract.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 if [ $# -lt 2 ]; then
-  sed -n '2,6p' "$0" >&2
+  sed -n '2,7p' "$0" >&2
   exit 2
 fi
 target=$1 seconds=$2
@@ -19,7 +20,7 @@ CXX=${CXX:-clang++} cmake -S . -B build/fuzz -G Ninja -DCMAKE_BUILD_TYPE=RelWith
     -DLUN_TESTS=OFF -DLUN_BENCH=OFF >/dev/null
 cmake --build build/fuzz -j"${FUZZ_BUILD_JOBS:-$(nproc)}" --target "fuzz_$target"
 
-work=build/fuzz/corpus/$target artifacts=build/fuzz/artifacts/$target
+work=${FUZZ_CORPUS:-build/fuzz/corpus/$target} artifacts=${FUZZ_ARTIFACTS:-build/fuzz/artifacts/$target}
 mkdir -p "$work" "$artifacts"
 ASAN_OPTIONS=${ASAN_OPTIONS:-detect_leaks=1} UBSAN_OPTIONS=${UBSAN_OPTIONS:-print_stacktrace=1} \
   "build/fuzz/fuzz/fuzz_$target" -max_total_time="$seconds" -dict=fuzz/constraints.dict \

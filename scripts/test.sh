@@ -1,7 +1,9 @@
 #!/usr/bin/env bash
 # Builds the project three times and runs the whole test suite in each: optimised with warnings
 # as errors; with AddressSanitizer and UndefinedBehaviorSanitizer; and with clang, unoptimised
-# and without debug information (quick to build), so that the code stays portable.
+# and without debug information (quick to build), so that the code stays portable. Then a fuzz
+# smoke: every fuzzer (clang, instrumented) runs LUN_FUZZ_SECONDS (30) over the saved corpus,
+# its new inputs in a temporary folder; a finding fails the run and shows the fuzzer's report.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/deps.sh
@@ -22,3 +24,20 @@ CXX=clang++ cmake -S . -B build/clang -G Ninja -DCMAKE_BUILD_TYPE=Portability -D
     >/dev/null
 cmake --build build/clang -j"$jobs"
 (cd build/clang && ctest --output-on-failure -j"$jobs")
+
+scratch=$(mktemp -d)
+trap 'rm -rf "$scratch"' EXIT
+for dir in fuzz/corpus/*/; do
+    target=$(basename "$dir")
+    log=$scratch/$target.log
+    if ! FUZZ_CORPUS=$scratch/$target FUZZ_ARTIFACTS=build/fuzz/findings/$target FUZZ_BUILD_JOBS=$jobs \
+        scripts/fuzz.sh "$target" "${LUN_FUZZ_SECONDS:-30}" >"$log" 2>&1; then
+        tail -n 60 "$log"
+        echo "fuzz smoke: $target failed; its input is in build/fuzz/findings/$target/ (once fixed, keep it in" \
+             "fuzz/regressions/$target/)" >&2
+        exit 1
+    fi
+    echo "fuzz smoke: $target: $(grep -ho 'stat::number_of_executed_units: [0-9]*' "$log" | grep -o '[0-9]*$') inputs," \
+         "$(grep -o 'cov: [0-9]* ft: [0-9]*' "$log" | tail -n 1), no finding"
+done
+echo "fuzzers: $(ls -d fuzz/corpus/*/ | wc -l) passed, 0 failed"

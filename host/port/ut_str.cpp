@@ -6,6 +6,7 @@
 #include <cstdarg>
 #include <cstdlib>
 #include <cstring>
+#include <vector>
 
 #include "host/port/msgman.h"
 
@@ -14,41 +15,80 @@ namespace {
 inline unsigned char Fold(unsigned char c) { return (c >= 'A' && c <= 'Z') ? c + 32 : c; }
 
 template <bool kIgnoreCase>
-bool GlobMatch(const char* text, const char* pattern) {
-    // Iterative glob with a single backtrack point: linear for the usual patterns.
-    const char* star = nullptr;
-    const char* resume = nullptr;
-    while (*text) {
-        unsigned char p = static_cast<unsigned char>(*pattern);
-        unsigned char t = static_cast<unsigned char>(*text);
-        if (p == '*') {
-            while (*pattern == '*') ++pattern;
-            if (!std::strchr(pattern, '*')) {
-                // After the last star only the end of the text, as long as the rest of the
-                // pattern, can match it: no need to try every start (names can be long).
-                const size_t rest = std::strlen(pattern), left = std::strlen(text);
-                if (rest > left) return false;
-                for (text += left - rest; *pattern; ++pattern, ++text) {
-                    const unsigned char q = static_cast<unsigned char>(*pattern);
-                    const unsigned char c = static_cast<unsigned char>(*text);
-                    if (q != '?' && (kIgnoreCase ? Fold(q) != Fold(c) : q != c)) return false;
-                }
-                return true;
-            }
-            star = pattern - 1;
-            resume = text;
-        } else if (p && (p == '?' || (kIgnoreCase ? Fold(p) == Fold(t) : p == t))) {
-            ++pattern;
-            ++text;
-        } else if (star) {
-            pattern = star + 1;
-            text = ++resume;
-        } else {
+bool SameByte(unsigned char a, unsigned char b) {
+    return kIgnoreCase ? Fold(a) == Fold(b) : a == b;
+}
+
+// The n bytes of a star-free piece of pattern match the start of text (which holds n bytes).
+template <bool kIgnoreCase>
+bool PieceAt(const char* text, const char* piece, size_t n) {
+    for (size_t i = 0; i < n; ++i)
+        if (piece[i] != '?' && !SameByte<kIgnoreCase>(static_cast<unsigned char>(piece[i]),
+                                                        static_cast<unsigned char>(text[i])))
             return false;
-        }
+    return true;
+}
+
+constexpr size_t kNowhere = static_cast<size_t>(-1);
+
+// Leftmost start of a star-free piece of n bytes in the len bytes of text, or kNowhere. A long
+// piece without "?" is searched with its failure table (Knuth-Morris-Pratt), so that the time
+// is linear in len however long the piece: names and patterns can both be long. Short pieces,
+// and pieces with "?", are tried at every start.
+template <bool kIgnoreCase>
+size_t FindPiece(const char* text, size_t len, const char* piece, size_t n, std::vector<size_t>& fail) {
+    if (n > len) return kNowhere;
+    if (n <= 16 || std::memchr(piece, '?', n)) {
+        for (size_t at = 0; at + n <= len; ++at)
+            if (PieceAt<kIgnoreCase>(text + at, piece, n)) return at;
+        return kNowhere;
     }
-    while (*pattern == '*') ++pattern;
-    return *pattern == '\0';
+    auto same = [&](const char* a, size_t i, size_t k) {
+        return SameByte<kIgnoreCase>(static_cast<unsigned char>(a[i]), static_cast<unsigned char>(piece[k]));
+    };
+    fail.assign(n, 0);
+    for (size_t i = 1, k = 0; i < n; ++i) {
+        while (k && !same(piece, i, k)) k = fail[k - 1];
+        if (same(piece, i, k)) ++k;
+        fail[i] = k;
+    }
+    for (size_t i = 0, k = 0; i < len; ++i) {
+        while (k && !same(text, i, k)) k = fail[k - 1];
+        if (same(text, i, k)) ++k;
+        if (k == n) return i + 1 - n;
+    }
+    return kNowhere;
+}
+
+// The piece before the first star matches the start of the text, the piece after the last
+// star its end, and each piece between them is taken at its leftmost place after the one
+// before (which leaves the most room to the rest): no backtracking, linear for every pattern
+// without "?" between stars.
+template <bool kIgnoreCase>
+bool GlobMatch(const char* text, const char* pattern) {
+    const size_t len = std::strlen(text);
+    const char* first_star = std::strchr(pattern, '*');
+    if (!first_star) return std::strlen(pattern) == len && PieceAt<kIgnoreCase>(text, pattern, len);
+    const size_t head = static_cast<size_t>(first_star - pattern);
+    const char* last_star = std::strrchr(pattern, '*');
+    const size_t tail = std::strlen(last_star + 1);
+    if (head + tail > len || !PieceAt<kIgnoreCase>(text, pattern, head) ||
+        !PieceAt<kIgnoreCase>(text + len - tail, last_star + 1, tail))
+        return false;
+    size_t at = head;
+    const size_t end = len - tail;
+    std::vector<size_t> fail;
+    for (const char* piece = first_star + 1; piece < last_star;) {
+        const char* star = std::strchr(piece, '*');
+        const size_t n = static_cast<size_t>(star - piece);
+        if (n) {
+            const size_t found = FindPiece<kIgnoreCase>(text + at, end - at, piece, n, fail);
+            if (found == kNowhere) return false;
+            at += found + n;
+        }
+        piece = star + 1;
+    }
+    return true;
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 
 #include "host/port/file.h"
 #include "host/port/version.h"
+#include "support/chain_netlist.h"
 #include "support/test_support.h"
 
 namespace {
@@ -110,6 +111,32 @@ TEST(Cli, FatalLeavesNoOutputBehind) {
     EXPECT_EQ(Quillmap("annotate " + kExample + "blinky.json --ncf " + ncf + " -o " + saved, &out, &err), 2);
     EXPECT_NE(err.find("Second \"CONFIG PART\" statement found"), std::string::npos) << err;
     EXPECT_FALSE(Port::File::exist(saved.c_str()));
+}
+
+// A netlist 100,000 levels deep annotates by full paths and patterns, saves, reads back and
+// saves the same bytes again; one that doubles at every level is refused with one message.
+TEST(Cli, DeepAndExplodingNetlists) {
+    lun_test::ScratchDir dir;
+    constexpr int kLevels = 100000;
+    std::string path;
+    for (int i = 1; i < kLevels; ++i) path += "u/";
+    const std::string chain = dir.Write("chain.json", lun_test::ChainNetlist(kLevels));
+    const std::string ucf = dir.Write("deep.ucf", "NET \"" + path + "w\" LOC = P1;\nINST \"" + path + "g\" TNM = leaf;\n" +
+                                                      "PIN \"" + path + "g.A\" TIG;\nNET \"*/w\" TNM_NET = ws;\n");
+    const std::string first = dir.path() + "/first.qdf", second = dir.path() + "/second.qdf";
+    std::string out, err;
+    EXPECT_EQ(Quillmap("annotate " + chain + " --ucf " + ucf + " -o " + first, &out, &err), 0) << err.substr(0, 300);
+    EXPECT_EQ(Quillmap("convert " + first + " -o " + second, &out, &err), 0) << err.substr(0, 300);
+    const std::string saved = lun_test::ReadFile(first);
+    EXPECT_EQ(saved, lun_test::ReadFile(second));
+    for (const char* property : {"\"LOC\"", "\"TNM\"", "\"TIG\""})
+        EXPECT_NE(saved.find(property), std::string::npos) << property;
+    EXPECT_GE(lun_test::CountOf(saved, "\"TNM_NET\""), static_cast<size_t>(kLevels - 1));  // every level's w
+
+    const std::string doubling = dir.Write("doubling.json", lun_test::ChainNetlist(40, true));
+    EXPECT_EQ(Quillmap("annotate " + doubling + " --ucf " + ucf + " -o " + dir.path() + "/d.qdf", &out, &err), 1);
+    EXPECT_EQ(lun_test::CountOf(err, "\n"), 1u) << err;
+    EXPECT_NE(err.find("expands to 1649267441663 instances"), std::string::npos) << err;
 }
 
 TEST(Cli, PartReadsWithoutNetlist) {

@@ -6,11 +6,16 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <cctype>
+#include <chrono>
 #include <csignal>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <memory>
+#include <random>
+#include <cstring>
+#include <vector>
 
 #include "host/port/atomic_file.h"
 #include "host/port/env.h"
@@ -44,6 +49,62 @@ TEST(UtStrTest, WildcardMatching) {
     // a long text against a pattern of many stars stays fast (no exponential backtracking)
     std::string text(20000, 'a');
     EXPECT_FALSE(UT_STR::Match(text.c_str(), "*a*a*a*a*a*a*b"));
+}
+
+// Against a plain dynamic-programming matcher, on every short text and pattern of a few letters.
+TEST(UtStrTest, WildcardMatchingAgreesWithReference) {
+    auto reference = [](const std::string& t, const std::string& p, bool fold) {
+        auto same = [&](char a, char b) { return fold ? std::tolower(a) == std::tolower(b) : a == b; };
+        std::vector<std::vector<char>> m(t.size() + 1, std::vector<char>(p.size() + 1, 0));
+        m[0][0] = 1;
+        for (size_t j = 1; j <= p.size(); ++j) m[0][j] = p[j - 1] == '*' && m[0][j - 1];
+        for (size_t i = 1; i <= t.size(); ++i)
+            for (size_t j = 1; j <= p.size(); ++j)
+                m[i][j] = p[j - 1] == '*' ? (m[i - 1][j] || m[i][j - 1])
+                                          : (m[i - 1][j - 1] && (p[j - 1] == '?' || same(t[i - 1], p[j - 1])));
+        return m[t.size()][p.size()] != 0;
+    };
+    std::mt19937 random(5);
+    auto word = [&](const char* letters, size_t most) {
+        std::string w(random() % (most + 1), ' ');
+        for (char& c : w) c = letters[random() % std::strlen(letters)];
+        return w;
+    };
+    for (int i = 0; i < 20000; ++i) {
+        const std::string t = word("abA", 12), p = word("ab*?B", 8);
+        ASSERT_EQ(UT_STR::Match(t.c_str(), p.c_str()) != 0, reference(t, p, false)) << t << " ~ " << p;
+        ASSERT_EQ(UT_STR::IMatch(t.c_str(), p.c_str()) != 0, reference(t, p, true)) << t << " ~ " << p;
+    }
+    // Pieces of more than 16 bytes between stars, taken from the text so that some match.
+    for (int i = 0; i < 3000; ++i) {
+        std::string t = word("aab", 80);
+        while (t.size() < 24) t += "ab";
+        const std::string piece = t.substr(random() % (t.size() - 20), 17 + random() % 4);
+        std::string p = "*" + piece + "*";
+        if (random() % 2) p[1 + random() % piece.size()] ^= 'a' ^ 'b';
+        if (random() % 2) p += t.substr(t.size() - std::min<size_t>(t.size(), 2));
+        ASSERT_EQ(UT_STR::Match(t.c_str(), p.c_str()) != 0, reference(t, p, false)) << t << " ~ " << p;
+        ASSERT_EQ(UT_STR::IMatch(t.c_str(), p.c_str()) != 0, reference(t, p, true)) << t << " ~ " << p;
+    }
+    // Long pieces between stars, where the long search is used.
+    const std::string piece = "abababababababababac", text = "xx" + std::string(30, 'a') + "ababababababababababac" + "yy";
+    EXPECT_TRUE(UT_STR::Match(text.c_str(), ("*" + piece + "*").c_str()));
+    EXPECT_TRUE(UT_STR::IMatch(text.c_str(), "*ABABABABABABABABABAC*yy"));
+    EXPECT_FALSE(UT_STR::Match(text.c_str(), ("*" + piece + "*ac*").c_str()));
+    EXPECT_TRUE(UT_STR::Match(text.c_str(), ("x*" + piece + "*y").c_str()));
+}
+
+// A long piece between stars against a long name that almost holds it at every place: the old
+// search compared the piece again from every start (a 1 MB name took seconds per pattern).
+TEST(UtStrTest, WildcardSearchIsLinearInTheName) {
+    std::string name;
+    for (int i = 0; i < 20; ++i) name += std::string(9999, 'a') + "x";
+    const std::string pattern = "*" + std::string(10000, 'a') + "*";
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_FALSE(UT_STR::Match(name.c_str(), pattern.c_str()));
+    EXPECT_FALSE(UT_STR::IMatch(name.c_str(), ("*x" + std::string(10000, 'A') + "*").c_str()));
+    EXPECT_TRUE(UT_STR::Match((name + std::string(10000, 'a')).c_str(), pattern.c_str()));
+    EXPECT_LT(std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count(), 0.5);
 }
 
 TEST(UtStrTest, ComparisonsAndCopies) {
