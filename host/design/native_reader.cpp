@@ -227,7 +227,6 @@ private:
                 od::array children;
                 if (error_code e = field.value().get_array().get(children))
                     return JsonError(e, "\"blocks\" must be an array");
-                Reserve(children, *frame.block, 0);
                 if (error_code e = children.begin().get(frame.child)) return JsonError(e, "bad block");
                 if (error_code e = children.end().get(frame.children_end)) return JsonError(e, "bad block");
                 frame.in_children = true;
@@ -238,13 +237,14 @@ private:
         return true;
     }
 
-    // Makes room for the members an array lists (0 blocks, 1 signals, 2 pins), so that the
-    // member lists do not keep the slack of their growth. A malformed array is left to the
-    // reading that follows to report.
+    // Makes room for the signals (kind 1) or pins (kind 2) an array lists, so that the member
+    // lists do not keep the slack of their growth. Counting skips over the array once; child
+    // blocks are not counted, since their arrays nest and counting each would cost the square of
+    // the depth. A malformed array is left to the reading that follows to report.
     static void Reserve(od::array& array, Ndm_Block& block, int kind) {
         size_t n = 0;
         if (array.count_elements().get(n) != simdjson::SUCCESS || n == 0) return;
-        block.Reserve(kind == 0 ? n : 0, kind == 1 ? n : 0, kind == 2 ? n : 0);
+        block.Reserve(0, kind == 1 ? n : 0, kind == 2 ? n : 0);
     }
 
     bool Signals(od::value value, Ndm_Block& block) {
