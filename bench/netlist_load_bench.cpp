@@ -3,7 +3,6 @@
 // per database object. LUN_BENCH_CELLS overrides the cell count.
 #include <benchmark/benchmark.h>
 #include <malloc.h>
-#include <sys/resource.h>
 #include <unistd.h>
 
 #include <chrono>
@@ -16,6 +15,7 @@
 #include <string>
 
 #include "host/design/native_format.h"
+#include "cpu_time.h"
 #include "yosys_netlist_gen.h"
 #include "host/design/yosys_reader.h"
 
@@ -73,14 +73,6 @@ std::string TempPath(const char* suffix) {
 struct Cost {
     double cpu = 0, peak_mb = 0;
 };
-
-// Processor seconds this process has used.
-double CpuSeconds() {
-    struct rusage usage {};
-    ::getrusage(RUSAGE_SELF, &usage);
-    return static_cast<double>(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) +
-           static_cast<double>(usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1e6;
-}
 
 struct Shared {
     Cost netlist_load;

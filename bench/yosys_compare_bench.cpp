@@ -16,6 +16,7 @@
 #include <string>
 #include <vector>
 
+#include "cpu_time.h"
 #include "yosys_netlist_gen.h"
 
 namespace {
@@ -46,8 +47,7 @@ Run Measure(const std::vector<std::string>& argv, const std::string& log) {
     struct rusage usage {};
     if (child < 0 || ::wait4(child, &status, 0, &usage) != child) return run;
     run.ok = WIFEXITED(status) && WEXITSTATUS(status) == 0;
-    run.cpu = static_cast<double>(usage.ru_utime.tv_sec + usage.ru_stime.tv_sec) +
-              static_cast<double>(usage.ru_utime.tv_usec + usage.ru_stime.tv_usec) / 1e6;
+    run.cpu = CpuSeconds(usage);
     run.peak_mb = static_cast<double>(usage.ru_maxrss) / 1024.0;
     return run;
 }

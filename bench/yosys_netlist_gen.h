@@ -192,10 +192,7 @@ private:
         }
         InputNetnames();
         Put("\n        },\n        \"out\": {\n          \"hide_name\": 0,\n          \"bits\": [ ");
-        for (int i = 0; i < kOutputs; ++i) {
-            if (i) Put(", ");
-            Put(OutputBit(i));
-        }
+        Put(out_bits.c_str());
         Put(" ]\n        }");
         for (int64_t p = 0; p < pairs_; ++p) {
             Put(",\n        \"$abc$7$n");

@@ -2,11 +2,9 @@
 //
 // Snapshot layout: "LUNS", then the texts (a count, then each as its length, its bytes and a
 // terminating zero, each distinct text once), then one record per row, each a tag byte and its
-// fields. Numbers are LEB128 varints (signed ones zigzag-coded), texts are numbers into the text
+// fields. Numbers are varints, seven bits a byte, low bits first (signed ones zigzag-coded), texts are numbers into the text
 // table, the ids of a constraint's own rows are implied by the constraint before them.
 #include <fcntl.h>
-#include <sys/mman.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -15,6 +13,7 @@
 #include <vector>
 
 #include "host/design/name_pool.h"
+#include "host/parser/pr_logical.h"
 #include "host/repository/cs_rows.h"
 
 namespace Cs_Rows {
@@ -362,33 +361,9 @@ struct LaneHash {
     }
 };
 
-// A read-only view of a whole file.
-class Mapped {
-public:
-    explicit Mapped(const std::string& path) {
-        fd_ = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
-        struct stat st {};
-        if (fd_ < 0 || ::fstat(fd_, &st) != 0 || st.st_size <= 0) return;
-        size_ = static_cast<size_t>(st.st_size);
-        void* at = ::mmap(nullptr, size_, PROT_READ, MAP_PRIVATE, fd_, 0);
-        if (at != MAP_FAILED) data_ = static_cast<const unsigned char*>(at);
-    }
-    ~Mapped() {
-        if (data_) ::munmap(const_cast<unsigned char*>(data_), size_);
-        if (fd_ >= 0) ::close(fd_);
-    }
-    Mapped(const Mapped&) = delete;
-    Mapped& operator=(const Mapped&) = delete;
-    const unsigned char* data() const { return data_; }
-    size_t size() const { return data_ ? size_ : 0; }
-
-private:
-    int fd_ = -1;
-    const unsigned char* data_ = nullptr;
-    size_t size_ = 0;
-};
-
 constexpr size_t kHeader = 100;  // the database header, which holds the seal
+
+const unsigned char* Bytes(const Pr_FileText& file) { return reinterpret_cast<const unsigned char*>(file.data()); }
 
 uint32_t Stored(const unsigned char* data) {
     return static_cast<uint32_t>(data[kSealOffset]) << 24 | static_cast<uint32_t>(data[kSealOffset + 1]) << 16 |
@@ -414,12 +389,12 @@ uint32_t Seal(const unsigned char* data, size_t size) {
 bool SealFile(const std::string& path, std::string& error) {
     uint32_t seal;
     {
-        Mapped file(path);
-        if (file.size() < kHeader) {
+        auto file = Pr_FileText::Read(path.c_str());
+        if (!file || file->size() < kHeader) {
             error = "cannot read back " + path;
             return false;
         }
-        seal = Seal(file.data(), file.size());
+        seal = Seal(Bytes(*file), file->size());
     }
     const unsigned char bytes[4] = {static_cast<unsigned char>(seal >> 24), static_cast<unsigned char>(seal >> 16),
                                     static_cast<unsigned char>(seal >> 8), static_cast<unsigned char>(seal)};
@@ -434,8 +409,8 @@ bool SealFile(const std::string& path, std::string& error) {
 }
 
 bool SealHolds(const std::string& path) {
-    Mapped file(path);
-    return file.size() >= kHeader && Stored(file.data()) == Seal(file.data(), file.size());
+    auto file = Pr_FileText::Read(path.c_str());
+    return file && file->size() >= kHeader && Stored(Bytes(*file)) == Seal(Bytes(*file), file->size());
 }
 
 }  // namespace Cs_Rows

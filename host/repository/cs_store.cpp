@@ -683,7 +683,6 @@ Cs_ReturnCode Cs_Store::Restore(Cs_ConstraintMgr& mgr, const std::string& path) 
     if (!read && !ReadTables(db, info["content_checksum"], *staged.texts_, builder, why)) return fail(why);
     builder.Finish();
 
-    mgr.pending_.clear();  // of the content replaced
     mgr.sources_ = std::move(staged.sources_);
     mgr.loose_ = std::move(staged.loose_);
     mgr.resolution_ = std::move(staged.resolution_);
