@@ -335,7 +335,7 @@ namespace {
 // Four independent lanes of multiply-rotate rounds, so that the processor overlaps them: a few
 // bytes a cycle, for files of megabytes.
 struct LaneHash {
-    static constexpr uint64_t kP1 = 0x9E3779B185EBCA87ull, kP2 = 0xC2B2AE3D27D4EB4Full;
+    static constexpr uint64_t kP1 = 11400714785074694791ull, kP2 = 14029467366897019727ull;
     uint64_t lane[4] = {kP1 + kP2, kP2, 0, 0 - kP1};
     static uint64_t Rotl(uint64_t v, int r) { return (v << r) | (v >> (64 - r)); }
     static uint64_t Round(uint64_t acc, uint64_t v) { return Rotl(acc + v * kP2, 31) * kP1; }
