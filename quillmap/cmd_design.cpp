@@ -72,9 +72,11 @@ static void AddDumpCommand(CLI::App& app, QuillmapAction& run) {
     CLI::App* cmd = app.add_subcommand(
         "dump",
         "Print a design's objects and properties in a stable text form.\n"
-        "One object per line, indented by depth: blocks with their type, signals, pins with\n"
-        "direction and connected signal, then the networks; properties indented below\n"
-        "their object as NAME (type) = value. See docs/design-database.md.");
+        "One object per line, indented by depth, with its full name: blocks with their type,\n"
+        "signals, pins with direction and connected signal, then the networks with their\n"
+        "signals; properties one level below their object as % \"NAME\" type value. Deeper\n"
+        "than 32 levels lines stay at that indentation and names show .../ and their last 32\n"
+        "levels, so the dump grows with the design. See docs/design-database.md.");
     AddDesignArgs(cmd, args);
     cmd->add_option("-o,--output", args.output, "Write the dump to this file instead of stdout");
     cmd->callback([&run] {

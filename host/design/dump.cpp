@@ -1,7 +1,9 @@
 #include "host/design/dump.h"
 #include "host/port/json_text.h"
 
+#include <algorithm>
 #include <cstdio>
+#include <type_traits>
 #include <span>
 #include <string>
 #include <utility>
@@ -25,6 +27,10 @@ public:
 private:
     static constexpr size_t kFlush = 1 << 16;
 
+    // Beyond this many levels, lines stop moving right and names show only their last levels,
+    // so that every line is bounded whatever the depth and the dump grows with the design.
+    static constexpr uint32_t kLevels = 32;
+
     void View(const Ndm_View& view) {
         Line(0, "view");
         Quoted(view.GetName());
@@ -33,8 +39,12 @@ private:
         if (const Ndm_Block* top = view.GetBlock()) Tree(*top);
         for (const Ndm_Network* net : view.GetNetworkItr()) {
             Line(1, "network");
-            name_ = net->GetFullName();  // not net->GetName(), which would keep every name
-            Quoted(name_.c_str(), name_.size());
+            // not net->GetName(), which would keep every name
+            if (const Ndm_Signal* top = net->GetTopSignal()) {
+                FullName(*top);
+            } else {
+                Quoted("");
+            }
             buf_ += " signals ";
             buf_ += std::to_string(net->GetNumSignals());
             End();
@@ -149,7 +159,7 @@ private:
     }
 
     void Line(int depth, const char* word) {
-        buf_.append(static_cast<size_t>(depth) * 2, ' ');
+        buf_.append(static_cast<size_t>(std::min(depth, static_cast<int>(kLevels))) * 2, ' ');
         buf_ += word;
         buf_ += ' ';
     }
@@ -164,11 +174,35 @@ private:
         buf_.clear();
     }
 
-    template <class T>
+    // The full name, or ".../" and its last kLevels levels for an object deeper than that.
+    void FullName(const Ndm_Block& block) {
+        name_.clear();
+        BlockName(block);
+        Quoted(name_.c_str(), name_.size());
+    }
+
+    template <class T>  // a signal or a pin
     void FullName(const T& object) {
         name_.clear();
-        name_ = object.GetFullName();
+        BlockName(*object.GetBlock());
+        if (!name_.empty()) name_ += std::is_same_v<T, Ndm_Pin> ? '.' : '/';
+        name_ += object.GetName();
         Quoted(name_.c_str(), name_.size());
+    }
+
+    void BlockName(const Ndm_Block& block) {
+        if (block.GetDepth() <= kLevels) {
+            block.AppendFullName(name_);
+            return;
+        }
+        const Ndm_Block* chain[kLevels];
+        const Ndm_Block* b = &block;
+        for (uint32_t i = 0; i < kLevels; ++i, b = b->GetParent()) chain[i] = b;
+        name_ += ".../";
+        for (uint32_t i = kLevels; i-- > 0;) {
+            name_ += chain[i]->GetName();
+            if (i) name_ += '/';
+        }
     }
 
     void Quoted(const char* text) { Quoted(text ? text : "", text ? std::char_traits<char>::length(text) : 0); }

@@ -1,6 +1,8 @@
 // The quillmap command line: exit statuses, messages on bad input, output files.
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "host/port/file.h"
 #include "host/port/version.h"
 #include "support/chain_netlist.h"
@@ -114,7 +116,7 @@ TEST(Cli, FatalLeavesNoOutputBehind) {
 }
 
 // A netlist 100,000 levels deep annotates by full paths and patterns, saves, reads back and
-// saves the same bytes again; one that doubles at every level is refused with one message.
+// saves the same bytes again, and dumps to a few kilobytes a level; one that doubles at every level is refused with one message.
 TEST(Cli, DeepAndExplodingNetlists) {
     lun_test::ScratchDir dir;
     constexpr int kLevels = 100000;
@@ -132,6 +134,9 @@ TEST(Cli, DeepAndExplodingNetlists) {
     for (const char* property : {"\"LOC\"", "\"TNM\"", "\"TIG\""})
         EXPECT_NE(saved.find(property), std::string::npos) << property;
     EXPECT_GE(lun_test::CountOf(saved, "\"TNM_NET\""), static_cast<size_t>(kLevels - 1));  // every level's w
+    const std::string dump = dir.path() + "/deep.txt";
+    EXPECT_EQ(Quillmap("dump " + first + " -o " + dump, &out, &err), 0) << err.substr(0, 300);
+    EXPECT_LT(std::filesystem::file_size(dump), static_cast<uintmax_t>(kLevels) * 4000);
 
     const std::string doubling = dir.Write("doubling.json", lun_test::ChainNetlist(40, true));
     EXPECT_EQ(Quillmap("annotate " + doubling + " --ucf " + ucf + " -o " + dir.path() + "/d.qdf", &out, &err), 1);
