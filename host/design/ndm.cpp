@@ -550,7 +550,8 @@ Ndm_Design::Ndm_Design(const char* name)
     name_ = names_->Intern(name ? name : "");
 }
 
-Ndm_Design::~Ndm_Design() = default;
+// The design's own properties go first: they live in cells that its members hold.
+Ndm_Design::~Ndm_Design() { DeleteAllProperties(); }
 
 const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
 

@@ -1,6 +1,9 @@
 #include "host/design/ndm_property.h"
 
 #include <algorithm>
+#include <cstdlib>
+#include <cstring>
+#include <new>
 
 #include "host/design/ndm.h"
 
@@ -24,36 +27,107 @@ Ndm_Property* Set(Ndm_Property* p, double v) { return p ? (p->SetFloat64(v), p) 
 Ndm_Property* Set(Ndm_Property* p, const char* v) { return p ? (p->SetValueString(v), p) : p; }
 }  // namespace
 
+void Ndm_PropertyCells::Refill() {
+    // Chunks grow with the design, from 4 KB to 1 MB.
+    const size_t count = std::min<size_t>(size_t{128} << std::min<size_t>(chunks_.size(), 8), 32768);
+    chunks_.emplace_back(new Cell[count]);
+    cursor_ = chunks_.back().get();
+    left_ = count;
+}
+
+static_assert(sizeof(Ndm_Property) == Ndm_PropertyCells::kCell, "a property is four words");
+
+Ndm_PropertyCells& Ndm_Property::CellsOf(const Ndm_PropertyHolder* owner) {
+    return owner->OwnDesign()->PropertyCells();
+}
+
+Ndm_Property* Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char* name) {
+    return new (CellsOf(owner).Get()) Ndm_Property(owner, type, name);
+}
+
+void Ndm_Property::Destroy(Ndm_Property* p) {
+    Ndm_PropertyCells& cells = CellsOf(p->owner_);
+    p->~Ndm_Property();
+    cells.Put(p);
+}
+
 Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name)
-    : owner_(owner), type_(type), name_(name ? name : "") {}
+    : owner_(owner),
+      name_(owner->OwnDesign()->Intern(name ? name : "")),
+      float_(0.0),
+      type_(static_cast<uint8_t>(type)) {
+    if (type == NDM_PROP_STRING) text_ = "";
+    if (type == NDM_PROP_LIST || type == NDM_PROP_STRING_LIST) list_ = nullptr;
+}
 
 // Lists may nest as deeply as a file makes them: entries are freed from a work list, each
 // after its own entries were taken out, so no destructor recurses.
 Ndm_Property::~Ndm_Property() {
-    if (!list_) return;
+    if (type_ == NDM_PROP_STRING_LIST && owns_strings_) delete strings_;
+    if (type_ != NDM_PROP_LIST || !list_) return;
     std::vector<Ndm_Property*> work;
     work.swap(list_->entries);
+    Ndm_PropertyCells& cells = CellsOf(owner_);
+    list_->~ListData();
+    cells.Put(list_);
     while (!work.empty()) {
         Ndm_Property* p = work.back();
         work.pop_back();
-        if (p->list_) {
+        if (p->type_ == NDM_PROP_LIST && p->list_) {
             work.insert(work.end(), p->list_->entries.begin(), p->list_->entries.end());
             p->list_->entries.clear();
         }
-        delete p;
+        Destroy(p);
     }
 }
 
+const std::vector<std::string>& Ndm_Property::GetStrings() const {
+    static const std::vector<std::string> none;
+    return type_ == NDM_PROP_STRING_LIST && strings_ ? *strings_ : none;
+}
+
+void Ndm_Property::SetValueString(const char* value) {
+    if (type_ == NDM_PROP_STRING) text_ = owner_->OwnDesign()->Intern(value ? value : "");
+}
+
+const std::vector<std::string>* Ndm_TextLists::Extend(const std::vector<std::string>* list, const char* text) {
+    std::unique_ptr<std::vector<std::string>>& slot = lists_[Key{list, text}];
+    if (!slot) {
+        slot = std::make_unique<std::vector<std::string>>();
+        slot->reserve((list ? list->size() : 0) + 1);
+        if (list) *slot = *list;
+        slot->emplace_back(text);
+    }
+    return slot.get();
+}
+
+// Lists up to this long are shared; a longer one, which grows one text at a time (a statement
+// may attach a hundred thousand constraints to one object), becomes the property's own.
+static constexpr size_t kSharedTexts = 16;
+
 bool Ndm_Property::AddString(const char* text) {
     if (type_ != NDM_PROP_STRING_LIST) return false;
-    strings_.emplace_back(text ? text : "");
+    if (!text) text = "";
+    if (owns_strings_) {
+        const_cast<std::vector<std::string>*>(strings_)->emplace_back(text);
+    } else if (!strings_ || strings_->size() < kSharedTexts) {
+        Ndm_Design* design = owner_->OwnDesign();
+        strings_ = design->TextLists().Extend(strings_, design->Intern(text));
+    } else {
+        auto* own = new std::vector<std::string>();
+        own->reserve(strings_->size() * 2);
+        *own = *strings_;
+        own->emplace_back(text);
+        strings_ = own;
+        owns_strings_ = true;
+    }
     return true;
 }
 
 Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
     if (type_ != NDM_PROP_LIST) return nullptr;
-    if (!list_) list_ = std::make_unique<ListData>();
-    Ndm_Property* entry = list_->entries.emplace_back(new Ndm_Property(owner_, type, name));
+    if (!list_) list_ = new (CellsOf(owner_).Get()) ListData();
+    Ndm_Property* entry = list_->entries.emplace_back(Make(owner_, type, name));
     if (list_->index) list_->index->try_emplace(entry->name_, entry);
     return entry;
 }
@@ -76,11 +150,11 @@ Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
 }
 
 Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
-    if (!name || !list_) return nullptr;
+    if (!name || type_ != NDM_PROP_LIST || !list_) return nullptr;
     std::vector<Ndm_Property*>& entries = list_->entries;
     if (entries.size() <= kIndexFrom) {
         for (Ndm_Property* e : entries)
-            if (e->name_ == name) return e;
+            if (std::strcmp(e->name_, name) == 0) return e;
         return nullptr;
     }
     auto& index = list_->index;
@@ -95,22 +169,52 @@ Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
 }
 
 bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
-    if (!list_) return false;
+    if (type_ != NDM_PROP_LIST || !list_) return false;
     auto it = std::find(list_->entries.begin(), list_->entries.end(), entry);
     if (it == list_->entries.end()) return false;
     list_->entries.erase(it);
     // The first entry of that name may have changed: the index is rebuilt on the next lookup.
     list_->index.reset();
-    delete entry;
+    Destroy(entry);
     return true;
+}
+
+// ---- holders ----
+
+struct Ndm_PropertyHolder::Props {
+    uint32_t size;
+    uint32_t room;
+    Ndm_Property** begin() { return reinterpret_cast<Ndm_Property**>(this + 1); }
+    Ndm_Property** end() { return begin() + size; }
+
+    static Props* Make(uint32_t room, const Props* from) {
+        auto* p = static_cast<Props*>(std::malloc(sizeof(Props) + room * sizeof(Ndm_Property*)));
+        if (!p) throw std::bad_alloc();
+        p->size = from ? from->size : 0;
+        p->room = room;
+        if (from) std::memcpy(p->begin(), const_cast<Props*>(from)->begin(), from->size * sizeof(Ndm_Property*));
+        return p;
+    }
+};
+
+Ndm_Design* Ndm_PropertyHolder::OwnDesign() const {
+    switch (kind_) {
+        case Ndm_ObjKind::Design: return const_cast<Ndm_Design*>(static_cast<const Ndm_Design*>(this));
+        case Ndm_ObjKind::View: return static_cast<const Ndm_View*>(this)->GetDesign();
+        case Ndm_ObjKind::Block: return static_cast<const Ndm_Block*>(this)->GetView()->GetDesign();
+        case Ndm_ObjKind::Signal: return static_cast<const Ndm_Signal*>(this)->GetBlock()->GetView()->GetDesign();
+        case Ndm_ObjKind::Pin: return static_cast<const Ndm_Pin*>(this)->GetBlock()->GetView()->GetDesign();
+        case Ndm_ObjKind::Network: return static_cast<const Ndm_Network*>(this)->GetView()->GetDesign();
+    }
+    return nullptr;
 }
 
 Ndm_PropertyHolder::~Ndm_PropertyHolder() { DeleteAllProperties(); }
 
 void Ndm_PropertyHolder::DeleteAllProperties() {
     if (!props_) return;
-    for (Ndm_Property* p : *props_) delete p;
-    delete props_;
+    for (Ndm_Property* p : *props_) Ndm_Property::Destroy(p);
+    std::free(props_);
     props_ = nullptr;
 }
 
@@ -139,31 +243,36 @@ std::string Ndm_PropertyHolder::GetFullName() const {
 Ndm_Property* Ndm_PropertyHolder::GetPropertyByName(const char* name) const {
     if (!props_ || !name) return nullptr;
     for (Ndm_Property* p : *props_)
-        if (p->name_ == name) return p;
+        if (std::strcmp(p->name_, name) == 0) return p;
     return nullptr;
 }
 
 std::span<Ndm_Property* const> Ndm_PropertyHolder::GetPropertyItr() const {
     if (!props_) return {};
-    return *props_;
+    return {props_->begin(), props_->size};
 }
 
-int Ndm_PropertyHolder::GetNumProperties() const {
-    return props_ ? static_cast<int>(props_->size()) : 0;
-}
+int Ndm_PropertyHolder::GetNumProperties() const { return props_ ? static_cast<int>(props_->size) : 0; }
 
 Ndm_Property* Ndm_PropertyHolder::Create(int type, const char* name) {
     if (!name) return nullptr;
-    if (!props_) props_ = new std::vector<Ndm_Property*>();
-    auto* fresh = new Ndm_Property(this, type, name);
-    for (Ndm_Property*& p : *props_) {
-        if (p->name_ == name) {
-            delete p;
-            p = fresh;
-            return fresh;
+    Ndm_Property* fresh = Ndm_Property::Make(this, type, name);
+    if (props_) {
+        for (Ndm_Property*& p : *props_) {
+            if (std::strcmp(p->name_, name) == 0) {
+                Ndm_Property::Destroy(p);
+                p = fresh;
+                return fresh;
+            }
         }
     }
-    props_->push_back(fresh);
+    if (!props_ || props_->size == props_->room) {
+        // Two, then doubling: most objects hold one to three properties.
+        Props* grown = Props::Make(props_ ? props_->room * 2 : 2, props_);
+        std::free(props_);
+        props_ = grown;
+    }
+    props_->begin()[props_->size++] = fresh;
     return fresh;
 }
 
@@ -190,9 +299,10 @@ bool Ndm_PropertyHolder::DeleteProperty(const char* name) {
 
 bool Ndm_PropertyHolder::DeleteProperty(Ndm_Property* property) {
     if (!props_ || !property) return false;
-    auto it = std::find(props_->begin(), props_->end(), property);
+    Ndm_Property** it = std::find(props_->begin(), props_->end(), property);
     if (it == props_->end()) return false;
-    props_->erase(it);
-    delete property;
+    std::copy(it + 1, props_->end(), it);
+    --props_->size;
+    Ndm_Property::Destroy(property);
     return true;
 }

@@ -13,6 +13,8 @@
 #include <vector>
 
 class Ndm_PropertyHolder;
+class Ndm_Design;
+class Ndm_PropertyCells;
 
 // Type codes reported by Ndm_Property::GetType.
 enum Ndm_PropType : int {
@@ -36,7 +38,7 @@ public:
     ~Ndm_Property();
 
     // Property name.
-    const char* GetName() const { return name_.c_str(); }
+    const char* GetName() const { return name_; }
     // Type code (Ndm_PropType).
     int GetType() const { return type_; }
     // Object the property sits on (for list entries: the object of the list).
@@ -47,14 +49,17 @@ public:
     int32_t GetInt32() const { return type_ == NDM_PROP_INT32 ? int_ : 0; }
     double GetFloat64() const { return type_ == NDM_PROP_FLOAT64 ? float_ : 0.0; }
     // Text of a string property, or null.
-    const char* GetValueString() const { return type_ == NDM_PROP_STRING ? text_.c_str() : nullptr; }
+    const char* GetValueString() const { return type_ == NDM_PROP_STRING ? text_ : nullptr; }
     // Texts of a string list, in order (empty for other types).
-    const std::vector<std::string>& GetStrings() const { return strings_; }
+    const std::vector<std::string>& GetStrings() const;
     // Entries of a list property, in order (empty for other types).
     std::span<Ndm_Property* const> GetListItr() const {
-        return list_ ? std::span<Ndm_Property* const>(list_->entries) : std::span<Ndm_Property* const>();
+        return type_ == NDM_PROP_LIST && list_ ? std::span<Ndm_Property* const>(list_->entries)
+                                               : std::span<Ndm_Property* const>();
     }
-    int GetNumEntries() const { return list_ ? static_cast<int>(list_->entries.size()) : 0; }
+    int GetNumEntries() const {
+        return type_ == NDM_PROP_LIST && list_ ? static_cast<int>(list_->entries.size()) : 0;
+    }
 
     // Appends a text to a string list; false for other types.
     bool AddString(const char* text);
@@ -70,33 +75,103 @@ public:
     // Removes and destroys one entry of a list; false when it is not an entry of this list.
     bool DeleteEntry(Ndm_Property* entry);
 
-    // Replaces the value (type unchanged): for bool, int32, float64, string properties.
-    void SetBool(bool value) { int_ = value ? 1 : 0; }
-    void SetInt32(int32_t value) { int_ = value; }
-    void SetFloat64(double value) { float_ = value; }
-    void SetValueString(const char* value) { text_ = value ? value : ""; }
+    // Replaces the value of a bool, int32, float64 or string property; a property of another
+    // type is left as it is.
+    void SetBool(bool value) {
+        if (type_ == NDM_PROP_BOOL) int_ = value ? 1 : 0;
+    }
+    void SetInt32(int32_t value) {
+        if (type_ == NDM_PROP_INT32) int_ = value;
+    }
+    void SetFloat64(double value) {
+        if (type_ == NDM_PROP_FLOAT64) float_ = value;
+    }
+    void SetValueString(const char* value);
 
 private:
     friend class Ndm_PropertyHolder;
     Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name);
+    // Properties and list data live in the design's cells.
+    static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
+    static Ndm_Property* Make(Ndm_PropertyHolder* owner, int type, const char* name);
+    static void Destroy(Ndm_Property* p);
     Ndm_Property* AddEntry(int type, const char* name);
 
-    Ndm_PropertyHolder* owner_;
-    int type_;
-    int32_t int_ = 0;
-    double float_ = 0.0;
-    std::string name_;
-    std::string text_;
-    std::vector<std::string> strings_;
     // Entries of a list property (owned), and the first entry of each name, built by the first
-    // lookup in a list of more than kIndexFrom entries and kept up to date by additions. Only
-    // list properties pay for it.
+    // lookup in a list of more than kIndexFrom entries and kept up to date by additions.
     struct ListData {
         std::vector<Ndm_Property*> entries;
         std::unique_ptr<std::unordered_map<std::string_view, Ndm_Property*>> index;
     };
     static constexpr size_t kIndexFrom = 8;
-    std::unique_ptr<ListData> list_;
+    static_assert(sizeof(ListData) <= 32);
+
+    // Names and texts are interned in the design, and a short string list is a value the
+    // design shares between every property holding the same texts (Ndm_TextLists): an object
+    // pays for its properties, not for their values.
+    Ndm_PropertyHolder* owner_;
+    const char* name_;
+    union {
+        int32_t int_;
+        double float_;
+        const char* text_;                        // string
+        const std::vector<std::string>* strings_;  // string list: shared, or owned when long
+        ListData* list_;                          // list (owned), null while empty
+    };
+    uint8_t type_;
+    bool owns_strings_ = false;
+};
+
+// Cells of 32 bytes for a design's properties, taken from large chunks and reused once freed:
+// a property costs its own size, with no allocator overhead, and making one is a pointer pop.
+class Ndm_PropertyCells {
+public:
+    static constexpr size_t kCell = 32;
+    void* Get() {
+        if (free_) {
+            void* cell = free_;
+            free_ = *static_cast<void**>(cell);
+            return cell;
+        }
+        if (!left_) Refill();
+        --left_;
+        return cursor_++;
+    }
+    void Put(void* cell) {
+        *static_cast<void**>(cell) = free_;
+        free_ = cell;
+    }
+
+private:
+    struct alignas(16) Cell {
+        unsigned char bytes[kCell];
+    };
+    void Refill();
+    std::vector<std::unique_ptr<Cell[]>> chunks_;
+    Cell* cursor_ = nullptr;
+    size_t left_ = 0;
+    void* free_ = nullptr;
+};
+
+// The string-list values of a design: one for each distinct short list, reached from the list
+// it extends by one text. Lists are never freed before the design.
+class Ndm_TextLists {
+public:
+    // The list made of list's texts (null: none) followed by text, which the design has interned.
+    const std::vector<std::string>* Extend(const std::vector<std::string>* list, const char* text);
+
+private:
+    struct Key {
+        const void* list;
+        const char* text;
+        bool operator==(const Key&) const = default;
+    };
+    struct KeyHash {
+        size_t operator()(const Key& k) const {
+            return std::hash<const void*>()(k.list) * 31 + std::hash<const void*>()(k.text);
+        }
+    };
+    std::unordered_map<Key, std::unique_ptr<std::vector<std::string>>, KeyHash> lists_;
 };
 
 // Kinds of design objects.
@@ -140,8 +215,13 @@ protected:
     ~Ndm_PropertyHolder();
 
 private:
+    friend class Ndm_Property;
     Ndm_Property* Create(int type, const char* name);
 
-    std::vector<Ndm_Property*>* props_ = nullptr;  // owned, allocated on the first property
+    // The design the object belongs to, which interns the property names and texts.
+    Ndm_Design* OwnDesign() const;
+
+    struct Props;            // count, room and the property pointers, in one allocation
+    Props* props_ = nullptr;  // allocated on the first property
     Ndm_ObjKind kind_;
 };

@@ -143,6 +143,49 @@ TEST(DesignDatabase, PropertiesReplaceInPlaceAndListsKeepDuplicates) {
     EXPECT_STREQ(t.top->GetPropertyItr()[0]->GetName(), "b");
 }
 
+// Equal string lists are one value shared between objects; changing one object's list, or
+// growing it past the shared length, never shows on another. Setters keep a property's type.
+TEST(DesignDatabase, SharedValuesNeverLeakBetweenObjects) {
+    Tree t;
+    std::vector<Ndm_Property*> lists;
+    Ndm_Block* u1 = t.top->CreateBlock("u1");
+    for (Ndm_PropertyHolder* holder : {static_cast<Ndm_PropertyHolder*>(t.top), static_cast<Ndm_PropertyHolder*>(u1),
+                                       static_cast<Ndm_PropertyHolder*>(u1->CreatePin("A"))}) {
+        Ndm_Property* list = holder->CreatePropertyStringList("FROM_UCF");
+        list->AddString("TNM");
+        list->AddString(nullptr);
+        lists.push_back(list);
+    }
+    EXPECT_EQ(&lists[0]->GetStrings(), &lists[1]->GetStrings());  // one value for equal lists
+    lists[1]->AddString("LOC");
+    const std::vector<std::string> two = {"TNM", ""}, three = {"TNM", "", "LOC"};
+    EXPECT_EQ(lists[0]->GetStrings(), two);
+    EXPECT_EQ(lists[1]->GetStrings(), three);
+    std::vector<std::string> expect = two;
+    for (int i = 0; i < 40; ++i) {  // past the shared length, the list is the property's own
+        const std::string text = "T" + std::to_string(i % 3);
+        lists[2]->AddString(text.c_str());
+        expect.push_back(text);
+        if (i == 20) lists[0]->AddString("T0");
+    }
+    EXPECT_EQ(lists[2]->GetStrings(), expect);
+    EXPECT_EQ(lists[0]->GetStrings(), (std::vector<std::string>{"TNM", "", "T0"}));
+    EXPECT_EQ(lists[1]->GetStrings(), three);
+
+    Ndm_Property* text = t.top->CreatePropertyString("LOC", "P1");
+    text->SetInt32(7);
+    text->SetFloat64(1.5);
+    text->SetBool(true);
+    EXPECT_STREQ(text->GetValueString(), "P1");
+    text->SetValueString(nullptr);
+    EXPECT_STREQ(text->GetValueString(), "");
+    Ndm_Property* number = t.top->CreatePropertyInt32("N", 3);
+    number->SetValueString("x");
+    number->AddString("x");
+    EXPECT_EQ(number->GetInt32(), 3);
+    EXPECT_TRUE(number->GetStrings().empty());
+}
+
 TEST(DesignDatabase, NetworksAreNamedAfterTheHighestSignal) {
     Tree t;
     Ndm_Block* a = t.top->CreateBlock("a");
