@@ -292,22 +292,22 @@ std::string StoredName(const Definition& d, const std::string& upper) {
 Match Lookup(const Definitions& defs, const char* name, unsigned kind) {
     Match m;
     std::string upper = Upper(name ? name : "");
-    std::vector<const Definition*> candidates;
+    // The first definition carrying the name gives the stored name, unless a later one allows
+    // the kind of object. True once that one is found.
+    auto take = [&](const Definition& d) {
+        if (!m.known || (d.kinds & kind)) m.stored = StoredName(d, upper);
+        m.known = true;
+        if (!(d.kinds & kind)) return false;
+        m.def = &d;
+        return true;
+    };
     if (auto it = defs.exact.find(upper); it != defs.exact.end()) {
-        for (size_t i : it->second) candidates.push_back(&defs.defs[i]);
+        for (size_t i : it->second)
+            if (take(defs.defs[i])) break;
     } else {
         for (size_t i : defs.patterns)
-            if (PatternMatches(defs.defs[i], upper)) candidates.push_back(&defs.defs[i]);
+            if (PatternMatches(defs.defs[i], upper) && take(defs.defs[i])) break;
     }
-    if (candidates.empty()) return m;
-    m.known = true;
-    m.stored = StoredName(*candidates.front(), upper);
-    for (const Definition* d : candidates)
-        if (d->kinds & kind) {
-            m.def = d;
-            m.stored = StoredName(*d, upper);
-            break;
-        }
     return m;
 }
 
