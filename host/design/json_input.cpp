@@ -172,10 +172,21 @@ bool Input::Open(const char* path, std::string& error) {
     return true;
 }
 
+void Input::DropBefore(size_t offset) {
+    constexpr size_t kStep = size_t{8} << 20;
+    if (!map_ || offset < dropped_ + kStep) return;
+    const size_t page = static_cast<size_t>(::sysconf(_SC_PAGESIZE));
+    const size_t end = std::min(offset, size_) / page * page;
+    if (end <= dropped_) return;
+    ::madvise(static_cast<char*>(map_) + dropped_, end - dropped_, MADV_DONTNEED);
+    dropped_ = end;
+}
+
 void Input::Release() {
     if (map_) ::munmap(map_, map_size_);
     map_ = nullptr;
     map_size_ = 0;
+    dropped_ = 0;
     copy_ = simdjson::padded_string();
     data_ = "";
     size_ = 0;

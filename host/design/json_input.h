@@ -27,6 +27,10 @@ public:
     // Opens path; on failure error tells why (from errno).
     bool Open(const char* path, std::string& error);
     void Release();
+    // Gives the pages of a mapped file before offset back to the system, a few megabytes at a
+    // time: a reader that builds as it goes no longer needs what it has passed (and would read
+    // it from the file again if it looked back), so the whole file is never resident at once.
+    void DropBefore(size_t offset);
     const char* data() const { return data_; }
     size_t size() const { return size_; }
     simdjson::padded_string_view view() const {
@@ -37,6 +41,7 @@ private:
     simdjson::padded_string copy_;
     void* map_ = nullptr;
     size_t map_size_ = 0;
+    size_t dropped_ = 0;  // bytes of the mapped file given back
     const char* data_ = "";
     size_t size_ = 0;
 };

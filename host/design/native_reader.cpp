@@ -151,10 +151,12 @@ private:
                 od::array nets;
                 if (error_code e = field.value().get_array().get(nets))
                     return JsonError(e, "\"networks\" must be an array");
+                size_t count = 0;
                 for (auto nitem : nets) {
                     od::value net;
                     if (error_code e = std::move(nitem).get(net)) return JsonError(e, "bad network");
                     if (!Network(net, *view)) return false;
+                    if ((++count & 1023) == 0) buf_.DropBefore(Where());
                 }
             }
         }
@@ -173,6 +175,7 @@ private:
             od::array_iterator child, children_end;
         };
         std::vector<Frame> stack;
+        size_t opened = 0;
         auto open = [&](od::value v) {
             od::object object;
             Frame frame;
@@ -180,6 +183,7 @@ private:
             if (error_code e = object.begin().get(frame.member)) return JsonError(e, "bad block member");
             if (error_code e = object.end().get(frame.members_end)) return JsonError(e, "bad block member");
             stack.push_back(frame);
+            if ((++opened & 1023) == 0) buf_.DropBefore(Where());
             return true;
         };
         if (!open(value)) return false;

@@ -271,6 +271,7 @@ bool Reader::ParseCells(od::value value, Module& m) {
         const size_t bad = bad_names_;
         if (!ParseCell(body, m, cell)) return false;
         if (bad_names_ == bad) m.cells.push_back(cell);
+        if ((m.cells.size() & 1023) == 0) buf_.DropBefore(Where());
     }
     return true;
 }
