@@ -82,6 +82,10 @@ protected:
     unsigned char create_property(Ndm_PropertyHolder* object, Pr_Logical_Constraint* constraint,
                                   const char* name, unsigned char* error_reported,
                                   const Pr_Logical_ConstraintHandle* handle);
+    // create_property with the constraint's plan made already: a statement plans each of its
+    // constraints once, however many objects it names.
+    unsigned char create_planned(Ndm_PropertyHolder* object, const struct Pr_PropertyPlan& plan,
+                                 unsigned char* error_reported, const Pr_Logical_ConstraintHandle* handle);
 
     // Name resolution (exact_case false: the case-insensitive fallback, reported per use).
     Ndm_Block* find_blk(Ndm_Block* block, const char* name, unsigned char exact_case,

@@ -3,6 +3,7 @@
 #include <string>
 #include <vector>
 
+#include "host/parser/pr_property_texts.h"
 #include "host/port/env.h"
 #include "host/port/msgman.h"
 #include "manager/lunmgr.h"
@@ -24,6 +25,21 @@ const char* FirstKeyword(const Pr_Logical_ConstraintDefn& defn) {
 const char* Keyword(const Pr_Logical_Constraint* c) {
     const char* key = c->get_name();
     return key && *key ? key : nullptr;
+}
+
+// The keyword (null when unknown) and the plan of a constraint of a statement.
+struct PlannedConstraint {
+    const char* keyword;
+    Pr_PropertyPlan plan;
+};
+
+std::vector<PlannedConstraint> PlanConstraints(const Pr_Logical_ConstraintDefn& defn, bool ucf) {
+    std::vector<PlannedConstraint> plans;
+    for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
+        const char* keyword = Keyword(*it);
+        plans.push_back({keyword, keyword ? Pr_PlanProperties(**it, keyword, ucf) : Pr_PropertyPlan()});
+    }
+    return plans;
 }
 }  // namespace
 
@@ -88,16 +104,16 @@ bool Ta_LunMgr::cb_comp(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_
     std::vector<Ndm_Block*> found = Finder().Instances(defn.get_object_name(), working, report);
     tried_names.clear();
     if (found.empty()) return ApplyUnmatchedPolicy(ObjectKind::Inst, defn, working.c_str(), handle);
+    const std::vector<PlannedConstraint> plans = PlanConstraints(defn, file_type == CP_UCF);
 
     for (Ndm_Block* block : found) {
-        for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
-            const char* keyword = Keyword(*it);
-            if (!keyword) {
+        for (const PlannedConstraint& c : plans) {
+            if (!c.keyword) {
                 Msg(__LINE__).issueInternal("Constraint type for INST is unknown.\n INST entry is '%s'.", TextOf(handle));
                 break;
             }
             unsigned char error_reported = 0;
-            if (!create_property(block, *it, keyword, &error_reported, handle)) return false;
+            if (!create_planned(block, c.plan, &error_reported, handle)) return false;
         }
     }
     return true;
@@ -111,18 +127,18 @@ bool Ta_LunMgr::cb_net(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
     std::vector<Ndm_Signal*> found = Finder().Nets(defn.get_object_name(), working, report);
     tried_names.clear();
     if (found.empty()) return ApplyUnmatchedPolicy(ObjectKind::Net, defn, working.c_str(), handle);
+    const std::vector<PlannedConstraint> plans = PlanConstraints(defn, file_type == CP_UCF);
 
     for (Ndm_Signal* sig : found) {
         Ndm_PropertyHolder* holder = sig->GetNetwork();
         if (!holder) holder = sig;  // a signal outside every network carries its own constraints
-        for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
-            const char* keyword = Keyword(*it);
-            if (!keyword) {
+        for (const PlannedConstraint& c : plans) {
+            if (!c.keyword) {
                 Msg(__LINE__).issueInternal("Constraint type for NET is unknown. NET entry is '%s'.", TextOf(handle));
                 break;
             }
             unsigned char error_reported = 0;
-            if (!create_property(holder, *it, keyword, &error_reported, handle)) return false;
+            if (!create_planned(holder, c.plan, &error_reported, handle)) return false;
             // A network is named after its top signal: the names are made (as long as the
             // hierarchy is deep) only for another signal.
             if (holder == sig || sig->GetNetwork()->GetTopSignal() == sig) continue;
@@ -145,16 +161,16 @@ bool Ta_LunMgr::cb_pin(const Pr_Logical_ConstraintDefn& defn, const Pr_Logical_C
     std::vector<Ndm_Pin*> found = Finder().Pins(defn.get_object_name(), working, report);
     tried_names.clear();
     if (found.empty()) return ApplyUnmatchedPolicy(ObjectKind::Pin, defn, working.c_str(), handle);
+    const std::vector<PlannedConstraint> plans = PlanConstraints(defn, file_type == CP_UCF);
 
     for (Ndm_Pin* pin : found) {
-        for (auto it = defn.begin_constraint(); it != defn.end_constraint(); ++it) {
-            const char* keyword = Keyword(*it);
-            if (!keyword) {
+        for (const PlannedConstraint& c : plans) {
+            if (!c.keyword) {
                 Msg(__LINE__).issueInternal("Constraint type for PIN is unknown. PIN entry is '%s'.", TextOf(handle));
                 break;
             }
             unsigned char error_reported = 0;
-            if (!create_property(pin, *it, keyword, &error_reported, handle)) return false;
+            if (!create_planned(pin, c.plan, &error_reported, handle)) return false;
         }
     }
     return true;

@@ -13,8 +13,12 @@ using lunmgr::Msg;
 unsigned char Ta_LunMgr::create_property(Ndm_PropertyHolder* object, Pr_Logical_Constraint* constraint,
                                          const char* name, unsigned char* error_reported,
                                          const Pr_Logical_ConstraintHandle* handle) {
+    return create_planned(object, Pr_PlanProperties(*constraint, name, file_type == CP_UCF), error_reported, handle);
+}
+
+unsigned char Ta_LunMgr::create_planned(Ndm_PropertyHolder* object, const Pr_PropertyPlan& plan,
+                                        unsigned char* error_reported, const Pr_Logical_ConstraintHandle* handle) {
     int line = handle ? handle->getline() : 0;
-    Pr_PropertyPlan plan = Pr_PlanProperties(*constraint, name, file_type == CP_UCF);
     switch (plan.rule) {
         case Pr_PropertyRule::PassOver: return 1;
         case Pr_PropertyRule::Nothing: return 0;
