@@ -12,6 +12,17 @@
 #include <unordered_map>
 #include <vector>
 
+#if defined(__SANITIZE_ADDRESS__)
+#define NDM_ASAN 1
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define NDM_ASAN 1
+#endif
+#endif
+#if NDM_ASAN
+#include <sanitizer/asan_interface.h>
+#endif
+
 class Ndm_PropertyHolder;
 class Ndm_Design;
 class Ndm_PropertyCells;
@@ -130,6 +141,7 @@ public:
     void* Get() {
         if (free_) {
             void* cell = free_;
+            Unpoison(cell);
             free_ = *static_cast<void**>(cell);
             return cell;
         }
@@ -140,6 +152,7 @@ public:
     void Put(void* cell) {
         *static_cast<void**>(cell) = free_;
         free_ = cell;
+        Poison(cell);
     }
 
 private:
@@ -147,6 +160,15 @@ private:
         unsigned char bytes[kCell];
     };
     void Refill();
+    // Under AddressSanitizer a free cell is poisoned, so that a property used after it was
+    // deleted is still reported.
+#if NDM_ASAN
+    static void Poison(void* cell) { ASAN_POISON_MEMORY_REGION(cell, kCell); }
+    static void Unpoison(void* cell) { ASAN_UNPOISON_MEMORY_REGION(cell, kCell); }
+#else
+    static void Poison(void*) {}
+    static void Unpoison(void*) {}
+#endif
     std::vector<std::unique_ptr<Cell[]>> chunks_;
     Cell* cursor_ = nullptr;
     size_t left_ = 0;

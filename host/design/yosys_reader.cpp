@@ -115,6 +115,7 @@ bool Reader::ParseRoot() {
             if (error_code e = mfield.value().get_object().get(object))
                 return JsonError(e, Port_Format("module '%s' must be an object", m.name));
             if (!ParseModule(object, m)) return false;
+            buf_.DropBefore(Where());
             Finish(m);
             module_index_.InsertIfAbsent(m.name, AsValue(modules_.size()));
             modules_.push_back(std::move(m));

@@ -386,6 +386,43 @@ TEST(YosysReader, BadInputGivesOneClearError) {
 }
 
 
+// A large file is mapped and its pages are given back once read past: the design is whole, and
+// an error found afterwards reports the offset it would in a small file.
+TEST(YosysReader, LargeFileReadPastItsDroppedPages) {
+    TempDir dir;
+    std::string cells;
+    constexpr int kCells = 400000;  // about 20 MB
+    for (int i = 0; i < kCells; ++i)
+        cells += (i ? ",\n" : "") + std::string("        \"cell_") + std::to_string(i) + "\": {\"type\": \"LUT4\"}";
+    auto netlist = [&](const std::string& body, const char* bits) {
+        return "{\"modules\": {\"top\": {\"cells\": {\n" + body + "\n}, \"netnames\": {\"n\": {\"bits\": " + bits +
+               "}}}}}";
+    };
+    const std::string good = dir.Write("good.json", netlist(cells, "[2]"));
+    Port_MsgCapture capture;
+    auto design = Ndm_LoadDesign(good.c_str(), nullptr);
+    ASSERT_TRUE(design);
+    const Ndm_Block* top = design->GetWorkView()->GetBlock();
+    ASSERT_EQ(top->GetNumBlocks(), kCells);
+    EXPECT_STREQ(top->GetBlockItr()[kCells - 1]->GetName(), "cell_399999");
+    EXPECT_STREQ(top->GetBlockItr()[kCells - 1]->GetTypeName(), "LUT4");
+
+    auto offset_of_error = [&](const std::string& text) -> std::pair<size_t, size_t> {
+        const std::string path = dir.Write("bad.json", text);
+        capture.Clear();
+        EXPECT_FALSE(Ndm_LoadDesign(path.c_str(), nullptr));
+        std::vector<std::string> errors = capture.Texts(Port_Severity::Error);
+        EXPECT_EQ(errors.size(), 1u);
+        if (errors.empty()) return {0, 0};
+        const size_t at = errors[0].rfind("at byte ");
+        EXPECT_NE(at, std::string::npos) << errors[0];
+        return {std::stoul(errors[0].substr(at + 8)), text.find("\"abc\"")};
+    };
+    const auto [small, small_abc] = offset_of_error(netlist("", "\"abc\""));
+    const auto [large, large_abc] = offset_of_error(netlist(cells, "\"abc\""));
+    EXPECT_EQ(large - large_abc, small - small_abc);
+}
+
 // Names no object can carry (empty, cut short by a NUL, or taken twice in a module) each get an
 // error naming the file, the module and the name; the whole file is read so that every one is
 // listed, and the netlist is refused.
