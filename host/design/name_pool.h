@@ -30,6 +30,16 @@ private:
     const char* Store(std::string_view text);
     void Grow();
 
+    // Short texts (cell types, port and property names) come back millions of times: the last
+    // one stored at each of a few hundred places, keyed by its bytes, is found without hashing.
+    struct Short {
+        uint64_t head = 0, tail = 0;  // the bytes, zero-padded
+        size_t size = 0;
+        const char* stored = nullptr;
+    };
+    static constexpr size_t kShortBytes = 16;
+    Short short_[256];
+    const char* Lookup(std::string_view text);  // Intern, without the short texts
     std::vector<Slot> slots_;
     size_t used_ = 0;
     std::vector<std::unique_ptr<char[]>> chunks_;
@@ -57,6 +67,16 @@ private:
     };
     static size_t HashPtr(const void* key);
     void Grow();
+    // Short texts (cell types, port and property names) come back millions of times: the last
+    // one stored at each of a few hundred places, keyed by its bytes, is found without hashing.
+    struct Short {
+        uint64_t head = 0, tail = 0;  // the bytes, zero-padded
+        size_t size = 0;
+        const char* stored = nullptr;
+    };
+    static constexpr size_t kShortBytes = 16;
+    Short short_[256];
+    const char* Lookup(std::string_view text);  // Intern, without the short texts
     std::vector<Slot> slots_;
     size_t used_ = 0;
 };
