@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <bit>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -197,6 +198,31 @@ bool Text(simdjson::ondemand::raw_json_string raw, std::string& scratch, std::st
     const char* p = begin;
     // Stage 1 has validated string boundaries: an unescaped quote ends the string. With byte
     // escapes, a literal U+F780..U+F7FF (EF 9E xx, EF 9F xx) needs decoding too.
+    //
+    // Most texts have neither: eight bytes at a time, up to the first quote, backslash or (with
+    // bytes) 0xEF. Reading past the closing quote stays inside the input and its padding.
+    constexpr uint64_t kOnes = 0x0101010101010101ull, kHighs = 0x8080808080808080ull;
+    auto marks = [](uint64_t word, unsigned char c) {
+        const uint64_t x = word ^ (kOnes * c);
+        return (x - kOnes) & ~x & kHighs;  // the lowest mark is exact
+    };
+    for (;;) {
+        uint64_t word;
+        std::memcpy(&word, p, 8);
+        if constexpr (std::endian::native == std::endian::big) word = __builtin_bswap64(word);
+        const uint64_t found = marks(word, '"') | marks(word, '\\') | (bytes ? marks(word, 0xEF) : 0);
+        if (!found) {
+            p += 8;
+            continue;
+        }
+        p += __builtin_ctzll(found) / 8;
+        if (*p == '"') {
+            out = std::string_view(begin, static_cast<size_t>(p - begin));
+            return true;
+        }
+        if (*p == '\\' || Port_IsByteEscape(p)) break;
+        ++p;  // 0xEF starting some other character
+    }
     const char* escape = nullptr;
     for (;; ++p) {
         char c = *p;
