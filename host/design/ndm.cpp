@@ -4,6 +4,7 @@
 #include <cstring>
 
 #include "host/design/name_pool.h"
+#include "host/design/property_store.h"
 
 namespace {
 
@@ -546,7 +547,10 @@ Ndm_Network* Ndm_View::CreateNetwork() {
 }
 
 Ndm_Design::Ndm_Design(const char* name)
-    : Ndm_PropertyHolder(Ndm_ObjKind::Design), names_(std::make_unique<Ndm_NamePool>()) {
+    : Ndm_PropertyHolder(Ndm_ObjKind::Design),
+      property_cells_(std::make_unique<Ndm_PropertyCells>()),
+      names_(std::make_unique<Ndm_NamePool>()),
+      text_lists_(std::make_unique<Ndm_TextLists>()) {
     name_ = names_->Intern(name ? name : "");
 }
 

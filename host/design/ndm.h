@@ -299,13 +299,13 @@ private:
     friend class Ndm_Network;
     friend class Ndm_MemberIndex;
     friend class Ndm_Property;
-    Ndm_TextLists& TextLists() { return text_lists_; }
-    Ndm_PropertyCells& PropertyCells() { return property_cells_; }
+    Ndm_TextLists& TextLists() { return *text_lists_; }
+    Ndm_PropertyCells& PropertyCells() { return *property_cells_; }
 
     // Declared first, so that it outlives every object whose properties it holds.
-    Ndm_PropertyCells property_cells_;
+    std::unique_ptr<Ndm_PropertyCells> property_cells_;
     std::unique_ptr<Ndm_NamePool> names_;
-    Ndm_TextLists text_lists_;
+    std::unique_ptr<Ndm_TextLists> text_lists_;
     const char* name_;
     std::string source_stamp_;
     std::deque<Ndm_View> view_pool_;

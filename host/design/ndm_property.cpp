@@ -6,6 +6,7 @@
 #include <new>
 
 #include "host/design/ndm.h"
+#include "host/design/property_store.h"
 
 const char* Ndm_PropTypeName(int type) {
     switch (type) {
