@@ -459,6 +459,7 @@ bool Reader::Build(const char* top_module) {
     doc_ = od::document();
     parser_ = od::parser();
     buf_.Release();
+    for (Ndm_PtrMap& seen : seen_) seen = Ndm_PtrMap();
 
     const Module& m = modules_[top];
     design_.SetName(m.name);
@@ -467,6 +468,11 @@ bool Reader::Build(const char* top_module) {
     block->SetTypeName(m.name);
     PadBoundary(modules_[top]);
     if (!Expand(block, top)) return false;
+    // Every block and pin is made: the networks need the modules' nets and bits, not their cells.
+    for (Module& each : modules_) {
+        std::vector<Cell>().swap(each.cells);
+        std::vector<Conn>().swap(each.conns);
+    }
     TopPins(block, top);
     Networks(view);
     return true;
