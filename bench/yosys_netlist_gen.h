@@ -14,8 +14,9 @@
 // share of the cells, all fed by the top's inputs, the first driving its outputs.
 class NetlistFile {
 public:
-    NetlistFile(int64_t cells, int modules, std::string path)
-        : path_(std::move(path)), modules_(modules), pairs_(cells / 2 / (modules ? modules : 1)) {
+    // compact: without the layout's line breaks and indentation, about half the size.
+    NetlistFile(int64_t cells, int modules, std::string path, bool compact = false)
+        : path_(std::move(path)), modules_(modules), pairs_(cells / 2 / (modules ? modules : 1)), compact_(compact) {
         FILE* f = std::fopen(path_.c_str(), "wb");
         if (!f) return;
         out_ = f;
@@ -52,7 +53,12 @@ private:
     }
 
     void Put(const char* text) {
-        buf_ += text;
+        if (compact_) {
+            for (; *text; ++text)
+                if (*text != ' ' && *text != '\n') buf_ += *text;
+        } else {
+            buf_ += text;
+        }
         if (buf_.size() > (1 << 20) - 4096) Flush();
     }
     void Put(int64_t n) { buf_ += std::to_string(n); }
@@ -71,7 +77,7 @@ private:
     }
 
     void Write() {
-        Put("{\n  \"creator\": \"Yosys-style generator\",\n  \"modules\": {\n");
+        Put("{\n  \"creator\": \"Yosys-style-generator\",\n  \"modules\": {\n");
         if (!modules_) {
             Module("top", true);
         } else {
@@ -215,6 +221,7 @@ private:
     std::string path_;
     int modules_;
     int64_t pairs_;
+    bool compact_;
     FILE* out_ = nullptr;
     std::string buf_;
     uint64_t rng_ = 0x9E3779B97F4A7C15ull;
