@@ -67,16 +67,6 @@ private:
     };
     static size_t HashPtr(const void* key);
     void Grow();
-    // Short texts (cell types, port and property names) come back millions of times: the last
-    // one stored at each of a few hundred places, keyed by its bytes, is found without hashing.
-    struct Short {
-        uint64_t head = 0, tail = 0;  // the bytes, zero-padded
-        size_t size = 0;
-        const char* stored = nullptr;
-    };
-    static constexpr size_t kShortBytes = 16;
-    Short short_[256];
-    const char* Lookup(std::string_view text);  // Intern, without the short texts
     std::vector<Slot> slots_;
     size_t used_ = 0;
 };
