@@ -31,7 +31,7 @@ public:
     bool Write() {
         if (!file_.error().empty()) return Fail(file_.error());
         Number();
-        buf_ += "{\"format\":\"lun-design\",\"version\":1,\"name\":";
+        buf_ += "{\"format\":\"lun-design\",\"version\":2,\"name\":";
         Str(design_.GetName());
         Properties(design_);
         buf_ += ",\"views\":[";
@@ -152,9 +152,14 @@ private:
             buf_ += ",\"signals\":[";
             bool first = true;
             for (const Ndm_Signal* s : block.GetSignalItr()) {
-                buf_ += first ? "\n" : ",\n";
+                if (!first) buf_ += ',';
                 first = false;
-                buf_ += "{\"name\":";
+                if (!s->GetNumProperties()) {  // the short form: the name alone
+                    Str(s->GetName());
+                    Check();
+                    continue;
+                }
+                buf_ += "\n{\"name\":";
                 Str(s->GetName());
                 Properties(*s);
                 buf_ += '}';
@@ -166,17 +171,32 @@ private:
             buf_ += ",\"pins\":[";
             bool first = true;
             for (const Ndm_Pin* p : block.GetPinItr()) {
-                buf_ += first ? "\n" : ",\n";
+                if (!first) buf_ += ',';
                 first = false;
-                buf_ += "{\"name\":";
+                // A pin may still point at a signal of a deleted block; that link is dropped.
+                const uint64_t n = p->GetSignal() ? Ordinal(p->GetSignal()) : 0;
+                if (!p->GetNumProperties()) {  // the short form: [name, direction, signal]
+                    buf_ += '[';
+                    Str(p->GetName());
+                    buf_ += ",\"";
+                    buf_ += p->GetDirection() == Ndm_Dir::None ? "" : Ndm_DirName(p->GetDirection());
+                    buf_ += '"';
+                    if (n) {
+                        buf_ += ',';
+                        Uint(n - 1);
+                    }
+                    buf_ += ']';
+                    Check();
+                    continue;
+                }
+                buf_ += "\n{\"name\":";
                 Str(p->GetName());
                 if (p->GetDirection() != Ndm_Dir::None) {
                     buf_ += ",\"dir\":\"";
                     buf_ += Ndm_DirName(p->GetDirection());
                     buf_ += '"';
                 }
-                // A pin may still point at a signal of a deleted block; that link is dropped.
-                if (uint64_t n = p->GetSignal() ? Ordinal(p->GetSignal()) : 0; n) {
+                if (n) {
                     buf_ += ",\"signal\":";
                     Uint(n - 1);
                 }

@@ -20,7 +20,7 @@ using simdjson::error_code;
 using Ndm_JsonInput::Msg;
 
 constexpr const char kMarker[] = "lun-design";
-constexpr int kVersion = 1;
+constexpr int kVersion = 2;  // reads 1 as well: version 2 adds the short signal and pin forms
 
 class Reader {
 public:
@@ -54,8 +54,8 @@ public:
                 int64_t version;
                 if (error_code e = field.value().get_int64().get(version))
                     return JsonError(e, "\"version\" must be an integer");
-                if (version != kVersion)
-                    return Error(Port_Format("Design file '%s' has version %lld; this program reads version %d.",
+                if (version != kVersion && version != 1)
+                    return Error(Port_Format("Design file '%s' has version %lld; this program reads versions 1 to %d.",
                                              path_, static_cast<long long>(version), kVersion));
             } else if (key == "name") {
                 std::string_view text;
@@ -256,9 +256,19 @@ private:
         if (error_code e = value.get_array().get(array)) return JsonError(e, "\"signals\" must be an array");
         Reserve(array, block, 1);
         for (auto item : array) {
+            od::value value;
+            od::json_type type;
+            if (error_code e = std::move(item).get(value)) return JsonError(e, "bad signal");
+            if (error_code e = value.type().get(type)) return JsonError(e, "bad signal");
+            if (type == od::json_type::string) {  // a signal without properties: its name
+                const char* name;
+                if (!Name(value, name, "signal name")) return false;
+                signals_.push_back(block.CreateSignal(Ndm_Interned{name}));
+                continue;
+            }
             od::object object;
-            if (error_code e = std::move(item).get_object().get(object))
-                return JsonError(e, "a signal must be an object");
+            if (error_code e = value.get_object().get(object))
+                return JsonError(e, "a signal must be a name or an object");
             Ndm_Signal* signal = nullptr;
             for (auto fitem : object) {
                 od::field field;
@@ -285,8 +295,17 @@ private:
         if (error_code e = value.get_array().get(array)) return JsonError(e, "\"pins\" must be an array");
         Reserve(array, block, 2);
         for (auto item : array) {
+            od::value value;
+            od::json_type type;
+            if (error_code e = std::move(item).get(value)) return JsonError(e, "bad pin");
+            if (error_code e = value.type().get(type)) return JsonError(e, "bad pin");
+            if (type == od::json_type::array) {
+                if (!ShortPin(value, block)) return false;
+                continue;
+            }
             od::object object;
-            if (error_code e = std::move(item).get_object().get(object)) return JsonError(e, "a pin must be an object");
+            if (error_code e = value.get_object().get(object))
+                return JsonError(e, "a pin must be an array or an object");
             Ndm_Pin* pin = nullptr;
             const char* name = nullptr;
             Ndm_Dir dir = Ndm_Dir::None;
@@ -325,6 +344,48 @@ private:
             }
             if (!name) return Shape("a pin has no \"name\"");
             make();
+        }
+        return true;
+    }
+
+    // A pin without properties: [name, direction ("" for none), signal number (left out for
+    // none)].
+    bool ShortPin(od::value value, Ndm_Block& block) {
+        static const char* const kForm = "a pin array holds a name, a direction and a signal number";
+        od::array parts;
+        if (error_code e = value.get_array().get(parts)) return JsonError(e, kForm);
+        const char* name = nullptr;
+        Ndm_Dir dir = Ndm_Dir::None;
+        uint64_t signal = 0;
+        size_t count = 0;
+        for (auto item : parts) {
+            od::value part;
+            if (error_code e = std::move(item).get(part)) return JsonError(e, kForm);
+            switch (count++) {
+                case 0:
+                    if (!Name(part, name, "pin name")) return false;
+                    break;
+                case 1: {
+                    std::string_view text;
+                    if (!String(part, text, "pin direction")) return false;
+                    if (!text.empty() && !Ndm_DirFromName(text, dir))
+                        return Shape("a pin direction must be \"input\", \"output\", \"inout\" or \"\"");
+                    break;
+                }
+                case 2:
+                    if (error_code e = part.get_uint64().get(signal))
+                        return JsonError(e, "a pin's signal must be a signal number");
+                    break;
+                default: return Shape(kForm);
+            }
+        }
+        if (count < 2) return Shape(kForm);
+        Ndm_Pin* pin = block.CreatePin(Ndm_Interned{name}, dir);
+        if (count == 3) {
+            if (signal < signals_.size())
+                pin->SetSignal(signals_[signal]);
+            else
+                pending_.emplace_back(pin, signal);
         }
         return true;
     }
