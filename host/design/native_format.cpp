@@ -179,7 +179,7 @@ private:
                     buf_ += '[';
                     Str(p->GetName());
                     buf_ += ",\"";
-                    buf_ += p->GetDirection() == Ndm_Dir::None ? "" : Ndm_DirName(p->GetDirection());
+                    buf_ += Ndm_DirName(p->GetDirection());  // "" for none
                     buf_ += '"';
                     if (n) {
                         buf_ += ',';

@@ -333,10 +333,7 @@ private:
                     if (error_code e = field.value().get_uint64().get(n))
                         return JsonError(e, "pin \"signal\" must be a signal number");
                     make();
-                    if (n < signals_.size())
-                        pin->SetSignal(signals_[n]);
-                    else
-                        pending_.emplace_back(pin, n);
+                    Connect(pin, n);
                 } else if (key == "properties") {
                     make();
                     if (!Properties(field.value(), *pin)) return false;
@@ -381,13 +378,16 @@ private:
         }
         if (count < 2) return Shape(kForm);
         Ndm_Pin* pin = block.CreatePin(Ndm_Interned{name}, dir);
-        if (count == 3) {
-            if (signal < signals_.size())
-                pin->SetSignal(signals_[signal]);
-            else
-                pending_.emplace_back(pin, signal);
-        }
+        if (count == 3) Connect(pin, signal);
         return true;
+    }
+
+    // Connects a pin to signal number n, now or, for a signal further down the file, at the end.
+    void Connect(Ndm_Pin* pin, uint64_t n) {
+        if (n < signals_.size())
+            pin->SetSignal(signals_[n]);
+        else
+            pending_.emplace_back(pin, n);
     }
 
     bool Network(od::value value, Ndm_View& view) {

@@ -43,7 +43,8 @@ Ndm_PropertyCells& Ndm_Property::CellsOf(const Ndm_PropertyHolder* owner) {
 }
 
 Ndm_Property* Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char* name) {
-    return new (CellsOf(owner).Get()) Ndm_Property(owner, type, name);
+    Ndm_Design* design = owner->OwnDesign();
+    return new (design->PropertyCells().Get()) Ndm_Property(owner, design->Intern(name ? name : ""), type);
 }
 
 void Ndm_Property::Destroy(Ndm_Property* p) {
@@ -52,13 +53,11 @@ void Ndm_Property::Destroy(Ndm_Property* p) {
     cells.Put(p);
 }
 
-Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name)
-    : owner_(owner),
-      name_(owner->OwnDesign()->Intern(name ? name : "")),
-      float_(0.0),
-      type_(static_cast<uint8_t>(type)) {
+Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, const char* interned_name, int type)
+    : owner_(owner), name_(interned_name), float_(0.0), type_(static_cast<uint8_t>(type)) {
     if (type == NDM_PROP_STRING) text_ = "";
-    if (type == NDM_PROP_LIST || type == NDM_PROP_STRING_LIST) list_ = nullptr;
+    if (type == NDM_PROP_STRING_LIST) strings_ = nullptr;
+    if (type == NDM_PROP_LIST) list_ = nullptr;
 }
 
 // Lists may nest as deeply as a file makes them: entries are freed from a work list, each

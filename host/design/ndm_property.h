@@ -91,7 +91,7 @@ public:
 
 private:
     friend class Ndm_PropertyHolder;
-    Ndm_Property(Ndm_PropertyHolder* owner, int type, const char* name);
+    Ndm_Property(Ndm_PropertyHolder* owner, const char* interned_name, int type);
     // Properties and list data live in the design's cells.
     static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
     static Ndm_Property* Make(Ndm_PropertyHolder* owner, int type, const char* name);
