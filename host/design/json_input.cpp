@@ -295,11 +295,14 @@ size_t Offset(simdjson::ondemand::document& doc, const Input& input) {
 }
 
 size_t EarlyErrorOffset(simdjson::error_code error, const Input& input) {
-    if (error == simdjson::UTF8_ERROR)
-        return FirstBadUtf8(reinterpret_cast<const unsigned char*>(input.data()), input.size());
-    if (error == simdjson::UNCLOSED_STRING) return UnclosedQuote(input.data(), input.size());
+    return EarlyErrorOffset(error, input.data(), input.size());
+}
+
+size_t EarlyErrorOffset(simdjson::error_code error, const char* data, size_t size) {
+    if (error == simdjson::UTF8_ERROR) return FirstBadUtf8(reinterpret_cast<const unsigned char*>(data), size);
+    if (error == simdjson::UNCLOSED_STRING) return UnclosedQuote(data, size);
     if (error == simdjson::EMPTY) return 0;
-    return input.size();
+    return size;
 }
 
 const char* SyntaxReason(simdjson::error_code error) {
@@ -329,18 +332,23 @@ bool IsSyntaxError(simdjson::error_code error) {
 
 simdjson::error_code Iterate(simdjson::ondemand::parser& parser, const Input& input,
                              simdjson::ondemand::document& doc) {
+    return Iterate(parser, input.data(), input.size(), input.size() + simdjson::SIMDJSON_PADDING, doc);
+}
+
+simdjson::error_code Iterate(simdjson::ondemand::parser& parser, const char* data, size_t size, size_t capacity,
+                             simdjson::ondemand::document& doc) {
 #if SIMDJSON_DEVELOPMENT_CHECKS
     size_t depth = 0, deepest = 0;
-    ForEachOutsideStrings(input.data(), input.size(), [&](size_t, char c) {
+    ForEachOutsideStrings(data, size, [&](size_t, char c) {
         if (c == '{' || c == '[')
             deepest = std::max(deepest, ++depth);
         else if ((c == '}' || c == ']') && depth)
             --depth;
     });
     if (deepest >= simdjson::DEFAULT_MAX_DEPTH)
-        if (simdjson::error_code e = parser.allocate(input.size(), deepest + 1)) return e;
+        if (simdjson::error_code e = parser.allocate(size, deepest + 1)) return e;
 #endif
-    return parser.iterate(input.view()).get(doc);
+    return parser.iterate(simdjson::padded_string_view(data, size, capacity)).get(doc);
 }
 
 }  // namespace Ndm_JsonInput

@@ -52,6 +52,9 @@ private:
 // design files read in every build. Other builds follow no depth and skip that pass.
 simdjson::error_code Iterate(simdjson::ondemand::parser& parser, const Input& input,
                              simdjson::ondemand::document& doc);
+// The same for size bytes at data, with capacity bytes readable there (size plus padding).
+simdjson::error_code Iterate(simdjson::ondemand::parser& parser, const char* data, size_t size, size_t capacity,
+                             simdjson::ondemand::document& doc);
 
 // Text of a JSON string from its raw form. Texts without escapes are views into the input;
 // others are decoded into scratch. With bytes set, code points U+F780..U+F7FF, escaped or
@@ -66,6 +69,7 @@ size_t Offset(simdjson::ondemand::document& doc, const Input& input);
 // Best byte offset for an error found before iteration starts (bad UTF-8, an unclosed
 // string); the input size when none can be told.
 size_t EarlyErrorOffset(simdjson::error_code error, const Input& input);
+size_t EarlyErrorOffset(simdjson::error_code error, const char* data, size_t size);
 
 // Short reason for a JSON syntax error, e.g. "unclosed string".
 const char* SyntaxReason(simdjson::error_code error);

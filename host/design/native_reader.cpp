@@ -8,6 +8,7 @@
 #include <utility>
 #include <vector>
 
+#include "host/design/json_chunks.h"
 #include "host/design/json_input.h"
 #include "host/design/native_format.h"
 #include "host/port/msgman.h"
@@ -30,53 +31,40 @@ public:
         std::string why;
         if (!buf_.Open(path_, why))
             return Error(Port_Format("Cannot read design file '%s': %s.", path_, why.c_str()));
+        // A large file is read in pieces, so that the parser's index of the whole file is never
+        // held beside the design being built.
+        const Ndm_JsonChunks::Sizes& sizes = Ndm_JsonChunks::GetSizes();
+        Ndm_JsonChunks::Outline outline;
+        if (buf_.size() >= sizes.chunked_from && Ndm_JsonChunks::MakeOutline(buf_.data(), buf_.size(), sizes.piece, outline) &&
+            outline.root != UINT32_MAX && outline.containers[outline.root].object) {
+            Ndm_JsonChunks::Reader pieces(buf_);
+            pieces_ = &pieces;
+            Pieces visitor(*this);
+            const bool ok = pieces.Read(outline, visitor);
+            pieces_ = nullptr;
+            if (!ok) return pieces.error() ? SyntaxError(pieces.error(), pieces.error_offset()) : false;
+            return Finish();
+        }
         if (error_code e = Ndm_JsonInput::Iterate(parser_, buf_, doc_))
             return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
         od::object root;
         od::json_type type;
         if (error_code e = doc_.type().get(type)) return SyntaxError(e, Where());
         if (error_code e = doc_.get_object().get(root)) return JsonError(e, "the file must hold a JSON object");
-        bool marked = false;
         for (auto item : root) {
             od::field field;
             if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member");
-            od::raw_json_string key = field.key();
-            if (key == "format") {
-                std::string_view text;
-                if (!String(field.value(), text, "\"format\"")) return false;
-                if (text != kMarker) return Shape("\"format\" must be \"lun-design\"");
-                marked = true;
-            } else if (!marked) {
-                return Error(Port_Format("'%s' is not a design file: it does not start with the "
-                                         "\"format\": \"lun-design\" marker.",
-                                         path_));
-            } else if (key == "version") {
-                int64_t version;
-                if (error_code e = field.value().get_int64().get(version))
-                    return JsonError(e, "\"version\" must be an integer");
-                if (version != kVersion && version != 1)
-                    return Error(Port_Format("Design file '%s' has version %lld; this program reads versions 1 to %d.",
-                                             path_, static_cast<long long>(version), kVersion));
-            } else if (key == "name") {
-                std::string_view text;
-                if (!String(field.value(), text, "\"name\"")) return false;
-                design_.SetName(text);
-            } else if (key == "properties") {
-                if (!Properties(field.value(), design_)) return false;
-            } else if (key == "views") {
-                od::array views;
-                if (error_code e = field.value().get_array().get(views))
-                    return JsonError(e, "\"views\" must be an array");
-                for (auto vitem : views) {
-                    od::value view;
-                    if (error_code e = std::move(vitem).get(view)) return JsonError(e, "bad view");
-                    if (!View(view)) return false;
-                }
-            }
+            if (!RootMember(field.key(), field.value())) return false;
         }
         if (doc_.current_location().error() != simdjson::OUT_OF_BOUNDS)
             return SyntaxError(simdjson::TRAILING_CONTENT, Where());
-        if (!marked)
+        return Finish();
+    }
+
+private:
+    // The checks made once the whole file is read.
+    bool Finish() {
+        if (!marked_)
             return Error(Port_Format("'%s' is not a design file: it has no \"format\": \"lun-design\" marker.",
                                      path_));
         // Pins that named signals further down the file.
@@ -90,12 +78,50 @@ public:
         return true;
     }
 
-private:
+    // False, after an error, when a member other than the marker comes first.
+    bool Marked(od::raw_json_string key) {
+        if (marked_ || key == "format") return true;
+        return Error(Port_Format("'%s' is not a design file: it does not start with the "
+                                 "\"format\": \"lun-design\" marker.",
+                                 path_));
+    }
+
+    bool RootMember(od::raw_json_string key, od::value value) {
+        if (!Marked(key)) return false;
+        if (key == "format") {
+            std::string_view text;
+            if (!String(value, text, "\"format\"")) return false;
+            if (text != kMarker) return Shape("\"format\" must be \"lun-design\"");
+            marked_ = true;
+        } else if (key == "version") {
+            int64_t version;
+            if (error_code e = value.get_int64().get(version)) return JsonError(e, "\"version\" must be an integer");
+            if (version != kVersion && version != 1)
+                return Error(Port_Format("Design file '%s' has version %lld; this program reads versions 1 to %d.",
+                                         path_, static_cast<long long>(version), kVersion));
+        } else if (key == "name") {
+            std::string_view text;
+            if (!String(value, text, "\"name\"")) return false;
+            design_.SetName(text);
+        } else if (key == "properties") {
+            if (!Properties(value, design_)) return false;
+        } else if (key == "views") {
+            od::array views;
+            if (error_code e = value.get_array().get(views)) return JsonError(e, "\"views\" must be an array");
+            for (auto vitem : views) {
+                od::value view;
+                if (error_code e = std::move(vitem).get(view)) return JsonError(e, "bad view");
+                if (!View(view)) return false;
+            }
+        }
+        return true;
+    }
+
     bool Error(const std::string& text) {
         Msg().issueError("%s", text.c_str());
         return false;
     }
-    size_t Where() { return Ndm_JsonInput::Offset(doc_, buf_); }
+    size_t Where() { return pieces_ ? pieces_->Offset() : Ndm_JsonInput::Offset(doc_, buf_); }
     bool SyntaxError(error_code e, size_t offset) {
         return Error(Port_Format("'%s' is not valid JSON: %s at byte %zu.", path_, Ndm_JsonInput::SyntaxReason(e),
                                  offset));
@@ -133,41 +159,50 @@ private:
         for (auto item : object) {
             od::field field;
             if (error_code e = std::move(item).get(field)) return JsonError(e, "bad view member");
-            od::raw_json_string key = field.key();
-            if (key == "name") {
-                const char* name;
-                if (!Name(field.value(), name, "view \"name\"")) return false;
-                if (design_.GetViewByName(name)) return Shape(Port_Format("view '%s' appears twice", name));
-                view = design_.CreateView(name);
-                continue;
-            }
-            if (!view) return Shape("a view must start with its \"name\"");
-            if (key == "properties") {
-                if (!Properties(field.value(), *view)) return false;
-            } else if (key == "top") {
-                if (view->GetBlock()) return Shape("a view has two top blocks");
-                if (!Tree(field.value(), view)) return false;
-            } else if (key == "networks") {
-                od::array nets;
-                if (error_code e = field.value().get_array().get(nets))
-                    return JsonError(e, "\"networks\" must be an array");
-                size_t count = 0;
-                for (auto nitem : nets) {
-                    od::value net;
-                    if (error_code e = std::move(nitem).get(net)) return JsonError(e, "bad network");
-                    if (!Network(net, *view)) return false;
-                    if ((++count & 1023) == 0) buf_.DropBefore(Where());
-                }
-            }
+            if (!ViewMember(view, field.key(), field.value())) return false;
         }
         if (!view) return Shape("a view has no \"name\"");
         return true;
     }
 
-    // The tree of a view's top block. Blocks nest as deeply as the design does, so the reader
-    // keeps its own stack: a frame per open block, holding where its members and, while they
-    // are read, its children stand. A child is read to its end before its parent moves on.
-    bool Tree(od::value value, Ndm_View* view) {
+    // A member of a view; view is null until the view's name is read.
+    bool ViewMember(Ndm_View*& view, od::raw_json_string key, od::value value) {
+        if (key == "name") {
+            const char* name;
+            if (!Name(value, name, "view \"name\"")) return false;
+            if (design_.GetViewByName(name)) return Shape(Port_Format("view '%s' appears twice", name));
+            view = design_.CreateView(name);
+            return true;
+        }
+        if (!view) return Shape("a view must start with its \"name\"");
+        if (key == "properties") return Properties(value, *view);
+        if (key == "top") {
+            if (view->GetBlock()) return Shape("a view has two top blocks");
+            return Tree(value, view, nullptr);
+        }
+        if (key == "networks") {
+            od::array nets;
+            if (error_code e = value.get_array().get(nets)) return JsonError(e, "\"networks\" must be an array");
+            for (auto nitem : nets) {
+                od::value net;
+                if (error_code e = std::move(nitem).get(net)) return JsonError(e, "bad network");
+                if (!NetworkOf(net, *view)) return false;
+            }
+        }
+        return true;
+    }
+
+    bool NetworkOf(od::value value, Ndm_View& view) {
+        if (!Network(value, view)) return false;
+        if ((++networks_ & 1023) == 0) buf_.DropBefore(Where());
+        return true;
+    }
+
+    // A block and its subtree, the top block of view or a child of parent. Blocks nest as
+    // deeply as the design does, so the reader keeps its own stack: a frame per open block,
+    // holding where its members and, while they are read, its children stand. A child is read to
+    // its end before its parent moves on.
+    bool Tree(od::value value, Ndm_View* view, Ndm_Block* parent) {
         struct Frame {
             Ndm_Block* block = nullptr;
             od::object_iterator member, members_end;
@@ -175,7 +210,6 @@ private:
             od::array_iterator child, children_end;
         };
         std::vector<Frame> stack;
-        size_t opened = 0;
         auto open = [&](od::value v) {
             od::object object;
             Frame frame;
@@ -183,7 +217,7 @@ private:
             if (error_code e = object.begin().get(frame.member)) return JsonError(e, "bad block member");
             if (error_code e = object.end().get(frame.members_end)) return JsonError(e, "bad block member");
             stack.push_back(frame);
-            if ((++opened & 1023) == 0) buf_.DropBefore(Where());
+            if ((++opened_ & 1023) == 0) buf_.DropBefore(Where());
             return true;
         };
         if (!open(value)) return false;
@@ -209,25 +243,7 @@ private:
             od::field field;
             if (error_code e = (*frame.member).get(field)) return JsonError(e, "bad block member");
             od::raw_json_string key = field.key();
-            if (key == "name") {
-                const char* name;
-                if (!Name(field.value(), name, "block \"name\"")) return false;
-                if (frame.block) return Shape("a block has two names");
-                Ndm_Block* parent = stack.size() > 1 ? stack[stack.size() - 2].block : nullptr;
-                frame.block = parent ? parent->CreateBlock(Ndm_Interned{name}) : view->CreateTopBlock(name);
-            } else if (!frame.block) {
-                return Shape("a block must start with its \"name\"");
-            } else if (key == "type") {
-                const char* type;
-                if (!Name(field.value(), type, "block \"type\"")) return false;
-                frame.block->SetTypeName(Ndm_Interned{type});
-            } else if (key == "properties") {
-                if (!Properties(field.value(), *frame.block)) return false;
-            } else if (key == "signals") {
-                if (!Signals(field.value(), *frame.block)) return false;
-            } else if (key == "pins") {
-                if (!Pins(field.value(), *frame.block)) return false;
-            } else if (key == "blocks") {
+            if (key == "blocks" && frame.block) {
                 od::array children;
                 if (error_code e = field.value().get_array().get(children))
                     return JsonError(e, "\"blocks\" must be an array");
@@ -236,10 +252,152 @@ private:
                 frame.in_children = true;
                 continue;  // the member moves on once the children are read
             }
+            Ndm_Block* above = stack.size() > 1 ? stack[stack.size() - 2].block : parent;
+            if (!BlockMember(frame.block, view, above, key, field.value())) return false;
             ++frame.member;
         }
         return true;
     }
+
+    // A member of a block other than its children; block is null until its name is read, and is
+    // then made, a child of parent or the top block of view.
+    bool BlockMember(Ndm_Block*& block, Ndm_View* view, Ndm_Block* parent, od::raw_json_string key,
+                     od::value value) {
+        if (key == "name") {
+            const char* name;
+            if (!Name(value, name, "block \"name\"")) return false;
+            if (block) return Shape("a block has two names");
+            block = parent ? parent->CreateBlock(Ndm_Interned{name}) : view->CreateTopBlock(name);
+            return true;
+        }
+        if (!block) return Shape("a block must start with its \"name\"");
+        if (key == "type") {
+            const char* type;
+            if (!Name(value, type, "block \"type\"")) return false;
+            block->SetTypeName(Ndm_Interned{type});
+        } else if (key == "properties") {
+            return Properties(value, *block);
+        } else if (key == "signals") {
+            return Signals(value, *block);
+        } else if (key == "pins") {
+            return Pins(value, *block);
+        }
+        return true;
+    }
+
+    // The children of a block, from its "blocks" array.
+    bool Children(od::value value, Ndm_View* view, Ndm_Block* block) {
+        od::array children;
+        if (error_code e = value.get_array().get(children)) return JsonError(e, "\"blocks\" must be an array");
+        for (auto item : children) {
+            od::value child;
+            if (error_code e = std::move(item).get(child)) return JsonError(e, "bad block");
+            if (!Tree(child, view, block)) return false;
+        }
+        return true;
+    }
+
+    // Reads a file in pieces: the large arrays and objects (the views, large blocks and their
+    // member lists) arrive member by member, and each member goes to the reader that the
+    // whole-file reading would give it to, so both readings check the same rules.
+    class Pieces : public Ndm_JsonChunks::Visitor {
+    public:
+        explicit Pieces(Reader& reader) : r_(reader) { stack_.push_back({Ctx::Root}); }
+
+        bool Member(od::raw_json_string key, od::value value) override {
+            Level& l = stack_.back();
+            switch (l.ctx) {
+                case Ctx::Root: return r_.RootMember(key, value);
+                case Ctx::Views: return r_.View(value);
+                case Ctx::View: return r_.ViewMember(l.view, key, value);
+                case Ctx::Networks: return r_.NetworkOf(value, *l.view);
+                case Ctx::Block:
+                    if (l.block && key == "blocks") return r_.Children(value, l.view, l.block);
+                    return r_.BlockMember(l.block, l.view, l.parent, key, value);
+                case Ctx::Blocks: return r_.Tree(value, l.view, l.block);
+                case Ctx::Signals: return r_.Signal(value, *l.block);
+                case Ctx::Pins: return r_.Pin(value, *l.block);
+                case Ctx::Skip: return true;
+            }
+            return true;
+        }
+
+        // A large member is read in parts where the whole-file reading would walk into it, and
+        // whole (where its reader reports what is wrong with it) anywhere else.
+        bool Enter(od::raw_json_string key, bool object, Take& take) override {
+            const Level l = stack_.back();
+            Level next{Ctx::Skip, l.view, l.block, l.parent};
+            take = Take::Whole;
+            switch (l.ctx) {
+                case Ctx::Root:
+                    if (!r_.Marked(key)) return false;
+                    if (key == "views" && !object) {
+                        next.ctx = Ctx::Views;
+                    } else if (key == "format" || key == "version" || key == "name" || key == "properties" ||
+                               key == "views") {
+                        return true;
+                    }
+                    break;
+                case Ctx::Views:
+                    if (!object) return true;
+                    next = {Ctx::View, nullptr, nullptr, nullptr};
+                    break;
+                case Ctx::View:
+                    if (!l.view || key == "name" || key == "properties") return true;
+                    if (key == "top" && object) {
+                        if (l.view->GetBlock()) return r_.Shape("a view has two top blocks");
+                        next = {Ctx::Block, l.view, nullptr, nullptr};
+                    } else if (key == "networks" && !object) {
+                        next.ctx = Ctx::Networks;
+                    } else if (key == "top" || key == "networks") {
+                        return true;
+                    }
+                    break;
+                case Ctx::Block:
+                    if (!l.block) return true;
+                    if (!object && (key == "signals" || key == "pins" || key == "blocks")) {
+                        next = {key == "signals" ? Ctx::Signals : key == "pins" ? Ctx::Pins : Ctx::Blocks, l.view,
+                                l.block, nullptr};
+                    } else if (key == "name" || key == "type" || key == "properties" || key == "signals" ||
+                               key == "pins" || key == "blocks") {
+                        return true;
+                    }
+                    break;
+                case Ctx::Blocks:
+                    if (!object) return true;
+                    next = {Ctx::Block, l.view, nullptr, l.block};
+                    break;
+                case Ctx::Networks:
+                case Ctx::Signals:
+                case Ctx::Pins: return true;
+                case Ctx::Skip: break;
+            }
+            take = Take::Parts;
+            stack_.push_back(next);
+            return true;
+        }
+
+        bool Leave() override {
+            const Level l = stack_.back();
+            stack_.pop_back();
+            if (l.ctx == Ctx::Block && !l.block) return r_.Shape("a block has no \"name\"");
+            if (l.ctx == Ctx::View && !l.view) return r_.Shape("a view has no \"name\"");
+            return true;
+        }
+
+    private:
+        enum class Ctx { Root, Views, View, Networks, Block, Blocks, Signals, Pins, Skip };
+        // A large container being read: what it is, and the view and block it belongs to (for
+        // a block: the block, null until its name is read, and its parent).
+        struct Level {
+            Ctx ctx;
+            Ndm_View* view = nullptr;
+            Ndm_Block* block = nullptr;
+            Ndm_Block* parent = nullptr;
+        };
+        Reader& r_;
+        std::vector<Level> stack_;
+    };
 
     // Makes room for the signals (kind 1) or pins (kind 2) an array lists, so that the member
     // lists do not keep the slack of their growth. Counting skips over the array once; child
@@ -257,36 +415,40 @@ private:
         Reserve(array, block, 1);
         for (auto item : array) {
             od::value value;
-            od::json_type type;
             if (error_code e = std::move(item).get(value)) return JsonError(e, "bad signal");
-            if (error_code e = value.type().get(type)) return JsonError(e, "bad signal");
-            if (type == od::json_type::string) {  // a signal without properties: its name
-                const char* name;
-                if (!Name(value, name, "signal name")) return false;
-                signals_.push_back(block.CreateSignal(Ndm_Interned{name}));
-                continue;
-            }
-            od::object object;
-            if (error_code e = value.get_object().get(object))
-                return JsonError(e, "a signal must be a name or an object");
-            Ndm_Signal* signal = nullptr;
-            for (auto fitem : object) {
-                od::field field;
-                if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad signal member");
-                od::raw_json_string key = field.key();
-                if (key == "name") {
-                    const char* name;
-                    if (!Name(field.value(), name, "signal \"name\"")) return false;
-                    if (signal) return Shape("a signal has two names");
-                    signal = block.CreateSignal(Ndm_Interned{name});
-                    signals_.push_back(signal);
-                } else if (key == "properties") {
-                    if (!signal) return Shape("a signal must start with its \"name\"");
-                    if (!Properties(field.value(), *signal)) return false;
-                }
-            }
-            if (!signal) return Shape("a signal has no \"name\"");
+            if (!Signal(value, block)) return false;
         }
+        return true;
+    }
+
+    bool Signal(od::value value, Ndm_Block& block) {
+        od::json_type type;
+        if (error_code e = value.type().get(type)) return JsonError(e, "bad signal");
+        if (type == od::json_type::string) {  // a signal without properties: its name
+            const char* name;
+            if (!Name(value, name, "signal name")) return false;
+            signals_.push_back(block.CreateSignal(Ndm_Interned{name}));
+            return true;
+        }
+        od::object object;
+        if (error_code e = value.get_object().get(object)) return JsonError(e, "a signal must be a name or an object");
+        Ndm_Signal* signal = nullptr;
+        for (auto fitem : object) {
+            od::field field;
+            if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad signal member");
+            od::raw_json_string key = field.key();
+            if (key == "name") {
+                const char* name;
+                if (!Name(field.value(), name, "signal \"name\"")) return false;
+                if (signal) return Shape("a signal has two names");
+                signal = block.CreateSignal(Ndm_Interned{name});
+                signals_.push_back(signal);
+            } else if (key == "properties") {
+                if (!signal) return Shape("a signal must start with its \"name\"");
+                if (!Properties(field.value(), *signal)) return false;
+            }
+        }
+        if (!signal) return Shape("a signal has no \"name\"");
         return true;
     }
 
@@ -296,52 +458,52 @@ private:
         Reserve(array, block, 2);
         for (auto item : array) {
             od::value value;
-            od::json_type type;
             if (error_code e = std::move(item).get(value)) return JsonError(e, "bad pin");
-            if (error_code e = value.type().get(type)) return JsonError(e, "bad pin");
-            if (type == od::json_type::array) {
-                if (!ShortPin(value, block)) return false;
+            if (!Pin(value, block)) return false;
+        }
+        return true;
+    }
+
+    bool Pin(od::value value, Ndm_Block& block) {
+        od::json_type type;
+        if (error_code e = value.type().get(type)) return JsonError(e, "bad pin");
+        if (type == od::json_type::array) return ShortPin(value, block);
+        od::object object;
+        if (error_code e = value.get_object().get(object)) return JsonError(e, "a pin must be an array or an object");
+        Ndm_Pin* pin = nullptr;
+        const char* name = nullptr;
+        Ndm_Dir dir = Ndm_Dir::None;
+        auto make = [&] {
+            if (!pin) pin = block.CreatePin(Ndm_Interned{name}, dir);
+        };
+        for (auto fitem : object) {
+            od::field field;
+            if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad pin member");
+            od::raw_json_string key = field.key();
+            if (key == "name") {
+                if (name) return Shape("a pin has two names");
+                if (!Name(field.value(), name, "pin \"name\"")) return false;
                 continue;
             }
-            od::object object;
-            if (error_code e = value.get_object().get(object))
-                return JsonError(e, "a pin must be an array or an object");
-            Ndm_Pin* pin = nullptr;
-            const char* name = nullptr;
-            Ndm_Dir dir = Ndm_Dir::None;
-            auto make = [&] {
-                if (!pin) pin = block.CreatePin(Ndm_Interned{name}, dir);
-            };
-            for (auto fitem : object) {
-                od::field field;
-                if (error_code e = std::move(fitem).get(field)) return JsonError(e, "bad pin member");
-                od::raw_json_string key = field.key();
-                if (key == "name") {
-                    if (name) return Shape("a pin has two names");
-                    if (!Name(field.value(), name, "pin \"name\"")) return false;
-                    continue;
-                }
-                if (!name) return Shape("a pin must start with its \"name\"");
-                if (key == "dir") {
-                    if (pin) return Shape("a pin's \"dir\" must come right after its name");
-                    std::string_view text;
-                    if (!String(field.value(), text, "pin \"dir\"")) return false;
-                    if (!Ndm_DirFromName(text, dir))
-                        return Shape("pin \"dir\" must be \"input\", \"output\" or \"inout\"");
-                } else if (key == "signal") {
-                    uint64_t n;
-                    if (error_code e = field.value().get_uint64().get(n))
-                        return JsonError(e, "pin \"signal\" must be a signal number");
-                    make();
-                    Connect(pin, n);
-                } else if (key == "properties") {
-                    make();
-                    if (!Properties(field.value(), *pin)) return false;
-                }
+            if (!name) return Shape("a pin must start with its \"name\"");
+            if (key == "dir") {
+                if (pin) return Shape("a pin's \"dir\" must come right after its name");
+                std::string_view text;
+                if (!String(field.value(), text, "pin \"dir\"")) return false;
+                if (!Ndm_DirFromName(text, dir)) return Shape("pin \"dir\" must be \"input\", \"output\" or \"inout\"");
+            } else if (key == "signal") {
+                uint64_t n;
+                if (error_code e = field.value().get_uint64().get(n))
+                    return JsonError(e, "pin \"signal\" must be a signal number");
+                make();
+                Connect(pin, n);
+            } else if (key == "properties") {
+                make();
+                if (!Properties(field.value(), *pin)) return false;
             }
-            if (!name) return Shape("a pin has no \"name\"");
-            make();
         }
+        if (!name) return Shape("a pin has no \"name\"");
+        make();
         return true;
     }
 
@@ -538,6 +700,9 @@ private:
     std::vector<ListFrame> lists_;
     std::string prop_name_, prop_type_;
     std::vector<std::pair<Ndm_Pin*, uint64_t>> pending_;
+    bool marked_ = false;                      // the file starts with the marker
+    size_t networks_ = 0, opened_ = 0;          // networks and blocks read, for giving pages back
+    Ndm_JsonChunks::Reader* pieces_ = nullptr;  // while a large file is read in pieces
 };
 
 }  // namespace

@@ -9,6 +9,7 @@
 
 #include "design_test_util.h"
 #include "host/design/design_io.h"
+#include "host/design/json_chunks.h"
 #include "host/design/native_format.h"
 #include "host/port/msgman.h"
 
@@ -17,6 +18,20 @@ namespace {
 using design_test::DumpText;
 using design_test::ReadAll;
 using design_test::TempDir;
+
+// Reads files in pieces of that many bytes while alive (0: whole, as small files are read).
+// Pieces of a byte make every array and object a large one, cut at every comma.
+class PieceSize {
+public:
+    explicit PieceSize(size_t piece) : saved_(Ndm_JsonChunks::GetSizes()) {
+        if (piece) Ndm_JsonChunks::GetSizes() = {0, piece};
+    }
+    ~PieceSize() { Ndm_JsonChunks::GetSizes() = saved_; }
+
+private:
+    Ndm_JsonChunks::Sizes saved_;
+};
+constexpr size_t kPieceSizes[] = {0, 1, 6, 40};
 
 // Every byte but NUL, then a real U+F7E9 (which stands for a byte in the file) and a euro sign.
 std::string AllBytes() {
@@ -80,10 +95,16 @@ TEST(NativeDesignFile, RoundTripIsLosslessAndByteStable) {
     auto design = Sample();
     std::string first = dir.File("a.lun"), second = dir.File("b.lun");
     ASSERT_TRUE(Ndm_WriteNative(*design, first.c_str()));
+    for (size_t piece : kPieceSizes) {
+        SCOPED_TRACE(piece);
+        PieceSize size(piece);
+        auto pieces = Ndm_ReadNative(first.c_str());
+        ASSERT_TRUE(pieces);
+        ASSERT_TRUE(Ndm_WriteNative(*pieces, second.c_str()));
+        EXPECT_EQ(ReadAll(first), ReadAll(second));
+    }
     auto again = Ndm_ReadNative(first.c_str());
     ASSERT_TRUE(again);
-    ASSERT_TRUE(Ndm_WriteNative(*again, second.c_str()));
-    EXPECT_EQ(ReadAll(first), ReadAll(second));
     EXPECT_TRUE(simdjson::validate_utf8(ReadAll(first)));
     EXPECT_EQ(DumpText(*design), DumpText(*again));
     Ndm_Block* latin = again->GetViewByName("EXPANDED")->GetBlock()->GetBlockByName("r\xe9g\xff");
@@ -133,6 +154,7 @@ TEST(NativeDesignFile, DamagedFilesGiveOneClearError) {
         const char* name;
         const char* text;
         const char* expect;
+        const char* or_expect = nullptr;  // what a reading in pieces may say instead
     };
     const Case cases[] = {
         {"version.lun", R"({"format":"lun-design","version":9})", "has version 9"},
@@ -171,16 +193,36 @@ TEST(NativeDesignFile, DamagedFilesGiveOneClearError) {
         {"nullist.lun",
          R"({"format":"lun-design","version":1,"properties":[{"name":"l","type":"list","value":[{"name":"s","type":"string","value":"a\u0000"}]}]})",
          "string property holds a NUL character"},
+        // Separators a reading in pieces checks itself.
+        {"comma.lun", R"({"format":"lun-design","version":1,"views":[{"name":"V","top":{"name":"t"}},]})",
+         "a view must be an object", "is not valid JSON"},
+        {"lead.lun", R"({"format":"lun-design","version":1,"views":[ ,{"name":"V"}]})", "a view must be an object",
+         "is not valid JSON"},
+        {"colon.lun", R"({"format":"lun-design","version":1,"views":[{"name":"V","top" {"name":"t"}}]})",
+         "is not valid JSON"},
+        {"after.lun", R"({"format":"lun-design","version":1,"views":[{"name":"V","top":{"name":"t"} "x":1}]})",
+         "is not valid JSON"},
+        {"topless.lun", R"({"format":"lun-design","version":1,"views":[{"top":{"name":"t"},"name":"V"}]})",
+         "a view must start with its \"name\""},
+        {"nameless.lun", R"({"format":"lun-design","version":1,"views":[{"name":"V","top":{"blocks":[{"name":"u"}]}}]})",
+         "a block must start with its \"name\""},
+        {"views.lun", R"({"format":"lun-design","version":1,"views":{"name":"V"}})", "\"views\" must be an array"},
+        {"unmarked.lun", R"({"version":1,"format":"lun-design"})", "does not start with the"},
     };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.name);
-        std::string path = dir.Write(c.name, c.text);
-        Port_MsgCapture capture;
-        EXPECT_FALSE(Ndm_ReadNative(path.c_str()));
-        std::vector<std::string> errors = capture.Texts(Port_Severity::Error);
-        ASSERT_EQ(errors.size(), 1u);
-        EXPECT_NE(errors[0].find(c.expect), std::string::npos) << errors[0];
-        EXPECT_NE(errors[0].find(path), std::string::npos) << errors[0];
+    for (size_t piece : kPieceSizes) {
+        PieceSize size(piece);
+        for (const Case& c : cases) {
+            SCOPED_TRACE(std::string(c.name) + " in pieces of " + std::to_string(piece));
+            std::string path = dir.Write(c.name, c.text);
+            Port_MsgCapture capture;
+            EXPECT_FALSE(Ndm_ReadNative(path.c_str()));
+            std::vector<std::string> errors = capture.Texts(Port_Severity::Error);
+            ASSERT_EQ(errors.size(), 1u);
+            EXPECT_TRUE(errors[0].find(c.expect) != std::string::npos ||
+                        (piece && c.or_expect && errors[0].find(c.or_expect) != std::string::npos))
+                << errors[0];
+            EXPECT_NE(errors[0].find(path), std::string::npos) << errors[0];
+        }
     }
     // Writing into a missing directory fails with the path named.
     Port_MsgCapture capture;
@@ -220,6 +262,15 @@ TEST(NativeDesignFile, ShortFormsReadBackExactly) {
 {"signals":[2]}]}]}
 )";
     const std::string path = dir.Write("short.lun", text);
+    for (size_t piece : kPieceSizes) {
+        SCOPED_TRACE(piece);
+        PieceSize size(piece);
+        auto pieces = Ndm_ReadNative(path.c_str());
+        ASSERT_TRUE(pieces);
+        const std::string back = dir.File("back.lun");
+        ASSERT_TRUE(Ndm_WriteNative(*pieces, back.c_str()));
+        EXPECT_EQ(ReadAll(back), text);
+    }
     auto design = Ndm_ReadNative(path.c_str());
     ASSERT_TRUE(design);
     const Ndm_Block* top = design->GetWorkView()->GetBlock();
