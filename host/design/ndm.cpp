@@ -22,14 +22,14 @@ std::string FoldName(const char* name) {
 }
 
 template <class T>
-T* ScanExact(const std::vector<T*>& members, const char* name) {
+T* ScanExact(const Ndm_MemberList<T>& members, const char* name) {
     for (T* m : members)
         if (std::strcmp(m->GetName(), name) == 0) return m;
     return nullptr;
 }
 
 template <class T>
-T* ScanFolded(const std::vector<T*>& members, const std::string& folded) {
+T* ScanFolded(const Ndm_MemberList<T>& members, const std::string& folded) {
     for (T* m : members) {
         const char* a = m->GetName();
         size_t i = 0;
@@ -127,19 +127,19 @@ public:
     // The case-folded map costs an interned folded copy of every name, so it is built only
     // for the first lookup that ignores case.
     template <class T>
-    void EnsureFolded(Ndm_Design* design, int category, const std::vector<T*>& members) {
+    void EnsureFolded(Ndm_Design* design, int category, const Ndm_MemberList<T>& members) {
         if (folded_built[category]) return;
         for (T* m : members) AddFolded(design, category, m->GetName(), m);
         folded_built[category] = true;
     }
     template <class T>
-    void Build(Ndm_Design* design, int category, const std::vector<T*>& members) {
+    void Build(Ndm_Design* design, int category, const Ndm_MemberList<T>& members) {
         Drop(category);
         for (T* m : members) Add(design, category, m->GetName(), m);
         built[category] = true;
     }
     template <class T>
-    std::vector<void*>& Sorted(int category, bool fold, const std::vector<T*>& members) {
+    std::vector<void*>& Sorted(int category, bool fold, const Ndm_MemberList<T>& members) {
         std::unique_ptr<std::vector<void*>>& list = sorted[category][fold ? 1 : 0];
         if (!list) {
             list = std::make_unique<std::vector<void*>>(members.begin(), members.end());
@@ -321,11 +321,8 @@ void Ndm_Block::Release() {
         }
         for (Ndm_Pin* pin : b->pins_) pin->DeleteAllProperties();
         b->blocks_.clear();
-        b->blocks_.shrink_to_fit();
         b->signals_.clear();
-        b->signals_.shrink_to_fit();
         b->pins_.clear();
-        b->pins_.shrink_to_fit();
         b->index_.reset();
         b->DeleteAllProperties();
         b->parent_ = nullptr;
@@ -353,7 +350,7 @@ bool Ndm_Block::DeleteBlock(Ndm_Block* child) {
 
 
 template <class T>
-T* Ndm_Block::Lookup(const std::vector<T*>& members, int category, const char* name,
+T* Ndm_Block::Lookup(const Ndm_MemberList<T>& members, int category, const char* name,
                      bool ignore_case) const {
     if (!name) return nullptr;
     if (!ignore_case && members.size() <= kSmall) return ScanExact(members, name);
@@ -421,7 +418,7 @@ void Ndm_Block::GetBlocksByName(std::string_view name, bool ignore_case,
 }
 
 template <class T>
-void Ndm_Block::ByPrefix(const std::vector<T*>& members, int category, std::string_view prefix,
+void Ndm_Block::ByPrefix(const Ndm_MemberList<T>& members, int category, std::string_view prefix,
                          bool ignore_case, std::vector<T*>& out) const {
     if (prefix.empty()) {
         out.insert(out.end(), members.begin(), members.end());

@@ -8,8 +8,12 @@
 // hash indexes built on first use for blocks with many members; they never scan a large block.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
+#include <cstdlib>
+#include <cstring>
 #include <deque>
+#include <new>
 #include <memory>
 #include <span>
 #include <string>
@@ -40,6 +44,63 @@ class Ndm_Token {
     friend class Ndm_View;
     friend class Ndm_Block;
     friend class Ndm_Network;
+};
+
+// The children, signals or pins of a block, in stored order: one pointer, null while the list is
+// empty, to the count, the room and the members in one allocation. Most blocks are cells without
+// children or signals, which pay 8 bytes for each of those lists rather than a vector's 24.
+template <class T>
+class Ndm_MemberList {
+public:
+    Ndm_MemberList() = default;
+    ~Ndm_MemberList() { std::free(head_); }
+    Ndm_MemberList(const Ndm_MemberList&) = delete;
+    Ndm_MemberList& operator=(const Ndm_MemberList&) = delete;
+
+    size_t size() const { return head_ ? head_->size : 0; }
+    bool empty() const { return size() == 0; }
+    T* const* begin() const { return head_ ? Items() : nullptr; }
+    T* const* end() const { return begin() + size(); }
+    T* back() const { return Items()[head_->size - 1]; }
+    operator std::span<T* const>() const { return {begin(), size()}; }  // NOLINT: a list is a span
+
+    void push_back(T* member) {
+        if (size() == Room()) Resize(std::max<size_t>(4, 2 * Room()));
+        Items()[head_->size++] = member;
+    }
+    // Room for n members in all.
+    void reserve(size_t n) {
+        if (n > Room()) Resize(n);
+    }
+    void erase(T* const* at) {
+        T** items = Items();
+        const size_t i = static_cast<size_t>(at - items);
+        std::memmove(items + i, items + i + 1, (head_->size - i - 1) * sizeof(T*));
+        --head_->size;
+    }
+    // Empties the list and gives its memory back.
+    void clear() {
+        std::free(head_);
+        head_ = nullptr;
+    }
+
+private:
+    struct Head {
+        uint32_t size, room;
+    };
+    static_assert(sizeof(Head) % alignof(T*) == 0);
+    T** Items() const { return reinterpret_cast<T**>(head_ + 1); }
+    size_t Room() const { return head_ ? head_->room : 0; }
+    void Resize(size_t room) {
+        void* grown = std::realloc(head_, sizeof(Head) + room * sizeof(T*));
+        if (!grown) throw std::bad_alloc();
+        const bool fresh = !head_;
+        head_ = static_cast<Head*>(grown);
+        if (fresh) head_->size = 0;
+        head_->room = static_cast<uint32_t>(room);
+    }
+
+    Head* head_ = nullptr;
 };
 
 // Pin and port directions.
@@ -171,10 +232,10 @@ private:
     friend class Ndm_Design;
     Ndm_MemberIndex& Index() const;
     template <class T>
-    T* Lookup(const std::vector<T*>& members, int category, const char* name,
+    T* Lookup(const Ndm_MemberList<T>& members, int category, const char* name,
               bool ignore_case) const;
     template <class T>
-    void ByPrefix(const std::vector<T*>& members, int category, std::string_view prefix,
+    void ByPrefix(const Ndm_MemberList<T>& members, int category, std::string_view prefix,
                   bool ignore_case, std::vector<T*>& out) const;
     void Release();  // drops members and properties of a deleted subtree
 
@@ -184,9 +245,9 @@ private:
     const char* type_ = "";
     Ndm_Block* parent_;
     Ndm_View* view_;
-    std::vector<Ndm_Block*> blocks_;
-    std::vector<Ndm_Signal*> signals_;
-    std::vector<Ndm_Pin*> pins_;
+    Ndm_MemberList<Ndm_Block> blocks_;
+    Ndm_MemberList<Ndm_Signal> signals_;
+    Ndm_MemberList<Ndm_Pin> pins_;
     mutable std::unique_ptr<Ndm_MemberIndex> index_;
 };
 
