@@ -9,7 +9,10 @@
 #include <iterator>
 #include <sstream>
 
+#include <simdjson.h>
+
 #include "host/design/design_io.h"
+#include "host/design/json_chunks.h"
 #include "host/design/native_format.h"
 #include "host/design/yosys_reader.h"
 #include "host/port/msgman.h"
@@ -50,6 +53,25 @@ std::string Write(const char* name, std::string_view bytes) {
     out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
     if (!out.flush()) Fail("writing the input", path);
     return path;
+}
+
+std::unique_ptr<Ndm_Design> ReadBothWays(const uint8_t* data, size_t size, const std::string& path,
+                                         const std::function<std::unique_ptr<Ndm_Design>()>& read) {
+    auto whole = read();
+    const Ndm_JsonChunks::Sizes saved = Ndm_JsonChunks::GetSizes();
+    Ndm_JsonChunks::GetSizes() = {0, 1 + size % 13};
+    auto pieces = read();
+    Ndm_JsonChunks::GetSizes() = saved;
+    simdjson::dom::parser parser;
+    if (parser.parse(reinterpret_cast<const char*>(data), size).error()) return whole;
+    if (!whole != !pieces) Fail("a file read in pieces is taken or refused as read whole", path);
+    if (whole) {
+        const std::string a = Path("whole.design.json"), b = Path("pieces.design.json");
+        if (!Ndm_WriteNative(*whole, a.c_str()) || !Ndm_WriteNative(*pieces, b.c_str()))
+            Fail("saving a design read both ways", a);
+        if (ReadAll(a) != ReadAll(b)) Fail("a file read in pieces gives the same design", a + " vs " + b);
+    }
+    return whole;
 }
 
 std::string ReadAll(const std::string& path) {

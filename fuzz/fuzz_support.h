@@ -5,6 +5,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -34,5 +35,12 @@ std::unique_ptr<Ndm_Design> Blinky();
 [[noreturn]] void Fail(const char* what, const std::string& detail);
 // The same for a file that did not read back: the last message captured says why.
 [[noreturn]] void FailReading(const char* what, const Port_MsgCapture& messages, const std::string& path);
+// Runs read twice, on the input at path, whose bytes are data: as such and with the file read in pieces of a few
+// bytes (every array and object then a large one, cut at every few commas). On valid JSON the
+// two readings must agree: both refuse the input, or both take it and give the same design (the
+// same native file). The parser checks malformed JSON only as far as it reads it, so there each
+// reading may decide alone. Returns the first reading's design.
+std::unique_ptr<Ndm_Design> ReadBothWays(const uint8_t* data, size_t size, const std::string& path,
+                                         const std::function<std::unique_ptr<Ndm_Design>()>& read);
 
 }  // namespace lun_fuzz

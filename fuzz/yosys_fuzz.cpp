@@ -1,4 +1,5 @@
-// The netlist reader from arbitrary bytes; a netlist it takes must survive the native file.
+// The netlist reader from arbitrary bytes; a netlist it takes must survive the native file. Read
+// in pieces, a valid netlist gives the same design.
 #include "fuzz/fuzz_support.h"
 #include "host/design/native_format.h"
 #include "host/design/yosys_reader.h"
@@ -10,7 +11,8 @@ int LunFuzzYosys(const uint8_t* data, size_t size) {
         lun_fuzz::Write("netlist.json", std::string_view(reinterpret_cast<const char*>(data), size));
     try {
         // A small limit: expansion is counted before anything is made, so it is tested as well.
-        auto design = Ndm_ReadYosysJson(path.c_str(), nullptr, 100000);
+        auto design = lun_fuzz::ReadBothWays(data, size, path,
+                                             [&] { return Ndm_ReadYosysJson(path.c_str(), nullptr, 100000); });
         if (!design) return 0;
         const std::string native = lun_fuzz::Path("netlist.design.json");
         if (!Ndm_WriteNative(*design, native.c_str())) lun_fuzz::Fail("saving a netlist read", native);

@@ -191,7 +191,7 @@ bool Reader::Fail(simdjson::error_code e, size_t offset) {
 
 size_t Reader::Offset() {
     const char* at = nullptr;
-    if (doc_.current_location().get(at) || !at) return end_;
+    if (!has_doc_ || doc_.current_location().get(at) || !at) return end_;
     const char* run = run_.get();
     if (run && at >= run && at <= run + run_size_) {
         const size_t k = static_cast<size_t>(at - run);
@@ -303,10 +303,12 @@ bool Reader::Run(const Container& c, size_t begin, size_t end, Visitor& visitor)
     run_base_ = begin;
     run_size_ = n + 2;
     end_ = end;
+    has_doc_ = false;
     if (simdjson::error_code e = Ndm_JsonInput::Iterate(parser_, run, n + 2, need, doc_)) {
         const size_t at = Ndm_JsonInput::EarlyErrorOffset(e, run, n + 2);
         return Fail(e, std::min(begin + (at ? at - 1 : 0), end));
     }
+    has_doc_ = true;
     if (c.object) {
         od::object object;
         if (simdjson::error_code e = doc_.get_object().get(object)) return Fail(e, Offset());
@@ -335,15 +337,16 @@ bool Reader::Whole(od::raw_json_string key, const Container& c, Visitor& visitor
     const size_t n = c.close + 1 - c.open;
     end_ = c.close + 1;
     run_size_ = 0;
+    has_doc_ = false;
     if (simdjson::error_code e = Ndm_JsonInput::Iterate(
             parser_, d + c.open, n, input_.size() + simdjson::SIMDJSON_PADDING - c.open, doc_))
         return Fail(e, c.open + std::min(Ndm_JsonInput::EarlyErrorOffset(e, d + c.open, n), n));
+    has_doc_ = true;
     od::value value;
     if (simdjson::error_code e = doc_.get_value().get(value)) return Fail(e, Offset());
-    if (!visitor.Member(key, value)) return false;
-    if (doc_.current_location().error() != simdjson::OUT_OF_BOUNDS)
-        return Fail(simdjson::TRAILING_CONTENT, Offset());
-    return true;
+    // The span is one bracketed value, which the visitor may leave unread (as the reading of a
+    // run skips what its visitor does not read).
+    return visitor.Member(key, value);
 }
 
 }  // namespace Ndm_JsonChunks

@@ -82,6 +82,7 @@ private:
     Ndm_JsonInput::Input& input_;
     simdjson::ondemand::parser parser_;
     simdjson::ondemand::document doc_;
+    bool has_doc_ = false;  // doc_ holds a piece
     std::unique_ptr<char[]> run_;  // the run being read, between brackets, with padding
     size_t run_room_ = 0;
     size_t run_base_ = 0;  // input offset of the run's first byte

@@ -15,9 +15,10 @@ namespace ndm_yosys {
 // ---------------------------------------------------------------------------------------
 // Parsing
 
-bool Reader::Key(od::field& field, std::string_view& out) {
-    if (!Ndm_JsonInput::Text(field.key(), scratch_, out))
-        return SyntaxError(simdjson::STRING_ERROR, Where());
+bool Reader::Key(od::field& field, std::string_view& out) { return KeyText(field.key(), out); }
+
+bool Reader::KeyText(od::raw_json_string key, std::string_view& out) {
+    if (!Ndm_JsonInput::Text(key, scratch_, out)) return SyntaxError(simdjson::STRING_ERROR, Where());
     return true;
 }
 
@@ -71,10 +72,98 @@ bool Reader::Bits(od::value value, Module& m, Range& range, const What& what) {
     return true;
 }
 
+// Reads a file in pieces: the large objects (the modules, a large module, its cells, netnames
+// and ports) arrive member by member, and each member goes to the reader that the whole-file
+// reading would give it to, so both readings check the same rules.
+class Reader::Pieces : public Ndm_JsonChunks::Visitor {
+public:
+    explicit Pieces(Reader& reader) : r_(reader) { stack_.push_back(Ctx::Root); }
+
+    bool Member(od::raw_json_string key, od::value value) override {
+        switch (stack_.back()) {
+            case Ctx::Root: return key == "modules" ? r_.Modules(value) : true;
+            case Ctx::Modules: return r_.ModuleWhole(key, value);
+            case Ctx::Module: return r_.ModuleMember(key, value);
+            case Ctx::Cells: return r_.CellMember(r_.module_, key, value);
+            case Ctx::Nets: return r_.NetMember(r_.module_, key, value);
+            case Ctx::Ports: return r_.PortMember(r_.module_, key, value);
+            case Ctx::Skip: return true;
+        }
+        return true;
+    }
+
+    // A large member is read in parts where the whole-file reading would walk into it, and
+    // whole (where its reader reports what is wrong with it) anywhere else.
+    bool Enter(od::raw_json_string key, bool object, Take& take) override {
+        Ctx next = Ctx::Skip;
+        take = Take::Whole;
+        switch (stack_.back()) {
+            case Ctx::Root:
+                if (key == "modules") {
+                    if (!object) return true;
+                    if (!r_.SeeModules()) return false;
+                    next = Ctx::Modules;
+                }
+                break;
+            case Ctx::Modules: {
+                if (!object) return true;
+                bool skip = false;
+                if (!r_.BeginModule(key, skip)) return false;
+                next = skip ? Ctx::Skip : Ctx::Module;
+                break;
+            }
+            case Ctx::Module:
+                if (object && key == "cells") {
+                    next = Ctx::Cells;
+                } else if (object && key == "netnames") {
+                    next = Ctx::Nets;
+                } else if (object && key == "ports") {
+                    next = Ctx::Ports;
+                } else if (key == "attributes" || key == "cells" || key == "netnames" || key == "ports") {
+                    return true;
+                }
+                break;
+            case Ctx::Cells:
+            case Ctx::Nets:
+            case Ctx::Ports: return true;
+            case Ctx::Skip: break;
+        }
+        take = Take::Parts;
+        stack_.push_back(next);
+        return true;
+    }
+
+    bool Leave() override {
+        if (stack_.back() == Ctx::Module) r_.EndModule();
+        stack_.pop_back();
+        return true;
+    }
+
+private:
+    enum class Ctx { Root, Modules, Module, Cells, Nets, Ports, Skip };
+    Reader& r_;
+    std::vector<Ctx> stack_;
+};
+
 bool Reader::Load() {
     std::string why;
     if (!buf_.Open(path_, why))
         return Error(Port_Format("Cannot read netlist file '%s': %s.", path_, why.c_str()));
+    // A large file is read in pieces, so that the parser's index of the whole file (larger
+    // than the file) is never held beside the modules being read.
+    const Ndm_JsonChunks::Sizes& sizes = Ndm_JsonChunks::GetSizes();
+    Ndm_JsonChunks::Outline outline;
+    if (buf_.size() >= sizes.chunked_from &&
+        Ndm_JsonChunks::MakeOutline(buf_.data(), buf_.size(), sizes.piece, outline) &&
+        outline.root != UINT32_MAX && outline.containers[outline.root].object) {
+        Ndm_JsonChunks::Reader pieces(buf_);
+        pieces_ = &pieces;
+        Pieces visitor(*this);
+        const bool ok = pieces.Read(outline, visitor);
+        pieces_ = nullptr;
+        if (!ok) return pieces.error() ? SyntaxError(pieces.error(), pieces.error_offset()) : false;
+        return Parsed();
+    }
     if (error_code e = Ndm_JsonInput::Iterate(parser_, buf_, doc_))
         return SyntaxError(e, Ndm_JsonInput::EarlyErrorOffset(e, buf_));
     return ParseRoot();
@@ -89,44 +178,80 @@ bool Reader::ParseRoot() {
         return Error(Port_Format("'%s' is not a Yosys JSON netlist: the file does not hold a JSON object.",
                                  path_));
     }
-    bool seen_modules = false;
     for (auto item : root) {
         od::field field;
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member");
         if (field.key() != "modules") continue;
-        if (seen_modules) return ShapeError("\"modules\" appears twice");
-        seen_modules = true;
-        od::object modules;
-        if (error_code e = field.value().get_object().get(modules))
-            return JsonError(e, "\"modules\" must be an object");
-        for (auto mitem : modules) {
-            od::field mfield;
-            if (error_code e = std::move(mitem).get(mfield)) return JsonError(e, "bad module");
-            std::string_view name;
-            if (!Key(mfield, name)) return false;
-            if (!NameOk(StripEscape(name), nullptr, "module")) continue;
-            Module m;
-            m.name = design_.Intern(StripEscape(name));
-            m.offset = Where();
-            for (Ndm_PtrMap& seen : seen_) seen.Clear();
-            module_name_ = m.name;
-            if (module_index_.Find(m.name)) return ShapeError(Port_Format("module '%s' is defined twice", m.name));
-            od::object object;
-            if (error_code e = mfield.value().get_object().get(object))
-                return JsonError(e, Port_Format("module '%s' must be an object", m.name));
-            if (!ParseModule(object, m)) return false;
-            buf_.DropBefore(Where());
-            Finish(m);
-            module_index_.InsertIfAbsent(m.name, AsValue(modules_.size()));
-            modules_.push_back(std::move(m));
-        }
+        if (!Modules(field.value())) return false;
     }
     if (!AtEnd()) return SyntaxError(simdjson::TRAILING_CONTENT, Where());
-    if (!seen_modules)
+    return Parsed();
+}
+
+bool Reader::Parsed() {
+    if (!seen_modules_)
         return Error(Port_Format("'%s' is not a Yosys JSON netlist: it has no \"modules\" object.", path_));
     if (bad_names_) return false;  // each was reported
     if (modules_.empty()) return Error(Port_Format("Netlist '%s' holds no module.", path_));
     return true;
+}
+
+bool Reader::SeeModules() {
+    if (seen_modules_) return ShapeError("\"modules\" appears twice");
+    seen_modules_ = true;
+    return true;
+}
+
+bool Reader::Modules(od::value value) {
+    if (!SeeModules()) return false;
+    od::object modules;
+    if (error_code e = value.get_object().get(modules)) return JsonError(e, "\"modules\" must be an object");
+    for (auto mitem : modules) {
+        od::field mfield;
+        if (error_code e = std::move(mitem).get(mfield)) return JsonError(e, "bad module");
+        if (!ModuleWhole(mfield.key(), mfield.value())) return false;
+    }
+    return true;
+}
+
+bool Reader::ModuleWhole(od::raw_json_string key, od::value value) {
+    bool skip = false;
+    if (!BeginModule(key, skip)) return false;
+    if (skip) return true;
+    od::object object;
+    if (error_code e = value.get_object().get(object))
+        return JsonError(e, Port_Format("module '%s' must be an object", module_.name));
+    for (auto item : object) {
+        od::field field;
+        if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member" + InModule());
+        if (!ModuleMember(field.key(), field.value())) return false;
+    }
+    EndModule();
+    return true;
+}
+
+// Starts reading the module of that name; skip when the name is refused (the module is left out).
+bool Reader::BeginModule(od::raw_json_string key, bool& skip) {
+    std::string_view name;
+    if (!KeyText(key, name)) return false;
+    skip = !NameOk(StripEscape(name), nullptr, "module");
+    if (skip) return true;
+    module_ = Module();
+    module_.name = design_.Intern(StripEscape(name));
+    module_.offset = Where();
+    for (Ndm_PtrMap& seen : seen_) seen.Clear();
+    module_name_ = module_.name;
+    if (module_index_.Find(module_.name))
+        return ShapeError(Port_Format("module '%s' is defined twice", module_.name));
+    return true;
+}
+
+void Reader::EndModule() {
+    buf_.DropBefore(Where());
+    Finish(module_);
+    module_index_.InsertIfAbsent(module_.name, AsValue(modules_.size()));
+    modules_.push_back(std::move(module_));
+    module_ = Module();
 }
 
 // A name of the file that a design object will carry (a module, port, cell or net name, or a
@@ -163,22 +288,11 @@ bool Reader::FirstOfName(Ndm_PtrMap& seen, const char* name, const Module& m, co
     return false;
 }
 
-bool Reader::ParseModule(od::object object, Module& m) {
-    for (auto item : object) {
-        od::field field;
-        if (error_code e = std::move(item).get(field)) return JsonError(e, "bad member" + InModule());
-        od::raw_json_string key = field.key();
-        bool ok = true;
-        if (key == "attributes")
-            ok = ParseAttributes(field.value(), m);
-        else if (key == "ports")
-            ok = ParsePorts(field.value(), m);
-        else if (key == "cells")
-            ok = ParseCells(field.value(), m);
-        else if (key == "netnames")
-            ok = ParseNets(field.value(), m);
-        if (!ok) return false;
-    }
+bool Reader::ModuleMember(od::raw_json_string key, od::value value) {
+    if (key == "attributes") return ParseAttributes(value, module_);
+    if (key == "ports") return ParsePorts(value, module_);
+    if (key == "cells") return ParseCells(value, module_);
+    if (key == "netnames") return ParseNets(value, module_);
     return true;
 }
 
@@ -218,38 +332,43 @@ bool Reader::ParsePorts(od::value value, Module& m) {
     for (auto item : object) {
         od::field field;
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad port" + InModule());
-        std::string_view name;
-        if (!Key(field, name)) return false;
-        if (!NameOk(StripEscape(name), &m, "port")) continue;
-        Port port;
-        port.name = design_.Intern(StripEscape(name));
-        if (!FirstOfName(seen_[kSeenPorts], port.name, m, "port")) continue;
-        auto what = [&] { return Port_Format("port '%s' in module '%s'", port.name, m.name); };
-        od::object body;
-        if (error_code e = field.value().get_object().get(body)) return JsonError(e, what() + " must be an object");
-        bool has_bits = false;
-        for (auto pitem : body) {
-            od::field pfield;
-            if (error_code e = std::move(pitem).get(pfield)) return JsonError(e, "bad member of " + what());
-            od::raw_json_string key = pfield.key();
-            if (key == "direction") {
-                if (!Direction(pfield.value(), port.dir, [&] { return "\"direction\" of " + what(); })) return false;
-            } else if (key == "bits") {
-                if (!Bits(pfield.value(), m, port.bits, [&] { return "\"bits\" of " + what(); })) return false;
-                has_bits = true;
-            } else if (key == "offset") {
-                int64_t n;
-                if (!Int(pfield.value(), n, [&] { return "\"offset\" of " + what(); })) return false;
-                port.offset = static_cast<int32_t>(n);
-            } else if (key == "upto") {
-                int64_t n;
-                if (!Int(pfield.value(), n, [&] { return "\"upto\" of " + what(); })) return false;
-                port.upto = n != 0;
-            }
-        }
-        if (!has_bits) return ShapeError(what() + " has no \"bits\"");
-        m.ports.push_back(port);
+        if (!PortMember(m, field.key(), field.value())) return false;
     }
+    return true;
+}
+
+bool Reader::PortMember(Module& m, od::raw_json_string name_key, od::value value) {
+    std::string_view name;
+    if (!KeyText(name_key, name)) return false;
+    if (!NameOk(StripEscape(name), &m, "port")) return true;
+    Port port;
+    port.name = design_.Intern(StripEscape(name));
+    if (!FirstOfName(seen_[kSeenPorts], port.name, m, "port")) return true;
+    auto what = [&] { return Port_Format("port '%s' in module '%s'", port.name, m.name); };
+    od::object body;
+    if (error_code e = value.get_object().get(body)) return JsonError(e, what() + " must be an object");
+    bool has_bits = false;
+    for (auto pitem : body) {
+        od::field pfield;
+        if (error_code e = std::move(pitem).get(pfield)) return JsonError(e, "bad member of " + what());
+        od::raw_json_string key = pfield.key();
+        if (key == "direction") {
+            if (!Direction(pfield.value(), port.dir, [&] { return "\"direction\" of " + what(); })) return false;
+        } else if (key == "bits") {
+            if (!Bits(pfield.value(), m, port.bits, [&] { return "\"bits\" of " + what(); })) return false;
+            has_bits = true;
+        } else if (key == "offset") {
+            int64_t n;
+            if (!Int(pfield.value(), n, [&] { return "\"offset\" of " + what(); })) return false;
+            port.offset = static_cast<int32_t>(n);
+        } else if (key == "upto") {
+            int64_t n;
+            if (!Int(pfield.value(), n, [&] { return "\"upto\" of " + what(); })) return false;
+            port.upto = n != 0;
+        }
+    }
+    if (!has_bits) return ShapeError(what() + " has no \"bits\"");
+    m.ports.push_back(port);
     return true;
 }
 
@@ -260,20 +379,25 @@ bool Reader::ParseCells(od::value value, Module& m) {
     for (auto item : object) {
         od::field field;
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad cell" + InModule());
-        std::string_view name;
-        if (!Key(field, name)) return false;
-        if (!NameOk(StripEscape(name), &m, "cell")) continue;
-        Cell cell;
-        cell.name = design_.Intern(StripEscape(name));
-        if (!FirstOfName(seen_[kSeenCells], cell.name, m, "cell")) continue;
-        od::object body;
-        if (error_code e = field.value().get_object().get(body))
-            return JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name));
-        const size_t bad = bad_names_;
-        if (!ParseCell(body, m, cell)) return false;
-        if (bad_names_ == bad) m.cells.push_back(cell);
-        if ((m.cells.size() & 1023) == 0) buf_.DropBefore(Where());
+        if (!CellMember(m, field.key(), field.value())) return false;
     }
+    return true;
+}
+
+bool Reader::CellMember(Module& m, od::raw_json_string name_key, od::value value) {
+    std::string_view name;
+    if (!KeyText(name_key, name)) return false;
+    if (!NameOk(StripEscape(name), &m, "cell")) return true;
+    Cell cell;
+    cell.name = design_.Intern(StripEscape(name));
+    if (!FirstOfName(seen_[kSeenCells], cell.name, m, "cell")) return true;
+    od::object body;
+    if (error_code e = value.get_object().get(body))
+        return JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name));
+    const size_t bad = bad_names_;
+    if (!ParseCell(body, m, cell)) return false;
+    if (bad_names_ == bad) m.cells.push_back(cell);
+    if ((m.cells.size() & 1023) == 0) buf_.DropBefore(Where());
     return true;
 }
 
@@ -352,44 +476,49 @@ bool Reader::ParseNets(od::value value, Module& m) {
     for (auto item : object) {
         od::field field;
         if (error_code e = std::move(item).get(field)) return JsonError(e, "bad netname" + InModule());
-        std::string_view name;
-        if (!Key(field, name)) return false;
-        if (!NameOk(StripEscape(name), &m, "net")) continue;
-        Net net;
-        net.name = design_.Intern(StripEscape(name));
-        if (!FirstOfName(seen_[kSeenNets], net.name, m, "net")) continue;
-        od::object body;
-        if (error_code e = field.value().get_object().get(body))
-            return JsonError(e, Port_Format("netname '%s' in module '%s' must be an object", net.name, m.name));
-        bool has_bits = false;
-        for (auto nitem : body) {
-            od::field nfield;
-            if (error_code e = std::move(nitem).get(nfield)) return JsonError(e, "bad member of netname" + InModule());
-            od::raw_json_string key = nfield.key();
-            if (key == "bits") {
-                if (!Bits(nfield.value(), m, net.bits, [&] {
-                        return Port_Format("\"bits\" of netname '%s' in module '%s'", net.name, m.name);
-                    }))
-                    return false;
-                has_bits = true;
-            } else if (key == "offset" || key == "upto") {
-                bool is_offset = key == "offset";
-                int64_t n;
-                if (!Int(nfield.value(), n, [&] {
-                        return Port_Format("\"%s\" of netname '%s' in module '%s'", is_offset ? "offset" : "upto",
-                                           net.name, m.name);
-                    }))
-                    return false;
-                if (is_offset)
-                    net.offset = static_cast<int32_t>(n);
-                else
-                    net.upto = n != 0;
-            }
-        }
-        if (!has_bits)
-            return ShapeError(Port_Format("netname '%s' in module '%s' has no \"bits\"", net.name, m.name));
-        m.nets.push_back(net);
+        if (!NetMember(m, field.key(), field.value())) return false;
     }
+    return true;
+}
+
+bool Reader::NetMember(Module& m, od::raw_json_string name_key, od::value value) {
+    std::string_view name;
+    if (!KeyText(name_key, name)) return false;
+    if (!NameOk(StripEscape(name), &m, "net")) return true;
+    Net net;
+    net.name = design_.Intern(StripEscape(name));
+    if (!FirstOfName(seen_[kSeenNets], net.name, m, "net")) return true;
+    od::object body;
+    if (error_code e = value.get_object().get(body))
+        return JsonError(e, Port_Format("netname '%s' in module '%s' must be an object", net.name, m.name));
+    bool has_bits = false;
+    for (auto nitem : body) {
+        od::field nfield;
+        if (error_code e = std::move(nitem).get(nfield)) return JsonError(e, "bad member of netname" + InModule());
+        od::raw_json_string key = nfield.key();
+        if (key == "bits") {
+            if (!Bits(nfield.value(), m, net.bits, [&] {
+                    return Port_Format("\"bits\" of netname '%s' in module '%s'", net.name, m.name);
+                }))
+                return false;
+            has_bits = true;
+        } else if (key == "offset" || key == "upto") {
+            bool is_offset = key == "offset";
+            int64_t n;
+            if (!Int(nfield.value(), n, [&] {
+                    return Port_Format("\"%s\" of netname '%s' in module '%s'", is_offset ? "offset" : "upto",
+                                       net.name, m.name);
+                }))
+                return false;
+            if (is_offset)
+                net.offset = static_cast<int32_t>(n);
+            else
+                net.upto = n != 0;
+        }
+    }
+    if (!has_bits)
+        return ShapeError(Port_Format("netname '%s' in module '%s' has no \"bits\"", net.name, m.name));
+    m.nets.push_back(net);
     return true;
 }
 

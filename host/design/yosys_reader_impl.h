@@ -12,6 +12,7 @@
 #include <utility>
 #include <vector>
 
+#include "host/design/json_chunks.h"
 #include "host/design/json_input.h"
 #include "host/design/name_pool.h"
 #include "host/design/ndm.h"
@@ -145,7 +146,7 @@ private:
         Msg().issueError("%s", text.c_str());
         return false;
     }
-    size_t Where() { return Ndm_JsonInput::Offset(doc_, buf_); }
+    size_t Where() { return pieces_ ? pieces_->Offset() : Ndm_JsonInput::Offset(doc_, buf_); }
     bool AtEnd() { return doc_.current_location().error() == simdjson::OUT_OF_BOUNDS; }
     // A simdjson error while reading `what`: a syntax error, or a value of the wrong kind.
     bool JsonError(error_code e, const std::string& what) {
@@ -164,17 +165,28 @@ private:
 
     // ---- parsing ----
     bool Key(od::field& field, std::string_view& out);
+    bool KeyText(od::raw_json_string key, std::string_view& out);
     bool String(od::value value, std::string_view& out, const What& what);
     bool Int(od::value value, int64_t& out, const What& what);
     bool Bits(od::value value, Module& m, Range& range, const What& what);
     bool Direction(od::value value, Ndm_Dir& dir, const What& what);
+    class Pieces;  // reads a large file in pieces (yosys_reader.cpp)
     bool ParseRoot();
-    bool ParseModule(od::object object, Module& m);
+    bool Parsed();  // the checks once the whole file is read
+    bool SeeModules();
+    bool Modules(od::value value);
+    bool ModuleWhole(od::raw_json_string key, od::value value);
+    bool BeginModule(od::raw_json_string key, bool& skip);
+    void EndModule();
+    bool ModuleMember(od::raw_json_string key, od::value value);  // of module_
     bool ParseAttributes(od::value value, Module& m);
     bool ParsePorts(od::value value, Module& m);
+    bool PortMember(Module& m, od::raw_json_string name_key, od::value value);
     bool ParseCells(od::value value, Module& m);
+    bool CellMember(Module& m, od::raw_json_string name_key, od::value value);
     bool ParseCell(od::object object, Module& m, Cell& cell);
     bool ParseNets(od::value value, Module& m);
+    bool NetMember(Module& m, od::raw_json_string name_key, od::value value);
     bool NameOk(std::string_view name, const Module* m, const char* kind, bool may_be_empty = false);
     bool FirstOfName(Ndm_PtrMap& seen, const char* name, const Module& m, const char* kind);
     bool FirstConnection(const Module& m, const Cell& cell, const char* name);
@@ -224,6 +236,9 @@ private:
                             // and of the connections of a cell with many
     size_t bad_names_ = 0;  // objects left out for their names
 
+    Ndm_JsonChunks::Reader* pieces_ = nullptr;  // while a large file is read in pieces
+    bool seen_modules_ = false;
+    Module module_;  // the module being read
     std::vector<Module> modules_;
     Ndm_PtrMap module_index_;  // module name -> index + 1
     std::vector<std::pair<const char*, Ndm_Dir>> dirs_;  // port_directions of the current cell

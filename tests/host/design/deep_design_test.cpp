@@ -10,7 +10,6 @@
 #include "design_test_util.h"
 #include "host/design/design_io.h"
 #include "host/design/dump.h"
-#include "host/design/json_chunks.h"
 #include "host/design/native_format.h"
 #include "host/design/yosys_reader.h"
 #include "host/port/msgman.h"
@@ -99,10 +98,8 @@ TEST(DeepDesigns, ReadWriteDumpAndDeleteKeepTheirOwnStacks) {
             ASSERT_TRUE(Ndm_WriteNative(*again, second.c_str()));
             EXPECT_EQ(ReadAll(first), ReadAll(second));
             {  // and so it does when read in pieces, where every level is a large block
-                const Ndm_JsonChunks::Sizes saved = Ndm_JsonChunks::GetSizes();
-                Ndm_JsonChunks::GetSizes() = {0, 64};
+                design_test::PieceSize size(64);
                 auto pieces = Ndm_ReadNative(first.c_str());
-                Ndm_JsonChunks::GetSizes() = saved;
                 ASSERT_TRUE(pieces);
                 ASSERT_TRUE(Ndm_WriteNative(*pieces, second.c_str()));
                 EXPECT_EQ(ReadAll(first), ReadAll(second));

@@ -13,8 +13,26 @@
 #include <string>
 
 #include "host/design/dump.h"
+#include "host/design/json_chunks.h"
 
 namespace design_test {
+
+// Reads large files in pieces of that many bytes while alive, whatever their size (0: small
+// files are read whole, as usual). Pieces of a byte make every array and object a large one,
+// cut at every comma.
+class PieceSize {
+public:
+    explicit PieceSize(size_t piece) : saved_(Ndm_JsonChunks::GetSizes()) {
+        if (piece) Ndm_JsonChunks::GetSizes() = {0, piece};
+    }
+    ~PieceSize() { Ndm_JsonChunks::GetSizes() = saved_; }
+    PieceSize(const PieceSize&) = delete;
+    PieceSize& operator=(const PieceSize&) = delete;
+
+private:
+    Ndm_JsonChunks::Sizes saved_;
+};
+inline constexpr size_t kPieceSizes[] = {0, 1, 6, 40};
 
 class TempDir {
 public:

@@ -9,29 +9,16 @@
 
 #include "design_test_util.h"
 #include "host/design/design_io.h"
-#include "host/design/json_chunks.h"
 #include "host/design/native_format.h"
 #include "host/port/msgman.h"
 
 namespace {
 
 using design_test::DumpText;
+using design_test::kPieceSizes;
+using design_test::PieceSize;
 using design_test::ReadAll;
 using design_test::TempDir;
-
-// Reads files in pieces of that many bytes while alive (0: whole, as small files are read).
-// Pieces of a byte make every array and object a large one, cut at every comma.
-class PieceSize {
-public:
-    explicit PieceSize(size_t piece) : saved_(Ndm_JsonChunks::GetSizes()) {
-        if (piece) Ndm_JsonChunks::GetSizes() = {0, piece};
-    }
-    ~PieceSize() { Ndm_JsonChunks::GetSizes() = saved_; }
-
-private:
-    Ndm_JsonChunks::Sizes saved_;
-};
-constexpr size_t kPieceSizes[] = {0, 1, 6, 40};
 
 // Every byte but NUL, then a real U+F7E9 (which stands for a byte in the file) and a euro sign.
 std::string AllBytes() {

@@ -10,9 +10,13 @@
 #include "host/design/native_format.h"
 #include "host/design/yosys_reader.h"
 #include "host/port/msgman.h"
+#include "support/chain_netlist.h"
 
 namespace {
 
+using design_test::DumpText;
+using design_test::kPieceSizes;
+using design_test::PieceSize;
 using design_test::TempDir;
 
 std::vector<std::string> NetworkMembers(const Ndm_Network* net) {
@@ -357,8 +361,10 @@ TEST(YosysReader, BadInputGivesOneClearError) {
          "\"s\": {}}}",
          "Cell 'i' in module 'top' of '@' connects port 'zz', which module 's' does not have."},
     };
+    for (size_t piece : kPieceSizes)
     for (const Case& c : cases) {
-        SCOPED_TRACE(c.name);
+        SCOPED_TRACE(std::string(c.name) + " in pieces of " + std::to_string(piece));
+        PieceSize size(piece);
         std::string path = c.text ? dir.Write(c.name, c.text) : dir.File(c.name);
         std::string expect = c.expect;
         if (size_t at = expect.find('@'); at != std::string::npos) expect.replace(at, 1, path);
@@ -421,6 +427,13 @@ TEST(YosysReader, LargeFileReadPastItsDroppedPages) {
     const auto [small, small_abc] = offset_of_error(netlist("", "\"abc\""));
     const auto [large, large_abc] = offset_of_error(netlist(cells, "\"abc\""));
     EXPECT_EQ(large - large_abc, small - small_abc);
+    // Read in pieces, the design is the same and the error is found at the same byte.
+    PieceSize size(1 << 16);
+    auto pieces = Ndm_LoadDesign(good.c_str(), nullptr);
+    ASSERT_TRUE(pieces);
+    EXPECT_EQ(DumpText(*pieces), DumpText(*design));
+    const auto [piece, piece_abc] = offset_of_error(netlist(cells, "\"abc\""));
+    EXPECT_EQ(piece, large);
 }
 
 // Names no object can carry (empty, cut short by a NUL, or taken twice in a module) each get an
@@ -447,14 +460,38 @@ TEST(YosysReader, BadNamesAreEachReportedAndTheNetlistRefused) {
         "Module 'top' in '@' has a net with an empty name",
         "Netlist '@' has a module named 'm\\u0000', which holds a NUL character",
     };
-    Port_MsgCapture capture;
-    EXPECT_FALSE(Ndm_LoadDesign(path.c_str(), nullptr));
-    const std::vector<std::string> errors = capture.Texts(Port_Severity::Error);
-    ASSERT_EQ(errors.size(), expected.size());
-    for (size_t i = 0; i < expected.size(); ++i) {
-        std::string expect = expected[i];
-        expect.replace(expect.find('@'), 1, path);
-        EXPECT_EQ(errors[i].rfind(expect + " (at byte ", 0), 0u) << errors[i];
+    for (size_t piece : kPieceSizes) {
+        SCOPED_TRACE(piece);
+        PieceSize size(piece);
+        Port_MsgCapture capture;
+        EXPECT_FALSE(Ndm_LoadDesign(path.c_str(), nullptr));
+        const std::vector<std::string> errors = capture.Texts(Port_Severity::Error);
+        ASSERT_EQ(errors.size(), expected.size());
+        for (size_t i = 0; i < expected.size(); ++i) {
+            std::string expect = expected[i];
+            expect.replace(expect.find('@'), 1, path);
+            EXPECT_EQ(errors[i].rfind(expect + " (at byte ", 0), 0u) << errors[i];
+        }
+    }
+}
+
+// A netlist read in pieces (large ones are) gives the design it gives read whole.
+TEST(YosysReader, ReadingInPiecesGivesTheSameDesign) {
+    TempDir dir;
+    const std::string netlists[] = {
+        design_test::ReadAll(LUN_SOURCE_DIR "/examples/blinky/blinky.json"), kNamesNetlist, kSharedPorts,
+        lun_test::ChainNetlist(12, true, 3)};
+    for (const std::string& text : netlists) {
+        const std::string path = dir.Write("n.json", text);
+        auto whole = Ndm_ReadYosysJson(path.c_str(), nullptr);
+        ASSERT_TRUE(whole);
+        for (size_t piece : kPieceSizes) {
+            SCOPED_TRACE(text.substr(0, 80) + " in pieces of " + std::to_string(piece));
+            PieceSize size(piece);
+            auto pieces = Ndm_ReadYosysJson(path.c_str(), nullptr);
+            ASSERT_TRUE(pieces);
+            EXPECT_EQ(DumpText(*pieces), DumpText(*whole));
+        }
     }
 }
 
