@@ -31,9 +31,9 @@ bool Reader::ResolveTypes() {
 // Connections of a library cell without port_directions take them from its module.
 void Reader::BoxDirections(Module& m, const Cell& cell, Module& box) {
     for (uint32_t k = 0; k < cell.num_conns; ++k) {
-        Conn& conn = m.conns[cell.first_conn + k];
-        if (conn.dir != Ndm_Dir::None) continue;
-        if (const Port* port = FindPort(box, conn.name)) conn.dir = port->dir;
+        Ndm_Dir& dir = m.conn_dirs[cell.first_conn + k];
+        if (dir != Ndm_Dir::None) continue;
+        if (const Port* port = FindPort(box, m.conns[cell.first_conn + k].name)) dir = port->dir;
     }
 }
 
@@ -108,6 +108,7 @@ bool Reader::CheckCycles(uint32_t top) {
         if (frame.next_cell == m.cells.size()) {
             Count(m);
             m.state = 2;
+            postorder_.push_back(frame.module);
             stack.pop_back();
             continue;
         }
@@ -150,6 +151,18 @@ void Reader::Count(Module& m) {
 
 // Refuses a netlist whose expansion would pass the instance limit, or the 32-bit counts of bit
 // ids and of signals (and so of networks and their members), before anything is made.
+// How many instances of each module below the top the expansion makes: the parents' counts
+// summed over their cells, parents first (the reverse of the order CheckCycles finished them).
+void Reader::CountInstances(uint32_t top) {
+    for (Module& m : modules_) m.instances = 0;
+    modules_[top].instances = 1;
+    for (auto it = postorder_.rbegin(); it != postorder_.rend(); ++it) {
+        const Module& m = modules_[*it];
+        for (const Cell& cell : m.cells)
+            if (cell.sub >= 0) modules_[cell.sub].instances = Expansion::Add(modules_[cell.sub].instances, m.instances);
+    }
+}
+
 bool Reader::CheckSize(uint32_t top) {
     const Module& m = modules_[top];
     const Expansion& e = m.below;
@@ -263,6 +276,13 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
         Frame& frame = stack.back();
         Module& m = modules_[frame.module];
         if (frame.next_cell == m.cells.size()) {
+            // The module's last instance is made: its cells and connections are not needed
+            // again (the networks need its nets and bits).
+            if (--m.instances == 0) {
+                std::vector<Cell>().swap(m.cells);
+                std::vector<Conn>().swap(m.conns);
+                std::vector<Ndm_Dir>().swap(m.conn_dirs);
+            }
             stack.pop_back();
             continue;
         }
@@ -306,7 +326,7 @@ bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
             return Error(Port_Format("Cell '%s' in module '%s' of '%s' connects port '%s', which module "
                                      "'%s' does not have.",
                                      cell.name, m.name, path_, conn.name, sub->name));
-        Ndm_Dir dir = port ? port->dir : conn.dir;
+        Ndm_Dir dir = port ? port->dir : m.conn_dirs[cell.first_conn + k];
         for (uint32_t i = 0; i < conn.bits.count; ++i) {
             const char* name = port ? PinName(conn.name, conn.bits.count, port->offset, port->upto, i)
                                     : PinName(conn.name, conn.bits.count, 0, false, i);
@@ -467,12 +487,8 @@ bool Reader::Build(const char* top_module) {
     Ndm_Block* block = view->CreateTopBlock(m.name);
     block->SetTypeName(m.name);
     PadBoundary(modules_[top]);
+    CountInstances(top);
     if (!Expand(block, top)) return false;
-    // Every block and pin is made: the networks need the modules' nets and bits, not their cells.
-    for (Module& each : modules_) {
-        std::vector<Cell>().swap(each.cells);
-        std::vector<Conn>().swap(each.conns);
-    }
     TopPins(block, top);
     Networks(view);
     return true;

@@ -447,6 +447,7 @@ bool Reader::ParseCell(od::object object, Module& m, Cell& cell) {
                           [&] { return Port_Format("connection '%s' of ", conn.name) + what(); }))
                     return false;
                 m.conns.push_back(conn);
+                m.conn_dirs.push_back(Ndm_Dir::None);
             }
         }
     }
@@ -454,14 +455,15 @@ bool Reader::ParseCell(od::object object, Module& m, Cell& cell) {
     cell.num_conns = static_cast<uint32_t>(m.conns.size() - cell.first_conn);
     // Directions usually come in the order of the connections; search only when they do not.
     for (uint32_t k = 0; k < cell.num_conns; ++k) {
-        Conn& conn = m.conns[cell.first_conn + k];
+        const Conn& conn = m.conns[cell.first_conn + k];
+        Ndm_Dir& dir = m.conn_dirs[cell.first_conn + k];
         if (k < dirs_.size() && dirs_[k].first == conn.name) {
-            conn.dir = dirs_[k].second;
+            dir = dirs_[k].second;
             continue;
         }
         for (const auto& d : dirs_) {
             if (d.first == conn.name) {
-                conn.dir = d.second;
+                dir = d.second;
                 break;
             }
         }
@@ -579,6 +581,7 @@ void Reader::Finish(Module& m) {
     }
     m.bits.shrink_to_fit();
     m.conns.shrink_to_fit();
+    m.conn_dirs.shrink_to_fit();
     m.cells.shrink_to_fit();
 }
 

@@ -51,9 +51,8 @@ struct Net {
     Range bits;
 };
 
-struct Conn {
+struct Conn {  // its direction is in Module::conn_dirs, which keeps a connection at 16 bytes
     const char* name;
-    Ndm_Dir dir = Ndm_Dir::None;
     Range bits;
 };
 
@@ -86,6 +85,8 @@ struct Module {
     std::vector<Net> nets;
     std::vector<Cell> cells;
     std::vector<Conn> conns;
+    std::vector<Ndm_Dir> conn_dirs;  // per connection: its direction, None when not given
+    uint64_t instances = 0;          // how many the expansion makes: its cells go with the last
     std::vector<int32_t> bits;  // local bit ids 0..num_bits-1 once finished, constants < 0
     int64_t max_bit = -1;
     uint32_t num_bits = 0;
@@ -197,6 +198,7 @@ private:
     void BoxDirections(Module& m, const Cell& cell, Module& box);
     bool ChooseTop(const char* top_module, uint32_t& top);
     bool CheckCycles(uint32_t top);
+    void CountInstances(uint32_t top);
     void Count(Module& m);
     bool CheckSize(uint32_t top);
     const Port* FindPort(Module& m, const char* name);
@@ -244,6 +246,7 @@ private:
     std::vector<std::pair<const char*, Ndm_Dir>> dirs_;  // port_directions of the current cell
     std::vector<uint32_t> parent_;                        // union-find over global bit ids
     std::vector<Instance> instances_;                     // expanded blocks in preorder
+    std::vector<uint32_t> postorder_;                     // modules below the top, children first
 };
 
 }  // namespace ndm_yosys
