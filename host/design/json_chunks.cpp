@@ -102,9 +102,8 @@ size_t StringEnd(const char* d, size_t p, size_t end) {
     return end;
 }
 
-}  // namespace
-
-bool MakeOutline(const char* data, size_t size, size_t piece, Outline& out) {
+// The outline; with input, its pages are given back as the pass goes.
+bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_JsonInput::Input* input) {
     out.containers.clear();
     out.root = UINT32_MAX;
     const size_t first = SkipSpace(data, 0, size);
@@ -135,6 +134,7 @@ bool MakeOutline(const char* data, size_t size, size_t piece, Outline& out) {
     uint64_t carry = 0, in_string = 0;
     unsigned char tail[64];
     for (size_t base = first; base < size; base += 64) {
+        if (input && (base & ((size_t{1} << 20) - 1)) < 64) input->DropBefore(base);
         const unsigned char* block = reinterpret_cast<const unsigned char*>(data) + base;
         if (size - base < 64) {
             std::memset(tail, ' ', sizeof tail);
@@ -181,6 +181,18 @@ bool MakeOutline(const char* data, size_t size, size_t piece, Outline& out) {
     // Nothing but white space may follow the outermost container.
     if (out.root != UINT32_MAX) return out.containers[out.root].close == last - 1;
     return true;
+}
+
+}  // namespace
+
+bool MakeOutline(const char* data, size_t size, size_t piece, Outline& out) {
+    return Outline1(data, size, piece, out, nullptr);
+}
+
+bool MakeOutline(Ndm_JsonInput::Input& input, size_t piece, Outline& out) {
+    const bool ok = Outline1(input.data(), input.size(), piece, out, &input);
+    input.Rewind();
+    return ok;
 }
 
 bool Reader::Fail(simdjson::error_code e, size_t offset) {

@@ -45,6 +45,9 @@ struct Outline {
 // after it but white space; false for any other text, which is better read whole (the parser then
 // tells what is wrong with it). Values smaller than piece bytes are not outlined.
 bool MakeOutline(const char* data, size_t size, size_t piece, Outline& out);
+// The same for a whole input, whose pages are given back as the pass goes (and can be given back
+// again by the pass that reads the pieces).
+bool MakeOutline(Ndm_JsonInput::Input& input, size_t piece, Outline& out);
 
 // What a piece reader hands on: the members of the large containers, small ones with their
 // values, large ones as they begin and end.

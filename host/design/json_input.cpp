@@ -17,8 +17,12 @@ namespace Ndm_JsonInput {
 
 namespace {
 
-// Files at least this large are mapped rather than read.
+// Files at least this large are mapped rather than read; those of at most kPopulateUpTo have
+// their pages read in bulk as they are mapped. Larger ones are read in pieces, in two passes that
+// each give back what they have passed: their pages come in as they are reached, so that the
+// whole file is never resident at once.
 constexpr size_t kMapAtLeast = 1 << 20;
+constexpr size_t kPopulateUpTo = size_t{32} << 20;
 
 struct FileCloser {
     void operator()(FILE* f) const { std::fclose(f); }
@@ -145,7 +149,8 @@ bool Input::Open(const char* path, std::string& error) {
         size_t total = (size + simdjson::SIMDJSON_PADDING + page - 1) / page * page;
         void* region = ::mmap(nullptr, total, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
         if (region != MAP_FAILED) {
-            void* mapped = ::mmap(region, size, PROT_READ, MAP_PRIVATE | MAP_FIXED | MAP_POPULATE,
+            void* mapped = ::mmap(region, size, PROT_READ,
+                                  MAP_PRIVATE | MAP_FIXED | (size <= kPopulateUpTo ? MAP_POPULATE : 0),
                                   fileno(file.get()), 0);
             if (mapped != MAP_FAILED) {
                 map_ = region;
@@ -181,6 +186,10 @@ void Input::DropBefore(size_t offset) {
     if (end <= dropped_) return;
     ::madvise(static_cast<char*>(map_) + dropped_, end - dropped_, MADV_DONTNEED);
     dropped_ = end;
+}
+
+void Input::Rewind() {
+    dropped_ = 0;
 }
 
 void Input::Release() {

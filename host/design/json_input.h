@@ -31,6 +31,8 @@ public:
     // time: a reader that builds as it goes no longer needs what it has passed (and would read
     // it from the file again if it looked back), so the whole file is never resident at once.
     void DropBefore(size_t offset);
+    // Starts giving pages back from the start again, for a second pass over the file.
+    void Rewind();
     const char* data() const { return data_; }
     size_t size() const { return size_; }
     simdjson::padded_string_view view() const {

@@ -35,7 +35,7 @@ public:
         // held beside the design being built.
         const Ndm_JsonChunks::Sizes& sizes = Ndm_JsonChunks::GetSizes();
         Ndm_JsonChunks::Outline outline;
-        if (buf_.size() >= sizes.chunked_from && Ndm_JsonChunks::MakeOutline(buf_.data(), buf_.size(), sizes.piece, outline) &&
+        if (buf_.size() >= sizes.chunked_from && Ndm_JsonChunks::MakeOutline(buf_, sizes.piece, outline) &&
             outline.root != UINT32_MAX && outline.containers[outline.root].object) {
             Ndm_JsonChunks::Reader pieces(buf_);
             pieces_ = &pieces;

@@ -154,7 +154,7 @@ bool Reader::Load() {
     const Ndm_JsonChunks::Sizes& sizes = Ndm_JsonChunks::GetSizes();
     Ndm_JsonChunks::Outline outline;
     if (buf_.size() >= sizes.chunked_from &&
-        Ndm_JsonChunks::MakeOutline(buf_.data(), buf_.size(), sizes.piece, outline) &&
+        Ndm_JsonChunks::MakeOutline(buf_, sizes.piece, outline) &&
         outline.root != UINT32_MAX && outline.containers[outline.root].object) {
         Ndm_JsonChunks::Reader pieces(buf_);
         pieces_ = &pieces;
