@@ -361,4 +361,21 @@ bool Reader::Whole(od::raw_json_string key, const Container& c, Visitor& visitor
     return visitor.Member(key, value);
 }
 
+LargeRead ReadLarge(Ndm_JsonInput::Input& input, Visitor& visitor, Reader*& active) {
+    LargeRead result;
+    const Sizes& sizes = GetSizes();
+    Outline outline;
+    if (input.size() < sizes.chunked_from || !MakeOutline(input, sizes.piece, outline) ||
+        outline.root == UINT32_MAX || !outline.containers[outline.root].object)
+        return result;
+    Reader pieces(input);
+    active = &pieces;
+    result.read = true;
+    result.ok = pieces.Read(outline, visitor);
+    active = nullptr;
+    result.error = pieces.error();
+    result.error_offset = pieces.error_offset();
+    return result;
+}
+
 }  // namespace Ndm_JsonChunks

@@ -95,4 +95,17 @@ private:
     size_t error_offset_ = 0;
 };
 
+// What ReadLarge did: nothing (read is false: the input is small, or not one outlined object, and
+// is to be read whole), or read it in pieces, successfully or not (a syntax error, or a visitor
+// that reported and stopped, when error is SUCCESS).
+struct LargeRead {
+    bool read = false, ok = false;
+    simdjson::error_code error = simdjson::SUCCESS;
+    size_t error_offset = 0;
+};
+
+// Reads an input of at least GetSizes().chunked_from bytes that outlines as one object in pieces.
+// While it reads, active points at the piece reader, whose Offset() places the visitor's messages.
+LargeRead ReadLarge(Ndm_JsonInput::Input& input, Visitor& visitor, Reader*& active);
+
 }  // namespace Ndm_JsonChunks

@@ -31,18 +31,12 @@ public:
         std::string why;
         if (!buf_.Open(path_, why))
             return Error(Port_Format("Cannot read design file '%s': %s.", path_, why.c_str()));
-        // A large file is read in pieces, so that the parser's index of the whole file is never
-        // held beside the design being built.
-        const Ndm_JsonChunks::Sizes& sizes = Ndm_JsonChunks::GetSizes();
-        Ndm_JsonChunks::Outline outline;
-        if (buf_.size() >= sizes.chunked_from && Ndm_JsonChunks::MakeOutline(buf_, sizes.piece, outline) &&
-            outline.root != UINT32_MAX && outline.containers[outline.root].object) {
-            Ndm_JsonChunks::Reader pieces(buf_);
-            pieces_ = &pieces;
-            Pieces visitor(*this);
-            const bool ok = pieces.Read(outline, visitor);
-            pieces_ = nullptr;
-            if (!ok) return pieces.error() ? SyntaxError(pieces.error(), pieces.error_offset()) : false;
+        // A large file is read in pieces, so that the parser's index of the whole file (larger
+        // than the file) is never held beside what is built from it.
+        Pieces visitor(*this);
+        const Ndm_JsonChunks::LargeRead large = Ndm_JsonChunks::ReadLarge(buf_, visitor, pieces_);
+        if (large.read) {
+            if (!large.ok) return large.error ? SyntaxError(large.error, large.error_offset) : false;
             return Finish();
         }
         if (error_code e = Ndm_JsonInput::Iterate(parser_, buf_, doc_))
