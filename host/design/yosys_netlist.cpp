@@ -157,7 +157,7 @@ void Reader::CountInstances(uint32_t top) {
     for (Module& m : modules_) m.instances = 0;
     modules_[top].instances = 1;
     for (auto it = postorder_.rbegin(); it != postorder_.rend(); ++it) {
-        const Module& m = modules_[*it];
+        Module& m = modules_[*it];
         for (const Cell& cell : m.cells)
             if (cell.sub >= 0) modules_[cell.sub].instances = Expansion::Add(modules_[cell.sub].instances, m.instances);
     }
@@ -279,12 +279,20 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
             // The module's last instance is made: its cells and connections are not needed
             // again (the networks need its nets and bits).
             if (--m.instances == 0) {
-                std::vector<Cell>().swap(m.cells);
-                std::vector<Conn>().swap(m.conns);
-                std::vector<Ndm_Dir>().swap(m.conn_dirs);
+                m.cells.clear();
+                m.conns.clear();
+                m.conn_dirs.clear();
             }
             stack.pop_back();
             continue;
+        }
+        // A module made once lets its cells and connections go as they are passed (a flat
+        // netlist's top module holds them all).
+        if (m.instances == 1 && (frame.next_cell & (Blocks<Cell>::kBlock - 1)) == 0 && frame.next_cell) {
+            const Cell& next = m.cells[frame.next_cell];
+            m.conns.DropBefore(next.first_conn);
+            m.conn_dirs.DropBefore(next.first_conn);
+            m.cells.DropBefore(frame.next_cell);
         }
         const Cell& cell = m.cells[frame.next_cell++];
         Ndm_Block* child = frame.block->CreateBlock(Ndm_Interned{cell.name});

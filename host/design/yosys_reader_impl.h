@@ -64,6 +64,58 @@ struct Cell {
     int32_t sub = -1;  // module the cell instantiates, or -1 for a leaf
 };
 
+// A list in blocks of 65,536 entries (the last one growing as a vector), whose entries never move
+// and whose blocks before an index can be given back while the rest is still read: the cells and
+// connections of a module made once are let go as its expansion passes them.
+template <class T>
+class Blocks {
+public:
+    static constexpr size_t kShift = 16, kBlock = size_t{1} << kShift;
+    size_t size() const { return size_; }
+    T& operator[](size_t i) { return blocks_[i >> kShift][i & (kBlock - 1)]; }
+    const T& operator[](size_t i) const { return blocks_[i >> kShift][i & (kBlock - 1)]; }
+    void push_back(const T& value) {
+        if (blocks_.empty() || blocks_.back().size() == kBlock) {
+            blocks_.emplace_back();
+            if (blocks_.size() > 1) blocks_.back().reserve(kBlock);
+        }
+        blocks_.back().push_back(value);
+        ++size_;
+    }
+    // Gives back the blocks wholly before entry i (which are not read again).
+    void DropBefore(size_t i) {
+        for (size_t b = 0; b < (i >> kShift) && b < blocks_.size(); ++b) std::vector<T>().swap(blocks_[b]);
+    }
+    void shrink_to_fit() {
+        if (!blocks_.empty()) blocks_.back().shrink_to_fit();
+    }
+    void clear() {
+        blocks_.clear();
+        size_ = 0;
+    }
+
+    class Iterator {
+    public:
+        Iterator(Blocks* list, size_t i) : list_(list), i_(i) {}
+        T& operator*() const { return (*list_)[i_]; }
+        Iterator& operator++() {
+            ++i_;
+            return *this;
+        }
+        bool operator!=(const Iterator& other) const { return i_ != other.i_; }
+
+    private:
+        Blocks* list_;
+        size_t i_;
+    };
+    Iterator begin() { return Iterator(this, 0); }
+    Iterator end() { return Iterator(this, size_); }
+
+private:
+    std::vector<std::vector<T>> blocks_;
+    size_t size_ = 0;
+};
+
 // What expanding one instance of a module makes, its whole subtree counted; each count stops
 // at kMany rather than wrap (a netlist can double its size at every level).
 struct Expansion {
@@ -83,9 +135,9 @@ struct Module {
     bool box = false;  // a blackbox or whitebox library cell: its instances stay leaves
     std::vector<Port> ports;
     std::vector<Net> nets;
-    std::vector<Cell> cells;
-    std::vector<Conn> conns;
-    std::vector<Ndm_Dir> conn_dirs;  // per connection: its direction, None when not given
+    Blocks<Cell> cells;
+    Blocks<Conn> conns;
+    Blocks<Ndm_Dir> conn_dirs;  // per connection: its direction, None when not given
     uint64_t instances = 0;          // how many the expansion makes: its cells go with the last
     std::vector<int32_t> bits;  // local bit ids 0..num_bits-1 once finished, constants < 0
     int64_t max_bit = -1;
