@@ -251,7 +251,7 @@ bool Reader::Read(const Outline& outline, Visitor& visitor) {
             if (SkipSpace(d, f.cursor, end) == end) {
                 if (f.left == kComma || (f.left == kOpener && end != c.close))
                     return Fail(simdjson::TAPE_ERROR, end);
-            } else if (!Run(c, f.cursor, end, visitor)) {
+            } else if (!Run(c.object, f.cursor, end, visitor)) {
                 return false;
             }
         }
@@ -300,7 +300,7 @@ bool Reader::Read(const Outline& outline, Visitor& visitor) {
     return true;
 }
 
-bool Reader::Run(const Container& c, size_t begin, size_t end, Visitor& visitor) {
+bool Reader::Run(bool object, size_t begin, size_t end, Visitor& visitor, const od::raw_json_string* key) {
     const size_t n = end - begin;
     const size_t need = n + 2 + simdjson::SIMDJSON_PADDING;
     if (need > run_room_) {
@@ -308,9 +308,9 @@ bool Reader::Run(const Container& c, size_t begin, size_t end, Visitor& visitor)
         run_.reset(new char[run_room_]);
     }
     char* run = run_.get();
-    run[0] = c.object ? '{' : '[';
+    run[0] = object ? '{' : '[';
     std::memcpy(run + 1, input_.data() + begin, n);
-    run[n + 1] = c.object ? '}' : ']';
+    run[n + 1] = object ? '}' : ']';
     std::memset(run + n + 2, 0, simdjson::SIMDJSON_PADDING);
     run_base_ = begin;
     run_size_ = n + 2;
@@ -321,10 +321,10 @@ bool Reader::Run(const Container& c, size_t begin, size_t end, Visitor& visitor)
         return Fail(e, std::min(begin + (at ? at - 1 : 0), end));
     }
     has_doc_ = true;
-    if (c.object) {
-        od::object object;
-        if (simdjson::error_code e = doc_.get_object().get(object)) return Fail(e, Offset());
-        for (auto item : object) {
+    if (object) {
+        od::object members;
+        if (simdjson::error_code e = doc_.get_object().get(members)) return Fail(e, Offset());
+        for (auto item : members) {
             od::field field;
             if (simdjson::error_code e = std::move(item).get(field)) return Fail(e, Offset());
             if (!visitor.Member(field.key(), field.value())) return false;
@@ -335,7 +335,7 @@ bool Reader::Run(const Container& c, size_t begin, size_t end, Visitor& visitor)
         for (auto item : array) {
             od::value value;
             if (simdjson::error_code e = std::move(item).get(value)) return Fail(e, Offset());
-            if (!visitor.Member(od::raw_json_string(), value)) return false;
+            if (!visitor.Member(key ? *key : od::raw_json_string(), value)) return false;
         }
     }
     if (doc_.current_location().error() != simdjson::OUT_OF_BOUNDS)
@@ -344,21 +344,10 @@ bool Reader::Run(const Container& c, size_t begin, size_t end, Visitor& visitor)
     return true;
 }
 
+// A large member taken whole: read as the one element of a run, so that the visitor gets it as
+// it gets any member (the parser treats a document's own value apart).
 bool Reader::Whole(od::raw_json_string key, const Container& c, Visitor& visitor) {
-    const char* d = input_.data();
-    const size_t n = c.close + 1 - c.open;
-    end_ = c.close + 1;
-    run_size_ = 0;
-    has_doc_ = false;
-    if (simdjson::error_code e = Ndm_JsonInput::Iterate(
-            parser_, d + c.open, n, input_.size() + simdjson::SIMDJSON_PADDING - c.open, doc_))
-        return Fail(e, c.open + std::min(Ndm_JsonInput::EarlyErrorOffset(e, d + c.open, n), n));
-    has_doc_ = true;
-    od::value value;
-    if (simdjson::error_code e = doc_.get_value().get(value)) return Fail(e, Offset());
-    // The span is one bracketed value, which the visitor may leave unread (as the reading of a
-    // run skips what its visitor does not read).
-    return visitor.Member(key, value);
+    return Run(false, c.open, c.close + 1, visitor, &key);
 }
 
 LargeRead ReadLarge(Ndm_JsonInput::Input& input, Visitor& visitor, Reader*& active) {

@@ -77,7 +77,10 @@ public:
     size_t error_offset() const { return error_offset_; }
 
 private:
-    bool Run(const Container& c, size_t begin, size_t end, Visitor& visitor);
+    // Reads the members (or elements) between begin and end, between brackets of their own; with
+    // key, each element is handed on as a member of that key.
+    bool Run(bool object, size_t begin, size_t end, Visitor& visitor,
+             const simdjson::ondemand::raw_json_string* key = nullptr);
     bool Whole(simdjson::ondemand::raw_json_string key, const Container& c, Visitor& visitor);
     bool After(const Container& parent, size_t& cursor, size_t& cut, size_t close);
     bool Fail(simdjson::error_code e, size_t offset);
