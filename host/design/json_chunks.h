@@ -21,7 +21,7 @@ namespace Ndm_JsonChunks {
 
 // Files smaller than this are read whole; pieces are about piece bytes. Tests make both small.
 struct Sizes {
-    size_t chunked_from = size_t{32} << 20;
+    size_t chunked_from = Ndm_JsonInput::kWholeBelow;
     size_t piece = size_t{1} << 20;
 };
 Sizes& GetSizes();

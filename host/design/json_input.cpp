@@ -17,12 +17,10 @@ namespace Ndm_JsonInput {
 
 namespace {
 
-// Files at least this large are mapped rather than read; those of at most kPopulateUpTo have
-// their pages read in bulk as they are mapped. Larger ones are read in pieces, in two passes that
-// each give back what they have passed: their pages come in as they are reached, so that the
-// whole file is never resident at once.
+// Files at least this large are mapped rather than read. Those read whole have their pages read
+// in bulk as they are mapped; those read in pieces, in two passes that each give back what they
+// have passed, have them come in as they are reached, so the whole file is never resident.
 constexpr size_t kMapAtLeast = 1 << 20;
-constexpr size_t kPopulateUpTo = size_t{32} << 20;
 
 struct FileCloser {
     void operator()(FILE* f) const { std::fclose(f); }
@@ -150,7 +148,7 @@ bool Input::Open(const char* path, std::string& error) {
         void* region = ::mmap(nullptr, total, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
         if (region != MAP_FAILED) {
             void* mapped = ::mmap(region, size, PROT_READ,
-                                  MAP_PRIVATE | MAP_FIXED | (size <= kPopulateUpTo ? MAP_POPULATE : 0),
+                                  MAP_PRIVATE | MAP_FIXED | (size < kWholeBelow ? MAP_POPULATE : 0),
                                   fileno(file.get()), 0);
             if (mapped != MAP_FAILED) {
                 map_ = region;

@@ -10,6 +10,10 @@
 
 namespace Ndm_JsonInput {
 
+// Files smaller than this are parsed whole (their pages read in at once when they are mapped);
+// larger ones are read in pieces (json_chunks.h), their pages coming in as they are reached.
+constexpr size_t kWholeBelow = size_t{32} << 20;
+
 // The message object of the design readers and writers (module "netlist").
 inline const Port_MsgManData& Msg() {
     static const Port_MsgManData msg = Port_MsgManData::createObject("Quillmap", "netlist", __LINE__, "1.0");

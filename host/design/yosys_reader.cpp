@@ -330,13 +330,22 @@ bool Reader::ParsePorts(od::value value, Module& m) {
     return true;
 }
 
+// The interned name of a port, cell or net of m from its key (seen: which of seen_). False for a
+// malformed key; name null, after an error, when the object is left out for its name.
+bool Reader::MemberName(Module& m, od::raw_json_string key, const char* kind, int seen, const char*& name) {
+    name = nullptr;
+    std::string_view text;
+    if (!KeyText(key, text)) return false;
+    if (!NameOk(StripEscape(text), &m, kind)) return true;
+    const char* interned = design_.Intern(StripEscape(text));
+    if (FirstOfName(seen_[seen], interned, m, kind)) name = interned;
+    return true;
+}
+
 bool Reader::PortMember(Module& m, od::raw_json_string name_key, od::value value) {
-    std::string_view name;
-    if (!KeyText(name_key, name)) return false;
-    if (!NameOk(StripEscape(name), &m, "port")) return true;
     Port port;
-    port.name = design_.Intern(StripEscape(name));
-    if (!FirstOfName(seen_[kSeenPorts], port.name, m, "port")) return true;
+    if (!MemberName(m, name_key, "port", kSeenPorts, port.name)) return false;
+    if (!port.name) return true;  // left out
     auto what = [&] { return Port_Format("port '%s' in module '%s'", port.name, m.name); };
     od::object body;
     if (error_code e = value.get_object().get(body)) return JsonError(e, what() + " must be an object");
@@ -378,12 +387,9 @@ bool Reader::ParseCells(od::value value, Module& m) {
 }
 
 bool Reader::CellMember(Module& m, od::raw_json_string name_key, od::value value) {
-    std::string_view name;
-    if (!KeyText(name_key, name)) return false;
-    if (!NameOk(StripEscape(name), &m, "cell")) return true;
     Cell cell;
-    cell.name = design_.Intern(StripEscape(name));
-    if (!FirstOfName(seen_[kSeenCells], cell.name, m, "cell")) return true;
+    if (!MemberName(m, name_key, "cell", kSeenCells, cell.name)) return false;
+    if (!cell.name) return true;  // left out
     od::object body;
     if (error_code e = value.get_object().get(body))
         return JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name));
@@ -477,12 +483,9 @@ bool Reader::ParseNets(od::value value, Module& m) {
 }
 
 bool Reader::NetMember(Module& m, od::raw_json_string name_key, od::value value) {
-    std::string_view name;
-    if (!KeyText(name_key, name)) return false;
-    if (!NameOk(StripEscape(name), &m, "net")) return true;
     Net net;
-    net.name = design_.Intern(StripEscape(name));
-    if (!FirstOfName(seen_[kSeenNets], net.name, m, "net")) return true;
+    if (!MemberName(m, name_key, "net", kSeenNets, net.name)) return false;
+    if (!net.name) return true;  // left out
     od::object body;
     if (error_code e = value.get_object().get(body))
         return JsonError(e, Port_Format("netname '%s' in module '%s' must be an object", net.name, m.name));
