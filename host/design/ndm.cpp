@@ -1,9 +1,12 @@
 #include "host/design/ndm.h"
 
 #include <algorithm>
+#include <cstdint>
 #include <cstring>
+#include <stdexcept>
 
 #include "host/design/name_pool.h"
+#include "host/design/object_pool.h"
 #include "host/design/property_store.h"
 
 namespace {
@@ -21,16 +24,16 @@ std::string FoldName(const char* name) {
     return folded;
 }
 
-template <class T>
-T* ScanExact(const Ndm_MemberList<T>& members, const char* name) {
-    for (T* m : members)
+template <class T, class List>
+T* ScanExact(const List& members, const char* name) {
+    for (auto* m : members)
         if (std::strcmp(m->GetName(), name) == 0) return m;
     return nullptr;
 }
 
-template <class T>
-T* ScanFolded(const Ndm_MemberList<T>& members, const std::string& folded) {
-    for (T* m : members) {
+template <class T, class List>
+T* ScanFolded(const List& members, const std::string& folded) {
+    for (auto* m : members) {
         const char* a = m->GetName();
         size_t i = 0;
         for (; a[i] && i < folded.size(); ++i) {
@@ -75,6 +78,15 @@ bool HasPrefix(const char* name, std::string_view prefix, bool fold) {
 }
 
 }  // namespace
+
+// The design's blocks, signals and networks, and the arena of the blocks' pin chunks. Members
+// go in reverse order: networks, signals, then blocks, each of which takes its pins along.
+struct Ndm_Objects {
+    Ndm_Arena arena;
+    Ndm_Pool<Ndm_Block> blocks;
+    Ndm_Pool<Ndm_Signal> signals;
+    Ndm_Pool<Ndm_Network> networks;
+};
 
 // Per-block hash indexes of members by exact and by case-folded interned name. Name-sorted
 // member lists (exact and folded; stored order among equal names) answer prefix queries and
@@ -126,20 +138,20 @@ public:
     }
     // The case-folded map costs an interned folded copy of every name, so it is built only
     // for the first lookup that ignores case.
-    template <class T>
-    void EnsureFolded(Ndm_Design* design, int category, const Ndm_MemberList<T>& members) {
+    template <class List>
+    void EnsureFolded(Ndm_Design* design, int category, const List& members) {
         if (folded_built[category]) return;
-        for (T* m : members) AddFolded(design, category, m->GetName(), m);
+        for (auto* m : members) AddFolded(design, category, m->GetName(), m);
         folded_built[category] = true;
     }
-    template <class T>
-    void Build(Ndm_Design* design, int category, const Ndm_MemberList<T>& members) {
+    template <class List>
+    void Build(Ndm_Design* design, int category, const List& members) {
         Drop(category);
-        for (T* m : members) Add(design, category, m->GetName(), m);
+        for (auto* m : members) Add(design, category, m->GetName(), m);
         built[category] = true;
     }
-    template <class T>
-    std::vector<void*>& Sorted(int category, bool fold, const Ndm_MemberList<T>& members) {
+    template <class List>
+    std::vector<void*>& Sorted(int category, bool fold, const List& members) {
         std::unique_ptr<std::vector<void*>>& list = sorted[category][fold ? 1 : 0];
         if (!list) {
             list = std::make_unique<std::vector<void*>>(members.begin(), members.end());
@@ -220,7 +232,7 @@ std::string Ndm_Signal::GetFullName() const {
 
 std::string Ndm_Pin::GetFullName() const {
     std::string out;
-    block_->AppendFullName(out);
+    GetBlock()->AppendFullName(out);
     if (!out.empty()) out += '.';
     out += name_;
     return out;
@@ -237,7 +249,11 @@ Ndm_Block::Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* v
       parent_(parent),
       view_(view) {}
 
-Ndm_Block::~Ndm_Block() = default;
+// Pins go first: a pin finds the design through its block.
+Ndm_Block::~Ndm_Block() {
+    for (Ndm_PinChunk* c = pins_; c; c = c->next)
+        for (uint32_t i = 0; i < c->size; ++i) c->Pins()[i].~Ndm_Pin();
+}
 
 void Ndm_Block::SetTypeName(const char* type) {
     type_ = view_->GetDesign()->Intern(type ? type : "");
@@ -256,7 +272,7 @@ Ndm_Block* Ndm_Block::CreateBlock(const char* name, unsigned int /*flags*/) {
 Ndm_Block* Ndm_Block::CreateBlock(Ndm_Interned name) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = name.name;
-    Ndm_Block* block = &design->block_pool_.emplace_back(Ndm_Token(), stored, this, view_);
+    Ndm_Block* block = design->objects_->blocks.Make(Ndm_Token(), stored, this, view_);
     block->order_ = blocks_.empty() ? 0 : blocks_.back()->order_ + 1;
     blocks_.push_back(block);
     if (index_ && index_->built[kBlocks]) index_->Add(design, kBlocks, stored, block);
@@ -271,7 +287,7 @@ Ndm_Signal* Ndm_Block::CreateSignal(const char* name) {
 Ndm_Signal* Ndm_Block::CreateSignal(Ndm_Interned name) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = name.name;
-    Ndm_Signal* signal = &design->signal_pool_.emplace_back(Ndm_Token(), stored, this);
+    Ndm_Signal* signal = design->objects_->signals.Make(Ndm_Token(), stored, this);
     signal->order_ = signals_.empty() ? 0 : signals_.back()->order_ + 1;
     signals_.push_back(signal);
     if (index_ && index_->built[kSignals]) index_->Add(design, kSignals, stored, signal);
@@ -286,16 +302,36 @@ Ndm_Pin* Ndm_Block::CreatePin(const char* name, Ndm_Dir dir) {
 Ndm_Pin* Ndm_Block::CreatePin(Ndm_Interned name, Ndm_Dir dir) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = name.name;
-    Ndm_Pin* pin = &design->pin_pool_.emplace_back(Ndm_Token(), stored, this, dir);
-    pins_.push_back(pin);
+    Ndm_PinChunk* chunk = PinChunkWithRoom(1);
+    Ndm_Pin* pin = new (chunk->Pins() + chunk->size) Ndm_Pin(Ndm_Token(), stored, dir, chunk->size);
+    ++chunk->size;
     if (index_ && index_->built[kPins]) index_->Add(design, kPins, stored, pin);
     return pin;
+}
+
+// The last chunk when it has room for that many more pins, else a new one after it: as large
+// as asked for, and at least as large as the pins so far, so that a block grown one pin at a time
+// has few chunks.
+Ndm_PinChunk* Ndm_Block::PinChunkWithRoom(size_t pins) {
+    Ndm_PinChunk* last = pins_;
+    size_t count = 0;
+    for (; last; last = last->next) {
+        count += last->size;
+        if (!last->next) break;
+    }
+    if (last && last->room - last->size >= pins) return last;
+    const size_t room = std::max<size_t>({pins, count, 4});
+    if (count + room > INT32_MAX) throw std::length_error("too many pins on one block");
+    void* at = view_->GetDesign()->objects_->arena.Allocate(sizeof(Ndm_PinChunk) + room * sizeof(Ndm_Pin));
+    auto* chunk = new (at) Ndm_PinChunk{this, nullptr, 0, static_cast<uint32_t>(room)};
+    (last ? last->next : pins_) = chunk;
+    return chunk;
 }
 
 void Ndm_Block::Reserve(size_t blocks, size_t signals, size_t pins) {
     if (blocks) blocks_.reserve(blocks_.size() + blocks);
     if (signals) signals_.reserve(signals_.size() + signals);
-    if (pins) pins_.reserve(pins_.size() + pins);
+    if (pins) PinChunkWithRoom(pins);
 }
 
 // The subtree is taken apart with a work list (hierarchies can be very deep). Its signals leave
@@ -319,10 +355,10 @@ void Ndm_Block::Release() {
             }
             signal->DeleteAllProperties();
         }
-        for (Ndm_Pin* pin : b->pins_) pin->DeleteAllProperties();
+        for (Ndm_Pin* pin : b->GetPinItr()) pin->DeleteAllProperties();
         b->blocks_.clear();
         b->signals_.clear();
-        b->pins_.clear();
+        b->pins_ = nullptr;  // the chunks stay in the arena
         b->index_.reset();
         b->DeleteAllProperties();
         b->parent_ = nullptr;
@@ -349,15 +385,14 @@ bool Ndm_Block::DeleteBlock(Ndm_Block* child) {
 }
 
 
-template <class T>
-T* Ndm_Block::Lookup(const Ndm_MemberList<T>& members, int category, const char* name,
-                     bool ignore_case) const {
+template <class T, class List>
+T* Ndm_Block::Lookup(const List& members, int category, const char* name, bool ignore_case) const {
     if (!name) return nullptr;
-    if (!ignore_case && members.size() <= kSmall) return ScanExact(members, name);
+    if (!ignore_case && members.size() <= kSmall) return ScanExact<T>(members, name);
     std::string folded;
     if (ignore_case) {
         folded = FoldName(name);
-        if (members.size() <= kSmall) return ScanFolded(members, folded);
+        if (members.size() <= kSmall) return ScanFolded<T>(members, folded);
     }
     Ndm_Design* design = view_->GetDesign();
     Ndm_MemberIndex& idx = Index();
@@ -369,19 +404,19 @@ T* Ndm_Block::Lookup(const Ndm_MemberList<T>& members, int category, const char*
 }
 
 Ndm_Block* Ndm_Block::GetBlockByName(const char* name) const {
-    return Lookup(blocks_, kBlocks, name, false);
+    return Lookup<Ndm_Block>(blocks_, kBlocks, name, false);
 }
 Ndm_Signal* Ndm_Block::GetSignalByName(const char* name) const {
-    return Lookup(signals_, kSignals, name, false);
+    return Lookup<Ndm_Signal>(signals_, kSignals, name, false);
 }
-Ndm_Pin* Ndm_Block::GetPinByName(const char* name) const { return Lookup(pins_, kPins, name, false); }
+Ndm_Pin* Ndm_Block::GetPinByName(const char* name) const { return Lookup<Ndm_Pin>(GetPinItr(), kPins, name, false); }
 Ndm_Block* Ndm_Block::GetBlockByIName(const char* name) const {
-    return Lookup(blocks_, kBlocks, name, true);
+    return Lookup<Ndm_Block>(blocks_, kBlocks, name, true);
 }
 Ndm_Signal* Ndm_Block::GetSignalByIName(const char* name) const {
-    return Lookup(signals_, kSignals, name, true);
+    return Lookup<Ndm_Signal>(signals_, kSignals, name, true);
 }
-Ndm_Pin* Ndm_Block::GetPinByIName(const char* name) const { return Lookup(pins_, kPins, name, true); }
+Ndm_Pin* Ndm_Block::GetPinByIName(const char* name) const { return Lookup<Ndm_Pin>(GetPinItr(), kPins, name, true); }
 
 void Ndm_Block::GetBlocksByName(std::string_view name, bool ignore_case,
                                 std::vector<Ndm_Block*>& out) const {
@@ -532,12 +567,12 @@ bool Ndm_Network::Prune() {
 
 Ndm_Block* Ndm_View::CreateTopBlock(const char* name) {
     if (top_ || !name) return top_;
-    top_ = &design_->block_pool_.emplace_back(Ndm_Token(), design_->Intern(name), nullptr, this);
+    top_ = design_->objects_->blocks.Make(Ndm_Token(), design_->Intern(name), nullptr, this);
     return top_;
 }
 
 Ndm_Network* Ndm_View::CreateNetwork() {
-    Ndm_Network* net = &design_->network_pool_.emplace_back(Ndm_Token(), this);
+    Ndm_Network* net = design_->objects_->networks.Make(Ndm_Token(), this);
     net->order_ = networks_.empty() ? 0 : networks_.back()->order_ + 1;
     networks_.push_back(net);
     return net;
@@ -547,7 +582,8 @@ Ndm_Design::Ndm_Design(const char* name)
     : Ndm_PropertyHolder(Ndm_ObjKind::Design),
       property_cells_(std::make_unique<Ndm_PropertyCells>()),
       names_(std::make_unique<Ndm_NamePool>()),
-      text_lists_(std::make_unique<Ndm_TextLists>()) {
+      text_lists_(std::make_unique<Ndm_TextLists>()),
+      objects_(std::make_unique<Ndm_Objects>()) {
     name_ = names_->Intern(name ? name : "");
 }
 
@@ -590,7 +626,7 @@ Ndm_Design::Stats Ndm_Design::GetStats() const {
             stack.pop_back();
             ++s.blocks;
             s.signals += b->signals_.size();
-            s.pins += b->pins_.size();
+            s.pins += b->GetPinItr().size();
             for (const Ndm_Block* c : b->blocks_) stack.push_back(c);
         }
     }

@@ -13,6 +13,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <deque>
+#include <iterator>
 #include <new>
 #include <memory>
 #include <span>
@@ -30,6 +31,7 @@ class Ndm_Pin;
 class Ndm_Network;
 class Ndm_NamePool;
 class Ndm_MemberIndex;
+struct Ndm_Objects;
 
 // A name the design has interned already (Ndm_Design::Intern): objects created with it skip
 // interning it again, which readers that intern their names once save millions of times.
@@ -138,12 +140,12 @@ private:
 
 class Ndm_Pin : public Ndm_PropertyHolder {
 public:
-    Ndm_Pin(Ndm_Token, const char* name, Ndm_Block* block, Ndm_Dir dir)
-        : Ndm_PropertyHolder(Ndm_ObjKind::Pin), dir_(dir), name_(name), block_(block) {}
+    Ndm_Pin(Ndm_Token, const char* name, Ndm_Dir dir, uint32_t slot)
+        : Ndm_PropertyHolder(Ndm_ObjKind::Pin), dir_(dir), slot_(slot), name_(name) {}
     const char* GetName() const { return name_; }
     // Owner block's full name, ".", the name (just the name on the top block).
     std::string GetFullName() const;
-    Ndm_Block* GetBlock() const { return block_; }
+    Ndm_Block* GetBlock() const;
     Ndm_Dir GetDirection() const { return dir_; }
     // Signal outside the block that the pin connects to (in the owner's parent; for a pin of
     // the top block, the port's own signal), or null.
@@ -156,10 +158,84 @@ private:
     friend class Ndm_Block;
     friend class Ndm_Design;
 
-    Ndm_Dir dir_;
+    Ndm_Dir dir_;     // these two fit in the base's tail padding
+    uint32_t slot_;   // place in its chunk, which names the block
     const char* name_;
-    Ndm_Block* block_;
     Ndm_Signal* signal_ = nullptr;
+};
+
+// A block's pins live in chunks of their own, one chunk for a block whose pin count was
+// reserved: a pin finds its block through the head of its chunk, and the block keeps no list
+// of pointers to its pins. Chunks never move; a full chunk is followed by a larger one.
+struct Ndm_PinChunk {
+    Ndm_Block* block;
+    Ndm_PinChunk* next;
+    uint32_t size, room;
+    Ndm_Pin* Pins() { return reinterpret_cast<Ndm_Pin*>(this + 1); }
+};
+static_assert(sizeof(Ndm_PinChunk) % alignof(Ndm_Pin) == 0);
+
+inline Ndm_Block* Ndm_Pin::GetBlock() const {
+    return (reinterpret_cast<const Ndm_PinChunk*>(this - slot_) - 1)->block;
+}
+
+// The pins of a block in stored order, as a range of Ndm_Pin pointers.
+class Ndm_PinRange {
+public:
+    class iterator {
+    public:
+        using iterator_category = std::forward_iterator_tag;
+        using value_type = Ndm_Pin*;
+        using difference_type = std::ptrdiff_t;
+        using pointer = Ndm_Pin* const*;
+        using reference = Ndm_Pin*;
+        iterator() = default;
+        explicit iterator(Ndm_PinChunk* chunk) : chunk_(chunk) { Settle(); }
+        Ndm_Pin* operator*() const { return chunk_->Pins() + at_; }
+        iterator& operator++() {
+            ++at_;
+            Settle();
+            return *this;
+        }
+        iterator operator++(int) {
+            iterator before = *this;
+            ++*this;
+            return before;
+        }
+        bool operator==(const iterator&) const = default;
+
+    private:
+        void Settle() {
+            while (chunk_ && at_ == chunk_->size) {
+                chunk_ = chunk_->next;
+                at_ = 0;
+            }
+        }
+        Ndm_PinChunk* chunk_ = nullptr;
+        uint32_t at_ = 0;
+    };
+
+    explicit Ndm_PinRange(Ndm_PinChunk* first) : first_(first) {}
+    iterator begin() const { return iterator(first_); }
+    iterator end() const { return iterator(); }
+    size_t size() const {
+        size_t n = 0;
+        for (const Ndm_PinChunk* c = first_; c; c = c->next) n += c->size;
+        return n;
+    }
+    bool empty() const { return begin() == end(); }
+    // The pin at place i in stored order (i < size()).
+    Ndm_Pin* operator[](size_t i) const {
+        Ndm_PinChunk* c = first_;
+        while (i >= c->size) {
+            i -= c->size;
+            c = c->next;
+        }
+        return c->Pins() + i;
+    }
+
+private:
+    Ndm_PinChunk* first_;
 };
 
 class Ndm_Block : public Ndm_PropertyHolder {
@@ -185,8 +261,8 @@ public:
     std::span<Ndm_Block* const> GetBlockItr() const { return blocks_; }
     int GetNumSignals() const { return static_cast<int>(signals_.size()); }
     std::span<Ndm_Signal* const> GetSignalItr() const { return signals_; }
-    int GetNumPins() const { return static_cast<int>(pins_.size()); }
-    std::span<Ndm_Pin* const> GetPinItr() const { return pins_; }
+    int GetNumPins() const { return static_cast<int>(GetPinItr().size()); }
+    Ndm_PinRange GetPinItr() const { return Ndm_PinRange(pins_); }
 
     // Appends a child block; flags are reserved (pass 0). Null when name is null.
     Ndm_Block* CreateBlock(const char* name, unsigned int flags = 0);
@@ -231,9 +307,9 @@ private:
     friend class Ndm_View;
     friend class Ndm_Design;
     Ndm_MemberIndex& Index() const;
-    template <class T>
-    T* Lookup(const Ndm_MemberList<T>& members, int category, const char* name,
-              bool ignore_case) const;
+    template <class T, class List>
+    T* Lookup(const List& members, int category, const char* name, bool ignore_case) const;
+    Ndm_PinChunk* PinChunkWithRoom(size_t pins);
     template <class T>
     void ByPrefix(const Ndm_MemberList<T>& members, int category, std::string_view prefix,
                   bool ignore_case, std::vector<T*>& out) const;
@@ -247,7 +323,7 @@ private:
     Ndm_View* view_;
     Ndm_MemberList<Ndm_Block> blocks_;
     Ndm_MemberList<Ndm_Signal> signals_;
-    Ndm_MemberList<Ndm_Pin> pins_;
+    Ndm_PinChunk* pins_ = nullptr;  // in the design's arena
     mutable std::unique_ptr<Ndm_MemberIndex> index_;
 };
 
@@ -371,8 +447,7 @@ private:
     std::string source_stamp_;
     std::deque<Ndm_View> view_pool_;
     std::vector<Ndm_View*> views_;
-    std::deque<Ndm_Block> block_pool_;
-    std::deque<Ndm_Signal> signal_pool_;
-    std::deque<Ndm_Pin> pin_pool_;
-    std::deque<Ndm_Network> network_pool_;
+    // Blocks, signals, networks and the blocks' pin chunks; declared after the views, which
+    // must outlive them.
+    std::unique_ptr<Ndm_Objects> objects_;
 };

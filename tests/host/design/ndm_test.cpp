@@ -34,9 +34,12 @@ void Populate(Ndm_Block* b, int n) {
 }
 
 template <class T>
-int IndexOf(std::span<T* const> items, const T* item) {
-    for (size_t i = 0; i < items.size(); ++i)
-        if (items[i] == item) return static_cast<int>(i);
+int IndexOf(const auto& items, const T* item) {
+    int i = 0;
+    for (const T* m : items) {
+        if (m == item) return i;
+        ++i;
+    }
     return -1;
 }
 
