@@ -79,12 +79,12 @@ bool HasPrefix(const char* name, std::string_view prefix, bool fold) {
 
 }  // namespace
 
-// The design's blocks, signals and networks, and the arena of the blocks' pin chunks. Members
-// go in reverse order: networks, signals, then blocks, each of which takes its pins along.
+// The design's blocks and networks, and the arena of the blocks' chunks of signals and pins.
+// Members go in reverse order: networks, then blocks, each of which takes its signals and pins
+// along.
 struct Ndm_Objects {
     Ndm_Arena arena;
     Ndm_Pool<Ndm_Block> blocks;
-    Ndm_Pool<Ndm_Signal> signals;
     Ndm_Pool<Ndm_Network> networks;
 };
 
@@ -224,7 +224,7 @@ std::string Ndm_Block::GetFullName() const {
 
 std::string Ndm_Signal::GetFullName() const {
     std::string out;
-    block_->AppendFullName(out);
+    GetBlock()->AppendFullName(out);
     if (!out.empty()) out += '/';
     out += name_;
     return out;
@@ -249,10 +249,25 @@ Ndm_Block::Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* v
       parent_(parent),
       view_(view) {}
 
-// Pins go first: a pin finds the design through its block.
+namespace {
+template <class T>
+void DestroyChunks(Ndm_Chunk<T>* first) {
+    for (Ndm_Chunk<T>* c = first; c; c = c->next)
+        for (uint32_t i = 0; i < c->size; ++i) c->Items()[i].~T();
+}
+}  // namespace
+
+// Signals and pins go first: they find the design through their block.
 Ndm_Block::~Ndm_Block() {
-    for (Ndm_PinChunk* c = pins_; c; c = c->next)
-        for (uint32_t i = 0; i < c->size; ++i) c->Pins()[i].~Ndm_Pin();
+    DestroyChunks(signals_);
+    DestroyChunks(pins_);
+}
+
+uint32_t Ndm_Signal::GetOrder() const {
+    const Ndm_Chunk<Ndm_Signal>* mine = Ndm_Chunk<Ndm_Signal>::Of(this, slot_);
+    uint32_t order = slot_;
+    for (const Ndm_Chunk<Ndm_Signal>* c = mine->block->signals_; c && c != mine; c = c->next) order += c->size;
+    return order;
 }
 
 void Ndm_Block::SetTypeName(const char* type) {
@@ -287,9 +302,9 @@ Ndm_Signal* Ndm_Block::CreateSignal(const char* name) {
 Ndm_Signal* Ndm_Block::CreateSignal(Ndm_Interned name) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = name.name;
-    Ndm_Signal* signal = design->objects_->signals.Make(Ndm_Token(), stored, this);
-    signal->order_ = signals_.empty() ? 0 : signals_.back()->order_ + 1;
-    signals_.push_back(signal);
+    Ndm_Chunk<Ndm_Signal>* chunk = ChunkWithRoom(signals_, 1);
+    Ndm_Signal* signal = new (chunk->Items() + chunk->size) Ndm_Signal(Ndm_Token(), stored, chunk->size);
+    ++chunk->size;
     if (index_ && index_->built[kSignals]) index_->Add(design, kSignals, stored, signal);
     return signal;
 }
@@ -302,36 +317,37 @@ Ndm_Pin* Ndm_Block::CreatePin(const char* name, Ndm_Dir dir) {
 Ndm_Pin* Ndm_Block::CreatePin(Ndm_Interned name, Ndm_Dir dir) {
     Ndm_Design* design = view_->GetDesign();
     const char* stored = name.name;
-    Ndm_PinChunk* chunk = PinChunkWithRoom(1);
-    Ndm_Pin* pin = new (chunk->Pins() + chunk->size) Ndm_Pin(Ndm_Token(), stored, dir, chunk->size);
+    Ndm_Chunk<Ndm_Pin>* chunk = ChunkWithRoom(pins_, 1);
+    Ndm_Pin* pin = new (chunk->Items() + chunk->size) Ndm_Pin(Ndm_Token(), stored, dir, chunk->size);
     ++chunk->size;
     if (index_ && index_->built[kPins]) index_->Add(design, kPins, stored, pin);
     return pin;
 }
 
-// The last chunk when it has room for that many more pins, else a new one after it: as large
-// as asked for, and at least as large as the pins so far, so that a block grown one pin at a time
-// has few chunks.
-Ndm_PinChunk* Ndm_Block::PinChunkWithRoom(size_t pins) {
-    Ndm_PinChunk* last = pins_;
+// The last chunk of a list when it has room for that many more members, else a new one after
+// it: as large as asked for, and at least as large as the members so far, so that a block grown
+// one member at a time has few chunks.
+template <class T>
+Ndm_Chunk<T>* Ndm_Block::ChunkWithRoom(Ndm_Chunk<T>*& first, size_t more) {
+    Ndm_Chunk<T>* last = first;
     size_t count = 0;
     for (; last; last = last->next) {
         count += last->size;
         if (!last->next) break;
     }
-    if (last && last->room - last->size >= pins) return last;
-    const size_t room = std::max<size_t>({pins, count, 4});
-    if (count + room > INT32_MAX) throw std::length_error("too many pins on one block");
-    void* at = view_->GetDesign()->objects_->arena.Allocate(sizeof(Ndm_PinChunk) + room * sizeof(Ndm_Pin));
-    auto* chunk = new (at) Ndm_PinChunk{this, nullptr, 0, static_cast<uint32_t>(room)};
-    (last ? last->next : pins_) = chunk;
+    if (last && last->room - last->size >= more) return last;
+    const size_t room = std::max<size_t>({more, count, 4});
+    if (count + room > INT32_MAX) throw std::length_error("too many members in one block");
+    void* at = view_->GetDesign()->objects_->arena.Allocate(sizeof(Ndm_Chunk<T>) + room * sizeof(T));
+    auto* chunk = new (at) Ndm_Chunk<T>{this, nullptr, 0, static_cast<uint32_t>(room)};
+    (last ? last->next : first) = chunk;
     return chunk;
 }
 
 void Ndm_Block::Reserve(size_t blocks, size_t signals, size_t pins) {
     if (blocks) blocks_.reserve(blocks_.size() + blocks);
-    if (signals) signals_.reserve(signals_.size() + signals);
-    if (pins) PinChunkWithRoom(pins);
+    if (signals) ChunkWithRoom(signals_, signals);
+    if (pins) ChunkWithRoom(pins_, pins);
 }
 
 // The subtree is taken apart with a work list (hierarchies can be very deep). Its signals leave
@@ -345,7 +361,7 @@ void Ndm_Block::Release() {
         Ndm_Block* b = work.back();
         work.pop_back();
         work.insert(work.end(), b->blocks_.begin(), b->blocks_.end());
-        for (Ndm_Signal* signal : b->signals_) {
+        for (Ndm_Signal* signal : b->GetSignalItr()) {
             if (Ndm_Network* net = signal->network_) {
                 if (!seen.Find(net)) {
                     seen.InsertIfAbsent(net, net);
@@ -357,8 +373,8 @@ void Ndm_Block::Release() {
         }
         for (Ndm_Pin* pin : b->GetPinItr()) pin->DeleteAllProperties();
         b->blocks_.clear();
-        b->signals_.clear();
-        b->pins_ = nullptr;  // the chunks stay in the arena
+        b->signals_ = nullptr;  // the chunks stay in the arena
+        b->pins_ = nullptr;
         b->index_.reset();
         b->DeleteAllProperties();
         b->parent_ = nullptr;
@@ -407,14 +423,14 @@ Ndm_Block* Ndm_Block::GetBlockByName(const char* name) const {
     return Lookup<Ndm_Block>(blocks_, kBlocks, name, false);
 }
 Ndm_Signal* Ndm_Block::GetSignalByName(const char* name) const {
-    return Lookup<Ndm_Signal>(signals_, kSignals, name, false);
+    return Lookup<Ndm_Signal>(GetSignalItr(), kSignals, name, false);
 }
 Ndm_Pin* Ndm_Block::GetPinByName(const char* name) const { return Lookup<Ndm_Pin>(GetPinItr(), kPins, name, false); }
 Ndm_Block* Ndm_Block::GetBlockByIName(const char* name) const {
     return Lookup<Ndm_Block>(blocks_, kBlocks, name, true);
 }
 Ndm_Signal* Ndm_Block::GetSignalByIName(const char* name) const {
-    return Lookup<Ndm_Signal>(signals_, kSignals, name, true);
+    return Lookup<Ndm_Signal>(GetSignalItr(), kSignals, name, true);
 }
 Ndm_Pin* Ndm_Block::GetPinByIName(const char* name) const { return Lookup<Ndm_Pin>(GetPinItr(), kPins, name, true); }
 
@@ -452,8 +468,8 @@ void Ndm_Block::GetBlocksByName(std::string_view name, bool ignore_case,
         out.push_back(static_cast<Ndm_Block*>(*at));
 }
 
-template <class T>
-void Ndm_Block::ByPrefix(const Ndm_MemberList<T>& members, int category, std::string_view prefix,
+template <class T, class List>
+void Ndm_Block::ByPrefix(const List& members, int category, std::string_view prefix,
                          bool ignore_case, std::vector<T*>& out) const {
     if (prefix.empty()) {
         out.insert(out.end(), members.begin(), members.end());
@@ -481,12 +497,12 @@ void Ndm_Block::ByPrefix(const Ndm_MemberList<T>& members, int category, std::st
 
 void Ndm_Block::GetBlocksByPrefix(std::string_view prefix, bool ignore_case,
                                   std::vector<Ndm_Block*>& out) const {
-    ByPrefix(blocks_, kBlocks, prefix, ignore_case, out);
+    ByPrefix<Ndm_Block>(blocks_, kBlocks, prefix, ignore_case, out);
 }
 
 void Ndm_Block::GetSignalsByPrefix(std::string_view prefix, bool ignore_case,
                                    std::vector<Ndm_Signal*>& out) const {
-    ByPrefix(signals_, kSignals, prefix, ignore_case, out);
+    ByPrefix<Ndm_Signal>(GetSignalItr(), kSignals, prefix, ignore_case, out);
 }
 
 void Ndm_Block::GetBlockNameLengths(std::vector<uint32_t>& out) const {
@@ -625,7 +641,7 @@ Ndm_Design::Stats Ndm_Design::GetStats() const {
             const Ndm_Block* b = stack.back();
             stack.pop_back();
             ++s.blocks;
-            s.signals += b->signals_.size();
+            s.signals += b->GetSignalItr().size();
             s.pins += b->GetPinItr().size();
             for (const Ndm_Block* c : b->blocks_) stack.push_back(c);
         }

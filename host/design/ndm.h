@@ -113,14 +113,14 @@ bool Ndm_DirFromName(std::string_view name, Ndm_Dir& dir);
 
 class Ndm_Signal : public Ndm_PropertyHolder {
 public:
-    Ndm_Signal(Ndm_Token, const char* name, Ndm_Block* block)
-        : Ndm_PropertyHolder(Ndm_ObjKind::Signal), name_(name), block_(block) {}
+    Ndm_Signal(Ndm_Token, const char* name, uint32_t slot)
+        : Ndm_PropertyHolder(Ndm_ObjKind::Signal), slot_(slot), name_(name) {}
     const char* GetName() const { return name_; }
     // Stored-order key among the signals of the block: a later signal has a larger key.
-    uint32_t GetOrder() const { return order_; }
+    uint32_t GetOrder() const;
     // Owner block's full name, "/", the name (just the name in the top block).
     std::string GetFullName() const;
-    Ndm_Block* GetBlock() const { return block_; }
+    Ndm_Block* GetBlock() const;
     // Network the signal belongs to, or null.
     Ndm_Network* GetNetwork() const { return network_; }
     // Next signal of the same network, in network order.
@@ -131,9 +131,8 @@ private:
     friend class Ndm_Network;
     friend class Ndm_Design;
 
-    uint32_t order_ = 0;  // fits in the base's tail padding
+    uint32_t slot_;  // place in its chunk, which names the block; fits in the base's tail padding
     const char* name_;
-    Ndm_Block* block_;
     Ndm_Network* network_ = nullptr;
     Ndm_Signal* next_in_network_ = nullptr;
 };
@@ -158,40 +157,41 @@ private:
     friend class Ndm_Block;
     friend class Ndm_Design;
 
-    Ndm_Dir dir_;     // these two fit in the base's tail padding
-    uint32_t slot_;   // place in its chunk, which names the block
+    Ndm_Dir dir_;    // these two fit in the base's tail padding
+    uint32_t slot_;  // place in its chunk, which names the block
     const char* name_;
     Ndm_Signal* signal_ = nullptr;
 };
 
-// A block's pins live in chunks of their own, one chunk for a block whose pin count was
-// reserved: a pin finds its block through the head of its chunk, and the block keeps no list
-// of pointers to its pins. Chunks never move; a full chunk is followed by a larger one.
-struct Ndm_PinChunk {
+// A block's signals and pins live in chunks of their own, one chunk of each kind for a block
+// whose counts were reserved: a member finds its block through the head of its chunk, and the
+// block keeps no list of pointers. Chunks never move; a full chunk is followed by a larger one.
+template <class T>
+struct Ndm_Chunk {
     Ndm_Block* block;
-    Ndm_PinChunk* next;
+    Ndm_Chunk* next;
     uint32_t size, room;
-    Ndm_Pin* Pins() { return reinterpret_cast<Ndm_Pin*>(this + 1); }
+    T* Items() { return reinterpret_cast<T*>(this + 1); }
+    // The chunk of a member that sits at place slot in it.
+    static const Ndm_Chunk* Of(const T* member, uint32_t slot) {
+        return reinterpret_cast<const Ndm_Chunk*>(member - slot) - 1;
+    }
 };
-static_assert(sizeof(Ndm_PinChunk) % alignof(Ndm_Pin) == 0);
 
-inline Ndm_Block* Ndm_Pin::GetBlock() const {
-    return (reinterpret_cast<const Ndm_PinChunk*>(this - slot_) - 1)->block;
-}
-
-// The pins of a block in stored order, as a range of Ndm_Pin pointers.
-class Ndm_PinRange {
+// The signals or pins of a block in stored order, as a range of pointers.
+template <class T>
+class Ndm_ChunkRange {
 public:
     class iterator {
     public:
         using iterator_category = std::forward_iterator_tag;
-        using value_type = Ndm_Pin*;
+        using value_type = T*;
         using difference_type = std::ptrdiff_t;
-        using pointer = Ndm_Pin* const*;
-        using reference = Ndm_Pin*;
+        using pointer = T* const*;
+        using reference = T*;
         iterator() = default;
-        explicit iterator(Ndm_PinChunk* chunk) : chunk_(chunk) { Settle(); }
-        Ndm_Pin* operator*() const { return chunk_->Pins() + at_; }
+        explicit iterator(Ndm_Chunk<T>* chunk) : chunk_(chunk) { Settle(); }
+        T* operator*() const { return chunk_->Items() + at_; }
         iterator& operator++() {
             ++at_;
             Settle();
@@ -211,32 +211,39 @@ public:
                 at_ = 0;
             }
         }
-        Ndm_PinChunk* chunk_ = nullptr;
+        Ndm_Chunk<T>* chunk_ = nullptr;
         uint32_t at_ = 0;
     };
 
-    explicit Ndm_PinRange(Ndm_PinChunk* first) : first_(first) {}
+    explicit Ndm_ChunkRange(Ndm_Chunk<T>* first) : first_(first) {}
     iterator begin() const { return iterator(first_); }
     iterator end() const { return iterator(); }
     size_t size() const {
         size_t n = 0;
-        for (const Ndm_PinChunk* c = first_; c; c = c->next) n += c->size;
+        for (const Ndm_Chunk<T>* c = first_; c; c = c->next) n += c->size;
         return n;
     }
     bool empty() const { return begin() == end(); }
-    // The pin at place i in stored order (i < size()).
-    Ndm_Pin* operator[](size_t i) const {
-        Ndm_PinChunk* c = first_;
+    // The member at place i in stored order (i < size()); one step for a block whose count was
+    // reserved.
+    T* operator[](size_t i) const {
+        Ndm_Chunk<T>* c = first_;
         while (i >= c->size) {
             i -= c->size;
             c = c->next;
         }
-        return c->Pins() + i;
+        return c->Items() + i;
     }
 
 private:
-    Ndm_PinChunk* first_;
+    Ndm_Chunk<T>* first_;
 };
+
+using Ndm_SignalRange = Ndm_ChunkRange<Ndm_Signal>;
+using Ndm_PinRange = Ndm_ChunkRange<Ndm_Pin>;
+
+inline Ndm_Block* Ndm_Signal::GetBlock() const { return Ndm_Chunk<Ndm_Signal>::Of(this, slot_)->block; }
+inline Ndm_Block* Ndm_Pin::GetBlock() const { return Ndm_Chunk<Ndm_Pin>::Of(this, slot_)->block; }
 
 class Ndm_Block : public Ndm_PropertyHolder {
 public:
@@ -259,8 +266,8 @@ public:
 
     int GetNumBlocks() const { return static_cast<int>(blocks_.size()); }
     std::span<Ndm_Block* const> GetBlockItr() const { return blocks_; }
-    int GetNumSignals() const { return static_cast<int>(signals_.size()); }
-    std::span<Ndm_Signal* const> GetSignalItr() const { return signals_; }
+    int GetNumSignals() const { return static_cast<int>(GetSignalItr().size()); }
+    Ndm_SignalRange GetSignalItr() const { return Ndm_SignalRange(signals_); }
     int GetNumPins() const { return static_cast<int>(GetPinItr().size()); }
     Ndm_PinRange GetPinItr() const { return Ndm_PinRange(pins_); }
 
@@ -304,14 +311,16 @@ public:
     ~Ndm_Block();
 
 private:
+    friend class Ndm_Signal;
     friend class Ndm_View;
     friend class Ndm_Design;
     Ndm_MemberIndex& Index() const;
     template <class T, class List>
     T* Lookup(const List& members, int category, const char* name, bool ignore_case) const;
-    Ndm_PinChunk* PinChunkWithRoom(size_t pins);
     template <class T>
-    void ByPrefix(const Ndm_MemberList<T>& members, int category, std::string_view prefix,
+    Ndm_Chunk<T>* ChunkWithRoom(Ndm_Chunk<T>*& first, size_t more);
+    template <class T, class List>
+    void ByPrefix(const List& members, int category, std::string_view prefix,
                   bool ignore_case, std::vector<T*>& out) const;
     void Release();  // drops members and properties of a deleted subtree
 
@@ -322,8 +331,9 @@ private:
     Ndm_Block* parent_;
     Ndm_View* view_;
     Ndm_MemberList<Ndm_Block> blocks_;
-    Ndm_MemberList<Ndm_Signal> signals_;
-    Ndm_PinChunk* pins_ = nullptr;  // in the design's arena
+    // In the design's arena.
+    Ndm_Chunk<Ndm_Signal>* signals_ = nullptr;
+    Ndm_Chunk<Ndm_Pin>* pins_ = nullptr;
     mutable std::unique_ptr<Ndm_MemberIndex> index_;
 };
 
@@ -447,7 +457,7 @@ private:
     std::string source_stamp_;
     std::deque<Ndm_View> view_pool_;
     std::vector<Ndm_View*> views_;
-    // Blocks, signals, networks and the blocks' pin chunks; declared after the views, which
-    // must outlive them.
+    // Blocks, networks and the blocks' chunks of signals and pins; declared after the views,
+    // which must outlive them.
     std::unique_ptr<Ndm_Objects> objects_;
 };

@@ -223,21 +223,22 @@ void ForEachMatchingSignal(Ndm_Block* root, const char* pattern, bool fold, Keep
         if (!full.empty()) full += '/';
         const size_t base_len = full.size();
         std::string_view rem;
-        std::span<Ndm_Signal* const> signals;
-        switch (Relate(full, lit, fold, &rem)) {
-            case Reach::None: return true;
-            case Reach::All: signals = b->GetSignalItr(); break;
-            case Reach::Some:
-                picked.clear();
-                b->GetSignalsByPrefix(rem, fold, picked);
-                signals = picked;
-                break;
-        }
-        for (Ndm_Signal* sig : signals) {
-            if (!keep(sig)) continue;
+        auto visit = [&](Ndm_Signal* sig) {
+            if (!keep(sig)) return;
             full.resize(base_len);
             full += sig->GetName();
             if (Matches(full.c_str(), pattern, fold)) take(sig, std::as_const(full));
+        };
+        switch (Relate(full, lit, fold, &rem)) {
+            case Reach::None: return true;
+            case Reach::All:
+                for (Ndm_Signal* sig : b->GetSignalItr()) visit(sig);
+                break;
+            case Reach::Some:
+                picked.clear();
+                b->GetSignalsByPrefix(rem, fold, picked);
+                for (Ndm_Signal* sig : picked) visit(sig);
+                break;
         }
         return true;
     });

@@ -322,7 +322,7 @@ bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
         child->SetTypeName(Ndm_Interned{cell.type});
     else
         child->SetTypeName("");
-    std::span<Ndm_Signal* const> signals = child->GetParent()->GetSignalItr();
+    const Ndm_SignalRange signals = child->GetParent()->GetSignalItr();
     Module* sub = cell.sub >= 0 ? &modules_[cell.sub] : nullptr;
     uint32_t num_pins = 0;
     for (uint32_t k = 0; k < cell.num_conns; ++k) num_pins += m.conns[cell.first_conn + k].bits.count;
@@ -349,7 +349,7 @@ bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
 // Pins of the top block: one per port bit, on the port's own netname when it has one.
 void Reader::TopPins(Ndm_Block* block, uint32_t module) {
     Module& m = modules_[module];
-    std::span<Ndm_Signal* const> signals = block->GetSignalItr();
+    const Ndm_SignalRange signals = block->GetSignalItr();
     Ndm_PtrMap net_index;
     for (size_t n = 0; n < m.nets.size(); ++n) net_index.InsertIfAbsent(m.nets[n].name, AsValue(n));
     size_t num_pins = 0;
@@ -388,7 +388,7 @@ void Reader::Networks(Ndm_View* view) {
     for (const Instance& inst : instances_) {
         Module& m = modules_[inst.module];
         if (m.signal_order.size() != m.num_signals) SignalOrder(m);
-        std::span<Ndm_Signal* const> signals = inst.block->GetSignalItr();
+        const Ndm_SignalRange signals = inst.block->GetSignalItr();
         const bool top = &inst == &instances_.front() && !m.pad_only.empty();
         if (top) {
             auto root_of = [&](uint32_t s) { return Find(inst.base + static_cast<uint32_t>(m.signal_bit[s])); };
