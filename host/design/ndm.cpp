@@ -542,11 +542,12 @@ std::string Ndm_Network::GetFullName() const { return top_ ? top_->GetFullName()
 void Ndm_Network::AddSignal(Ndm_Signal* signal) {
     if (!signal || signal->network_) return;
     signal->network_ = this;
-    signal->next_in_network_ = nullptr;
-    if (last_)
+    if (last_) {
+        signal->next_in_network_ = last_->next_in_network_;
         last_->next_in_network_ = signal;
-    else
-        first_ = signal;
+    } else {
+        signal->next_in_network_ = signal;
+    }
     last_ = signal;
     ++count_;
     if (!top_ || signal->GetBlock()->GetDepth() < top_->GetBlock()->GetDepth()) {
@@ -556,12 +557,13 @@ void Ndm_Network::AddSignal(Ndm_Signal* signal) {
 }
 
 bool Ndm_Network::Prune() {
+    Ndm_Signal* first = nullptr;
     Ndm_Signal* prev = nullptr;
     count_ = 0;
-    for (Ndm_Signal* s = first_; s;) {
-        Ndm_Signal* next = s->next_in_network_;
+    for (Ndm_Signal* s = GetFirstSignal(); s;) {
+        Ndm_Signal* next = s == last_ ? nullptr : s->next_in_network_;
         if (s->network_ == this) {
-            (prev ? prev->next_in_network_ : first_) = s;
+            (prev ? prev->next_in_network_ : first) = s;
             prev = s;
             ++count_;
         } else {
@@ -569,12 +571,12 @@ bool Ndm_Network::Prune() {
         }
         s = next;
     }
-    (prev ? prev->next_in_network_ : first_) = nullptr;
+    if (prev) prev->next_in_network_ = first;
     last_ = prev;
     if (top_ && top_->network_ == this) return true;
     top_ = nullptr;
     name_ = nullptr;
-    for (Ndm_Signal* s = first_; s; s = s->next_in_network_)
+    for (Ndm_Signal* s = GetFirstSignal(); s; s = s->GetNextInNetwork())
         if (!top_ || s->GetBlock()->GetDepth() < top_->GetBlock()->GetDepth()) top_ = s;
     return top_ != nullptr;
 }

@@ -124,7 +124,7 @@ public:
     // Network the signal belongs to, or null.
     Ndm_Network* GetNetwork() const { return network_; }
     // Next signal of the same network, in network order.
-    Ndm_Signal* GetNextInNetwork() const { return next_in_network_; }
+    Ndm_Signal* GetNextInNetwork() const;
 
 private:
     friend class Ndm_Block;
@@ -134,7 +134,7 @@ private:
     uint32_t slot_;  // place in its chunk, which names the block; fits in the base's tail padding
     const char* name_;
     Ndm_Network* network_ = nullptr;
-    Ndm_Signal* next_in_network_ = nullptr;
+    Ndm_Signal* next_in_network_ = nullptr;  // the network's signals make a ring
 };
 
 class Ndm_Pin : public Ndm_PropertyHolder {
@@ -352,7 +352,7 @@ public:
     // Creation-order key among the networks of the view: a later network has a larger key.
     uint32_t GetOrder() const { return order_; }
     // Signals of the network in the order they were added.
-    Ndm_Signal* GetFirstSignal() const { return first_; }
+    Ndm_Signal* GetFirstSignal() const { return last_ ? last_->next_in_network_ : nullptr; }
     int GetNumSignals() const { return count_; }
     // Adds a signal (not yet in a network); a signal higher in the hierarchy than the
     // current top one becomes the top signal and renames the network.
@@ -360,6 +360,7 @@ public:
     Ndm_View* GetView() const { return view_; }
 
 private:
+    friend class Ndm_Signal;
     friend class Ndm_View;
     friend class Ndm_Block;
     // Drops the signals whose network was cleared (a deleted subtree's) from the member list
@@ -370,10 +371,13 @@ private:
     Ndm_View* view_;
     mutable const char* name_ = nullptr;  // interned full name of top_, made on request
     Ndm_Signal* top_ = nullptr;
-    Ndm_Signal* first_ = nullptr;
     Ndm_Signal* last_ = nullptr;
     int count_ = 0;
 };
+
+inline Ndm_Signal* Ndm_Signal::GetNextInNetwork() const {
+    return network_ && this != network_->last_ ? next_in_network_ : nullptr;
+}
 
 class Ndm_View : public Ndm_PropertyHolder {
 public:
