@@ -1,6 +1,8 @@
 #include "host/design/name_pool.h"
 
+#include <cstdint>
 #include <cstring>
+#include <new>
 
 namespace {
 constexpr size_t kChunk = 1 << 20;
@@ -34,16 +36,33 @@ uint64_t Ndm_NamePool::Hash(std::string_view text) {
 }
 
 Ndm_NamePool::Ndm_NamePool() : slots_(1024) {}
+Ndm_NamePool::~Ndm_NamePool() = default;
+
+namespace {
+constexpr uint64_t kAddressMask = (uint64_t{1} << 48) - 1;
+constexpr unsigned char kLong = 255;
+const char* AddressOf(uint64_t slot) { return reinterpret_cast<const char*>(static_cast<uintptr_t>(slot & kAddressMask)); }
+uint64_t TagOf(uint64_t hash) { return hash >> 48 << 48; }
+}  // namespace
+
+size_t Ndm_NamePool::StoredLength(const char* stored) {
+    const auto mark = static_cast<unsigned char>(stored[-1]);
+    if (mark != kLong) return mark;
+    uint64_t size;
+    std::memcpy(&size, stored - 9, 8);
+    return static_cast<size_t>(size);
+}
 
 const char* Ndm_NamePool::Find(std::string_view text) const {
-    uint64_t h = Hash(text);
-    size_t mask = slots_.size() - 1;
+    const uint64_t h = Hash(text), tag = TagOf(h);
+    const size_t mask = slots_.size() - 1;
     for (size_t i = h & mask;; i = (i + 1) & mask) {
-        const Slot& s = slots_[i];
-        if (!s.text) return nullptr;
-        if (s.hash == static_cast<uint32_t>(h) && s.size == text.size() &&
-            (text.empty() || std::memcmp(s.text, text.data(), text.size()) == 0))
-            return s.text;
+        const uint64_t slot = slots_[i];
+        if (!slot) return nullptr;
+        if ((slot & ~kAddressMask) != tag) continue;
+        const char* s = AddressOf(slot);
+        if (StoredLength(s) == text.size() && (text.empty() || std::memcmp(s, text.data(), text.size()) == 0))
+            return s;
     }
 }
 
@@ -65,54 +84,76 @@ const char* Ndm_NamePool::Intern(std::string_view text) {
 }
 
 const char* Ndm_NamePool::Lookup(std::string_view text) {
-    uint64_t h = Hash(text);
-    size_t mask = slots_.size() - 1;
+    const uint64_t h = Hash(text), tag = TagOf(h);
+    const size_t mask = slots_.size() - 1;
     size_t i = h & mask;
     for (;; i = (i + 1) & mask) {
-        Slot& s = slots_[i];
-        if (!s.text) break;
-        if (s.hash == static_cast<uint32_t>(h) && s.size == text.size() &&
-            (text.empty() || std::memcmp(s.text, text.data(), text.size()) == 0))
-            return s.text;
+        const uint64_t slot = slots_[i];
+        if (!slot) break;
+        if ((slot & ~kAddressMask) != tag) continue;
+        const char* s = AddressOf(slot);
+        if (StoredLength(s) == text.size() && (text.empty() || std::memcmp(s, text.data(), text.size()) == 0))
+            return s;
     }
     const char* stored = Store(text);
-    slots_[i] = Slot{stored, static_cast<uint32_t>(h), static_cast<uint32_t>(text.size())};
+    slots_[i] = tag | reinterpret_cast<uintptr_t>(stored);
     if (++used_ * 2 > slots_.size()) Grow();
     return stored;
 }
 
 char* Ndm_NamePool::Keep(size_t size) {
-    chunks_.emplace_back(new char[size ? size : 1]);  // Store fills its chunk through cursor_
+    kept_.emplace_back(new char[size ? size : 1]);
     bytes_ += size;
-    return chunks_.back().get();
+    return kept_.back().get();
 }
 
 const char* Ndm_NamePool::Store(std::string_view text) {
-    size_t need = text.size() + 1;
-    if (need > left_) {
-        size_t size = need > kChunk / 4 ? need : kChunk;
-        chunks_.emplace_back(new char[size]);
-        cursor_ = chunks_.back().get();
-        left_ = size;
+    const bool long_text = text.size() >= kLong;
+    const size_t head = long_text ? 10 : 1, need = head + text.size() + 1;
+    Chunk* chunk = chunks_.empty() ? nullptr : &chunks_[open_];
+    if (!chunk || need > kChunk - chunk->used) {
+        const bool alone = need > kChunk / 4;  // a text of its own chunk leaves the open one open
+        const size_t size = alone ? need : kChunk;
+        std::unique_ptr<char[]> bytes(new char[size]);
+        // Addresses are kept in 48 bits, as every 64-bit system gives them to programs.
+        if ((reinterpret_cast<uintptr_t>(bytes.get()) + size) >> kAddressBits) throw std::bad_alloc();
+        chunks_.push_back(Chunk{std::move(bytes), 0});
+        if (!alone || chunks_.size() == 1) open_ = chunks_.size() - 1;
+        chunk = &chunks_.back();
     }
-    char* out = cursor_;
+    char* out = chunk->bytes.get() + chunk->used;
+    if (long_text) {
+        const uint64_t size = text.size();
+        out[0] = static_cast<char>(kLong);
+        std::memcpy(out + 1, &size, 8);
+    }
+    out[head - 1] = static_cast<char>(long_text ? kLong : text.size());
+    out += head;
     if (!text.empty()) std::memcpy(out, text.data(), text.size());
     out[text.size()] = '\0';
-    cursor_ += need;
-    left_ -= need;
+    chunk->used += need;
     bytes_ += need;
     return out;
 }
 
+void Ndm_NamePool::Insert(const char* stored, uint64_t hash) {
+    const size_t mask = slots_.size() - 1;
+    size_t i = hash & mask;
+    while (slots_[i]) i = (i + 1) & mask;
+    slots_[i] = TagOf(hash) | reinterpret_cast<uintptr_t>(stored);
+}
+
 void Ndm_NamePool::Grow() {
-    std::vector<Slot> old(slots_.size() * 2);
-    old.swap(slots_);
-    size_t mask = slots_.size() - 1;
-    for (const Slot& s : old) {
-        if (!s.text) continue;
-        size_t i = s.hash & mask;  // the low 32 bits of the hash are kept; tables stay below 2^32 slots
-        while (slots_[i].text) i = (i + 1) & mask;
-        slots_[i] = s;
+    std::vector<uint64_t>(slots_.size() * 2).swap(slots_);
+    for (const Chunk& chunk : chunks_) {
+        const char* at = chunk.bytes.get();
+        const char* const end = at + chunk.used;
+        while (at < end) {
+            const char* text = at + (static_cast<unsigned char>(*at) == kLong ? 10 : 1);
+            const size_t size = StoredLength(text);
+            Insert(text, Hash({text, size}));
+            at = text + size + 1;
+        }
     }
 }
 

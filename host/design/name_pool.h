@@ -10,6 +10,9 @@
 class Ndm_NamePool {
 public:
     Ndm_NamePool();
+    ~Ndm_NamePool();
+    Ndm_NamePool(const Ndm_NamePool&) = delete;
+    Ndm_NamePool& operator=(const Ndm_NamePool&) = delete;
     // Stored copy of text (terminated), the same pointer for equal texts.
     const char* Intern(std::string_view text);
     // Stored copy when the text was interned before, else null.
@@ -22,13 +25,16 @@ public:
     static uint64_t Hash(std::string_view text);
 
 private:
-    struct Slot {
-        const char* text = nullptr;
-        uint32_t hash = 0;
-        uint32_t size = 0;
-    };
+    // A slot is 8 bytes: the stored text's address in the low 48 bits and the top 16 bits of
+    // its hash above them (0: empty). The full hash is not kept: growing the set hashes the
+    // texts again, reading the chunks front to back.
+    static constexpr int kAddressBits = 48;
     const char* Store(std::string_view text);
     void Grow();
+    void Insert(const char* stored, uint64_t hash);
+    // A stored text is preceded by its length: one byte below 255, else 255, eight bytes of
+    // length and 255 again; it is followed by a NUL.
+    static size_t StoredLength(const char* stored);
 
     // Short texts (cell types, port and property names) come back millions of times: the last
     // one stored at each of a few hundred places, keyed by its bytes, is found without hashing.
@@ -40,11 +46,15 @@ private:
     static constexpr size_t kShortBytes = 16;
     Short short_[256];
     const char* Lookup(std::string_view text);  // Intern, without the short texts
-    std::vector<Slot> slots_;
+    std::vector<uint64_t> slots_;
     size_t used_ = 0;
-    std::vector<std::unique_ptr<char[]>> chunks_;
-    char* cursor_ = nullptr;
-    size_t left_ = 0;
+    struct Chunk {
+        std::unique_ptr<char[]> bytes;
+        size_t used;
+    };
+    std::vector<Chunk> chunks_;  // stored texts, in the order they came
+    size_t open_ = 0;            // the chunk texts are added to, when chunks_ is not empty
+    std::vector<std::unique_ptr<char[]>> kept_;
     size_t bytes_ = 0;
 };
 
