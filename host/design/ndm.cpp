@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <cstring>
 #include <stdexcept>
+#include <unordered_map>
 
 #include "host/design/name_pool.h"
 #include "host/design/object_pool.h"
@@ -78,15 +79,6 @@ bool HasPrefix(const char* name, std::string_view prefix, bool fold) {
 }
 
 }  // namespace
-
-// The design's blocks and networks, and the arena of the blocks' chunks of signals and pins.
-// Members go in reverse order: networks, then blocks, each of which takes its signals and pins
-// along.
-struct Ndm_Objects {
-    Ndm_Arena arena;
-    Ndm_Pool<Ndm_Block> blocks;
-    Ndm_Pool<Ndm_Network> networks;
-};
 
 // Per-block hash indexes of members by exact and by case-folded interned name. Name-sorted
 // member lists (exact and folded; stored order among equal names) answer prefix queries and
@@ -172,6 +164,16 @@ public:
         sorted[category][0].reset();
         sorted[category][1].reset();
     }
+};
+
+// The design's blocks and networks, and the arena of the blocks' chunks of signals and pins.
+// Members go in reverse order: networks, then blocks, each of which takes its signals and pins
+// along.
+struct Ndm_Objects {
+    Ndm_Arena arena;
+    Ndm_Pool<Ndm_Block> blocks;
+    Ndm_Pool<Ndm_Network> networks;
+    std::unordered_map<const Ndm_Block*, std::unique_ptr<Ndm_MemberIndex>> indexes;
 };
 
 const char* Ndm_DirName(Ndm_Dir dir) {
@@ -275,8 +277,16 @@ void Ndm_Block::SetTypeName(const char* type) {
 }
 
 Ndm_MemberIndex& Ndm_Block::Index() const {
-    if (!index_) index_ = std::make_unique<Ndm_MemberIndex>();
-    return *index_;
+    std::unique_ptr<Ndm_MemberIndex>& index = view_->GetDesign()->objects_->indexes[this];
+    if (!index) index = std::make_unique<Ndm_MemberIndex>();
+    indexed_ = true;
+    return *index;
+}
+
+void Ndm_Block::DropIndex() {
+    if (!indexed_) return;
+    view_->GetDesign()->objects_->indexes.erase(this);
+    indexed_ = false;
 }
 
 Ndm_Block* Ndm_Block::CreateBlock(const char* name, unsigned int /*flags*/) {
@@ -290,7 +300,7 @@ Ndm_Block* Ndm_Block::CreateBlock(Ndm_Interned name) {
     Ndm_Block* block = design->objects_->blocks.Make(Ndm_Token(), stored, this, view_);
     block->order_ = blocks_.empty() ? 0 : blocks_.back()->order_ + 1;
     blocks_.push_back(block);
-    if (index_ && index_->built[kBlocks]) index_->Add(design, kBlocks, stored, block);
+    if (indexed_ && Index().built[kBlocks]) Index().Add(design, kBlocks, stored, block);
     return block;
 }
 
@@ -305,7 +315,7 @@ Ndm_Signal* Ndm_Block::CreateSignal(Ndm_Interned name) {
     Ndm_Chunk<Ndm_Signal>* chunk = ChunkWithRoom(signals_, 1);
     Ndm_Signal* signal = new (chunk->Items() + chunk->size) Ndm_Signal(Ndm_Token(), stored, chunk->size);
     ++chunk->size;
-    if (index_ && index_->built[kSignals]) index_->Add(design, kSignals, stored, signal);
+    if (indexed_ && Index().built[kSignals]) Index().Add(design, kSignals, stored, signal);
     return signal;
 }
 
@@ -320,7 +330,7 @@ Ndm_Pin* Ndm_Block::CreatePin(Ndm_Interned name, Ndm_Dir dir) {
     Ndm_Chunk<Ndm_Pin>* chunk = ChunkWithRoom(pins_, 1);
     Ndm_Pin* pin = new (chunk->Items() + chunk->size) Ndm_Pin(Ndm_Token(), stored, dir, chunk->size);
     ++chunk->size;
-    if (index_ && index_->built[kPins]) index_->Add(design, kPins, stored, pin);
+    if (indexed_ && Index().built[kPins]) Index().Add(design, kPins, stored, pin);
     return pin;
 }
 
@@ -375,7 +385,7 @@ void Ndm_Block::Release() {
         b->blocks_.clear();
         b->signals_ = nullptr;  // the chunks stay in the arena
         b->pins_ = nullptr;
-        b->index_.reset();
+        b->DropIndex();
         b->DeleteAllProperties();
         b->parent_ = nullptr;
     }
@@ -393,7 +403,7 @@ bool Ndm_Block::DeleteBlock(Ndm_Block* child) {
     auto it = std::find(blocks_.begin(), blocks_.end(), child);
     if (it == blocks_.end()) return false;
     blocks_.erase(it);
-    if (index_) index_->Drop(kBlocks);
+    if (indexed_) Index().Drop(kBlocks);
     // Pins elsewhere that pointed at signals of the subtree keep their pointers; the objects
     // stay allocated in the pools until the design goes, so nothing dangles.
     child->Release();
@@ -537,6 +547,12 @@ const char* Ndm_Network::GetName() const {
     return name_;
 }
 
+int Ndm_Network::GetNumSignals() const {
+    int n = 0;
+    for (const Ndm_Signal* s = GetFirstSignal(); s; s = s->GetNextInNetwork()) ++n;
+    return n;
+}
+
 std::string Ndm_Network::GetFullName() const { return top_ ? top_->GetFullName() : std::string(); }
 
 void Ndm_Network::AddSignal(Ndm_Signal* signal) {
@@ -549,7 +565,6 @@ void Ndm_Network::AddSignal(Ndm_Signal* signal) {
         signal->next_in_network_ = signal;
     }
     last_ = signal;
-    ++count_;
     if (!top_ || signal->GetBlock()->GetDepth() < top_->GetBlock()->GetDepth()) {
         top_ = signal;
         name_ = nullptr;
@@ -559,13 +574,11 @@ void Ndm_Network::AddSignal(Ndm_Signal* signal) {
 bool Ndm_Network::Prune() {
     Ndm_Signal* first = nullptr;
     Ndm_Signal* prev = nullptr;
-    count_ = 0;
     for (Ndm_Signal* s = GetFirstSignal(); s;) {
         Ndm_Signal* next = s == last_ ? nullptr : s->next_in_network_;
         if (s->network_ == this) {
             (prev ? prev->next_in_network_ : first) = s;
             prev = s;
-            ++count_;
         } else {
             s->next_in_network_ = nullptr;
         }

@@ -323,8 +323,11 @@ private:
     void ByPrefix(const List& members, int category, std::string_view prefix,
                   bool ignore_case, std::vector<T*>& out) const;
     void Release();  // drops members and properties of a deleted subtree
+    void DropIndex();
 
-    uint32_t order_ = 0;  // fits in the base's tail padding
+    // The name indexes of the few blocks with many members are kept by the design.
+    mutable bool indexed_ = false;  // these two fit in the base's tail padding
+    uint32_t order_ = 0;
     uint32_t depth_;
     const char* name_;
     const char* type_ = "";
@@ -334,7 +337,6 @@ private:
     // In the design's arena.
     Ndm_Chunk<Ndm_Signal>* signals_ = nullptr;
     Ndm_Chunk<Ndm_Pin>* pins_ = nullptr;
-    mutable std::unique_ptr<Ndm_MemberIndex> index_;
 };
 
 class Ndm_Network : public Ndm_PropertyHolder {
@@ -353,7 +355,8 @@ public:
     uint32_t GetOrder() const { return order_; }
     // Signals of the network in the order they were added.
     Ndm_Signal* GetFirstSignal() const { return last_ ? last_->next_in_network_ : nullptr; }
-    int GetNumSignals() const { return count_; }
+    // Counted along the signals: networks are many and most are small.
+    int GetNumSignals() const;
     // Adds a signal (not yet in a network); a signal higher in the hierarchy than the
     // current top one becomes the top signal and renames the network.
     void AddSignal(Ndm_Signal* signal);
@@ -372,7 +375,6 @@ private:
     mutable const char* name_ = nullptr;  // interned full name of top_, made on request
     Ndm_Signal* top_ = nullptr;
     Ndm_Signal* last_ = nullptr;
-    int count_ = 0;
 };
 
 inline Ndm_Signal* Ndm_Signal::GetNextInNetwork() const {

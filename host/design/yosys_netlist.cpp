@@ -387,7 +387,6 @@ void Reader::Networks(Ndm_View* view) {
     std::unordered_map<int32_t, uint32_t> split_bits;  // top local bit -> its network, kNone before
     for (const Instance& inst : instances_) {
         Module& m = modules_[inst.module];
-        if (m.signal_order.size() != m.num_signals) SignalOrder(m);
         const Ndm_SignalRange signals = inst.block->GetSignalItr();
         const bool top = &inst == &instances_.front() && !m.pad_only.empty();
         if (top) {
@@ -498,6 +497,17 @@ bool Reader::Build(const char* top_module) {
     CountInstances(top);
     if (!Expand(block, top)) return false;
     TopPins(block, top);
+    // Pins are made: the networks need each module's signals in the order they join, not its
+    // bits or netnames, which are let go first (a flat netlist's are tens of megabytes).
+    for (const Instance& inst : instances_) {
+        Module& m = modules_[inst.module];
+        if (m.signal_order.size() != m.num_signals) SignalOrder(m);
+    }
+    for (Module& m : modules_) {
+        std::vector<int32_t>().swap(m.bits);
+        std::vector<Net>().swap(m.nets);
+        std::vector<uint32_t>().swap(m.net_first_signal);
+    }
     Networks(view);
     return true;
 }
