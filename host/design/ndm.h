@@ -396,6 +396,9 @@ public:
     int GetNumNetworks() const { return static_cast<int>(networks_.size()); }
     // A new, empty network.
     Ndm_Network* CreateNetwork();
+    // Reserves room for that many more networks (readers that know a bound avoid regrowing the
+    // list).
+    void ReserveNetworks(size_t more) { networks_.reserve(networks_.size() + more); }
 
 private:
     friend class Ndm_Design;

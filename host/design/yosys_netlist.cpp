@@ -385,6 +385,9 @@ void Reader::Networks(Ndm_View* view) {
     std::vector<uint32_t> network_of_root(parent_.size(), kNone);
     std::unordered_map<uint32_t, uint32_t> keeper;     // net (root) -> the top port signal keeping it
     std::unordered_map<int32_t, uint32_t> split_bits;  // top local bit -> its network, kNone before
+    size_t signals = 0;  // a network has one at least
+    for (const Instance& inst : instances_) signals += modules_[inst.module].num_signals;
+    view->ReserveNetworks(signals);
     for (const Instance& inst : instances_) {
         Module& m = modules_[inst.module];
         const Ndm_SignalRange signals = inst.block->GetSignalItr();
