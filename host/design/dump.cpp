@@ -110,8 +110,10 @@ private:
     // Properties, list entries one level deeper below their list, with their own stack.
     void Properties(const Ndm_PropertyHolder& holder, int depth) {
         if (!holder.GetNumProperties()) return;
+        const Ndm_PropertyRange props = holder.GetPropertyItr();
+        top_props_.assign(props.begin(), props.end());
         std::vector<std::pair<std::span<Ndm_Property* const>, size_t>>& stack = lists_;
-        stack.assign(1, {holder.GetPropertyItr(), 0});
+        stack.assign(1, {top_props_, 0});
         while (!stack.empty()) {
             auto& [list, next] = stack.back();
             if (next == list.size()) {
@@ -213,6 +215,7 @@ private:
     std::string buf_;
     std::string name_;
     std::vector<std::pair<std::span<Ndm_Property* const>, size_t>> lists_;  // open property lists
+    std::vector<Ndm_Property*> top_props_;  // the properties of the object being printed
 };
 
 }  // namespace

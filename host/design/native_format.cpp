@@ -220,9 +220,10 @@ private:
     }
 
     // Lists may nest as deeply as a file made them: the writer keeps its own stack.
-    void PropertyList(std::span<Ndm_Property* const> props) {
+    void PropertyList(Ndm_PropertyRange props) {
+        top_props_.assign(props.begin(), props.end());
         std::vector<std::pair<std::span<Ndm_Property* const>, size_t>>& stack = lists_;
-        stack.assign(1, {props, 0});
+        stack.assign(1, {top_props_, 0});
         buf_ += '[';
         while (!stack.empty()) {
             auto& [list, next] = stack.back();
@@ -313,6 +314,7 @@ private:
     std::string buf_;
     Ndm_PtrMap ordinal_;  // signal -> 1 + its number
     std::vector<std::pair<std::span<Ndm_Property* const>, size_t>> lists_;  // open property lists
+    std::vector<Ndm_Property*> top_props_;  // the properties of the object being written
     bool ok_ = true;
     std::string why_;
 };

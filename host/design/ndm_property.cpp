@@ -31,12 +31,15 @@ Ndm_Property* Set(Ndm_Property* p, const char* v) { return p ? (p->SetValueStrin
 void Ndm_PropertyCells::Refill() {
     // Chunks grow with the design, from 4 KB to 1 MB.
     const size_t count = std::min<size_t>(size_t{128} << std::min<size_t>(chunks_.size(), 8), 32768);
-    chunks_.emplace_back(new Cell[count]);
+    std::unique_ptr<Cell[]> chunk(new Cell[count]);
+    // Properties link to one another through 48-bit addresses, as every 64-bit system gives.
+    if ((reinterpret_cast<uintptr_t>(chunk.get() + count) >> 48) != 0) throw std::bad_alloc();
+    chunks_.push_back(std::move(chunk));
     cursor_ = chunks_.back().get();
     left_ = count;
 }
 
-static_assert(sizeof(Ndm_Property) == Ndm_PropertyCells::kCell, "a property is four words");
+static_assert(sizeof(Ndm_Property) == Ndm_PropertyCells::kCell, "a property is three words");
 
 Ndm_PropertyCells& Ndm_Property::CellsOf(const Ndm_PropertyHolder* owner) {
     return owner->OwnDesign()->PropertyCells();
@@ -47,47 +50,48 @@ Ndm_Property* Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char
     return new (design->PropertyCells().Get()) Ndm_Property(owner, design->Intern(name ? name : ""), type);
 }
 
-void Ndm_Property::Destroy(Ndm_Property* p) {
-    Ndm_PropertyCells& cells = CellsOf(p->owner_);
-    p->~Ndm_Property();
-    cells.Put(p);
-}
-
 Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, const char* interned_name, int type)
-    : owner_(owner), name_(interned_name), float_(0.0), type_(static_cast<uint8_t>(type)) {
+    : name_(interned_name), float_(0.0), link_(uint64_t{static_cast<uint8_t>(type)} << kTypeShift) {
+    const auto at = reinterpret_cast<uintptr_t>(owner);
+    // Every 64-bit system gives programs addresses of 48 bits.
+    if ((at & ~kAddress) != 0) throw std::bad_alloc();
+    LinkAs(at | kAtOwner);
     if (type == NDM_PROP_STRING) text_ = "";
     if (type == NDM_PROP_STRING_LIST) strings_ = nullptr;
     if (type == NDM_PROP_LIST) list_ = nullptr;
 }
 
+Ndm_PropertyHolder* Ndm_Property::GetOwner() const {
+    const Ndm_Property* p = this;
+    while (!(p->link_ & kAtOwner)) p = p->Next();
+    return reinterpret_cast<Ndm_PropertyHolder*>(static_cast<uintptr_t>(p->link_ & kAddress));
+}
+
 // Lists may nest as deeply as a file makes them: entries are freed from a work list, each
-// after its own entries were taken out, so no destructor recurses.
-Ndm_Property::~Ndm_Property() {
-    if (type_ == NDM_PROP_STRING_LIST && owns_strings_) delete strings_;
-    if (type_ != NDM_PROP_LIST || !list_) return;
-    std::vector<Ndm_Property*> work;
-    work.swap(list_->entries);
-    Ndm_PropertyCells& cells = CellsOf(owner_);
-    list_->~ListData();
-    cells.Put(list_);
+// after its own entries were taken out, so that nothing recurses.
+void Ndm_Property::Destroy(Ndm_Property* p, Ndm_PropertyCells& cells) {
+    std::vector<Ndm_Property*> work{p};
     while (!work.empty()) {
-        Ndm_Property* p = work.back();
+        Ndm_Property* q = work.back();
         work.pop_back();
-        if (p->type_ == NDM_PROP_LIST && p->list_) {
-            work.insert(work.end(), p->list_->entries.begin(), p->list_->entries.end());
-            p->list_->entries.clear();
+        const int type = q->GetType();
+        if (type == NDM_PROP_STRING_LIST && q->OwnsStrings()) delete q->strings_;
+        if (type == NDM_PROP_LIST && q->list_) {
+            work.insert(work.end(), q->list_->entries.begin(), q->list_->entries.end());
+            delete q->list_;
         }
-        Destroy(p);
+        q->~Ndm_Property();
+        cells.Put(q);
     }
 }
 
 const std::vector<std::string>& Ndm_Property::GetStrings() const {
     static const std::vector<std::string> none;
-    return type_ == NDM_PROP_STRING_LIST && strings_ ? *strings_ : none;
+    return GetType() == NDM_PROP_STRING_LIST && strings_ ? *strings_ : none;
 }
 
 void Ndm_Property::SetValueString(const char* value) {
-    if (type_ == NDM_PROP_STRING) text_ = owner_->OwnDesign()->Intern(value ? value : "");
+    if (GetType() == NDM_PROP_STRING) text_ = GetOwner()->OwnDesign()->Intern(value ? value : "");
 }
 
 const std::vector<std::string>* Ndm_TextLists::Extend(const std::vector<std::string>* list, const char* text) {
@@ -106,12 +110,12 @@ const std::vector<std::string>* Ndm_TextLists::Extend(const std::vector<std::str
 static constexpr size_t kSharedTexts = 16;
 
 bool Ndm_Property::AddString(const char* text) {
-    if (type_ != NDM_PROP_STRING_LIST) return false;
+    if (GetType() != NDM_PROP_STRING_LIST) return false;
     if (!text) text = "";
-    if (owns_strings_) {
+    if (OwnsStrings()) {
         const_cast<std::vector<std::string>*>(strings_)->emplace_back(text);
     } else if (!strings_ || strings_->size() < kSharedTexts) {
-        Ndm_Design* design = owner_->OwnDesign();
+        Ndm_Design* design = GetOwner()->OwnDesign();
         strings_ = design->TextLists().Extend(strings_, design->Intern(text));
     } else {
         auto* own = new std::vector<std::string>();
@@ -119,15 +123,16 @@ bool Ndm_Property::AddString(const char* text) {
         *own = *strings_;
         own->emplace_back(text);
         strings_ = own;
-        owns_strings_ = true;
+        link_ |= kOwnsStrings;
     }
     return true;
 }
 
 Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
-    if (type_ != NDM_PROP_LIST) return nullptr;
-    if (!list_) list_ = new (CellsOf(owner_).Get()) ListData();
-    Ndm_Property* entry = list_->entries.emplace_back(Make(owner_, type, name));
+    if (GetType() != NDM_PROP_LIST) return nullptr;
+    Ndm_PropertyHolder* owner = GetOwner();
+    if (!list_) list_ = new ListData();
+    Ndm_Property* entry = list_->entries.emplace_back(Make(owner, type, name));
     if (list_->index) list_->index->try_emplace(entry->name_, entry);
     return entry;
 }
@@ -150,7 +155,7 @@ Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
 }
 
 Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
-    if (!name || type_ != NDM_PROP_LIST || !list_) return nullptr;
+    if (!name || GetType() != NDM_PROP_LIST || !list_) return nullptr;
     std::vector<Ndm_Property*>& entries = list_->entries;
     if (entries.size() <= kIndexFrom) {
         for (Ndm_Property* e : entries)
@@ -169,33 +174,17 @@ Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
 }
 
 bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
-    if (type_ != NDM_PROP_LIST || !list_) return false;
+    if (GetType() != NDM_PROP_LIST || !list_) return false;
     auto it = std::find(list_->entries.begin(), list_->entries.end(), entry);
     if (it == list_->entries.end()) return false;
     list_->entries.erase(it);
     // The first entry of that name may have changed: the index is rebuilt on the next lookup.
     list_->index.reset();
-    Destroy(entry);
+    Destroy(entry, CellsOf(GetOwner()));
     return true;
 }
 
 // ---- holders ----
-
-struct Ndm_PropertyHolder::Props {
-    uint32_t size;
-    uint32_t room;
-    Ndm_Property** begin() { return reinterpret_cast<Ndm_Property**>(this + 1); }
-    Ndm_Property** end() { return begin() + size; }
-
-    static Props* Make(uint32_t room, const Props* from) {
-        auto* p = static_cast<Props*>(std::malloc(sizeof(Props) + room * sizeof(Ndm_Property*)));
-        if (!p) throw std::bad_alloc();
-        p->size = from ? from->size : 0;
-        p->room = room;
-        if (from) std::memcpy(p->begin(), const_cast<Props*>(from)->begin(), from->size * sizeof(Ndm_Property*));
-        return p;
-    }
-};
 
 Ndm_Design* Ndm_PropertyHolder::OwnDesign() const {
     switch (kind_) {
@@ -213,8 +202,12 @@ Ndm_PropertyHolder::~Ndm_PropertyHolder() { DeleteAllProperties(); }
 
 void Ndm_PropertyHolder::DeleteAllProperties() {
     if (!props_) return;
-    for (Ndm_Property* p : *props_) Ndm_Property::Destroy(p);
-    std::free(props_);
+    Ndm_PropertyCells& cells = Ndm_Property::CellsOf(this);
+    for (Ndm_Property* p = props_; p;) {
+        Ndm_Property* next = p->Next();
+        Ndm_Property::Destroy(p, cells);
+        p = next;
+    }
     props_ = nullptr;
 }
 
@@ -241,38 +234,27 @@ std::string Ndm_PropertyHolder::GetFullName() const {
 }
 
 Ndm_Property* Ndm_PropertyHolder::GetPropertyByName(const char* name) const {
-    if (!props_ || !name) return nullptr;
-    for (Ndm_Property* p : *props_)
+    if (!name) return nullptr;
+    for (Ndm_Property* p = props_; p; p = p->Next())
         if (std::strcmp(p->name_, name) == 0) return p;
     return nullptr;
 }
 
-std::span<Ndm_Property* const> Ndm_PropertyHolder::GetPropertyItr() const {
-    if (!props_) return {};
-    return {props_->begin(), props_->size};
-}
+int Ndm_PropertyHolder::GetNumProperties() const { return static_cast<int>(GetPropertyItr().size()); }
 
-int Ndm_PropertyHolder::GetNumProperties() const { return props_ ? static_cast<int>(props_->size) : 0; }
-
+// A property of a name the object has takes the place of the old one; a new name goes last.
 Ndm_Property* Ndm_PropertyHolder::Create(int type, const char* name) {
     if (!name) return nullptr;
     Ndm_Property* fresh = Ndm_Property::Make(this, type, name);
-    if (props_) {
-        for (Ndm_Property*& p : *props_) {
-            if (std::strcmp(p->name_, name) == 0) {
-                Ndm_Property::Destroy(p);
-                p = fresh;
-                return fresh;
-            }
-        }
+    Ndm_Property* prev = nullptr;
+    for (Ndm_Property* p = props_; p; prev = p, p = p->Next()) {
+        if (std::strcmp(p->name_, name) != 0) continue;
+        fresh->LinkAs(p->link_);
+        (prev ? prev->LinkTo(fresh) : void(props_ = fresh));
+        Ndm_Property::Destroy(p, Ndm_Property::CellsOf(this));
+        return fresh;
     }
-    if (!props_ || props_->size == props_->room) {
-        // Two, then doubling: most objects hold one to three properties.
-        Props* grown = Props::Make(props_ ? props_->room * 2 : 2, props_);
-        std::free(props_);
-        props_ = grown;
-    }
-    props_->begin()[props_->size++] = fresh;
+    (prev ? prev->LinkTo(fresh) : void(props_ = fresh));
     return fresh;
 }
 
@@ -298,11 +280,16 @@ bool Ndm_PropertyHolder::DeleteProperty(const char* name) {
 }
 
 bool Ndm_PropertyHolder::DeleteProperty(Ndm_Property* property) {
-    if (!props_ || !property) return false;
-    Ndm_Property** it = std::find(props_->begin(), props_->end(), property);
-    if (it == props_->end()) return false;
-    std::copy(it + 1, props_->end(), it);
-    --props_->size;
-    Ndm_Property::Destroy(property);
-    return true;
+    if (!property) return false;
+    Ndm_Property* prev = nullptr;
+    for (Ndm_Property* p = props_; p; prev = p, p = p->Next()) {
+        if (p != property) continue;
+        if (prev)
+            prev->LinkAs(p->link_);
+        else
+            props_ = p->Next();
+        Ndm_Property::Destroy(p, Ndm_Property::CellsOf(this));
+        return true;
+    }
+    return false;
 }

@@ -4,7 +4,9 @@
 // all kept (a timing list may hold several "OFFSET" entries).
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
+#include <iterator>
 #include <memory>
 #include <span>
 #include <string>
@@ -36,30 +38,30 @@ class Ndm_Property {
 public:
     Ndm_Property(const Ndm_Property&) = delete;
     Ndm_Property& operator=(const Ndm_Property&) = delete;
-    ~Ndm_Property();
 
     // Property name.
     const char* GetName() const { return name_; }
     // Type code (Ndm_PropType).
-    int GetType() const { return type_; }
-    // Object the property sits on (for list entries: the object of the list).
-    Ndm_PropertyHolder* GetOwner() const { return owner_; }
+    int GetType() const { return static_cast<int>(link_ >> kTypeShift); }
+    // Object the property sits on (for list entries: the object of the list). Found at the end
+    // of the object's properties, which are few.
+    Ndm_PropertyHolder* GetOwner() const;
 
     // Value accessors; each answers a neutral value for a property of another type.
-    bool GetBool() const { return type_ == NDM_PROP_BOOL && int_ != 0; }
-    int32_t GetInt32() const { return type_ == NDM_PROP_INT32 ? int_ : 0; }
-    double GetFloat64() const { return type_ == NDM_PROP_FLOAT64 ? float_ : 0.0; }
+    bool GetBool() const { return GetType() == NDM_PROP_BOOL && int_ != 0; }
+    int32_t GetInt32() const { return GetType() == NDM_PROP_INT32 ? int_ : 0; }
+    double GetFloat64() const { return GetType() == NDM_PROP_FLOAT64 ? float_ : 0.0; }
     // Text of a string property, or null.
-    const char* GetValueString() const { return type_ == NDM_PROP_STRING ? text_ : nullptr; }
+    const char* GetValueString() const { return GetType() == NDM_PROP_STRING ? text_ : nullptr; }
     // Texts of a string list, in order (empty for other types).
     const std::vector<std::string>& GetStrings() const;
     // Entries of a list property, in order (empty for other types).
     std::span<Ndm_Property* const> GetListItr() const {
-        return type_ == NDM_PROP_LIST && list_ ? std::span<Ndm_Property* const>(list_->entries)
-                                               : std::span<Ndm_Property* const>();
+        return GetType() == NDM_PROP_LIST && list_ ? std::span<Ndm_Property* const>(list_->entries)
+                                                   : std::span<Ndm_Property* const>();
     }
     int GetNumEntries() const {
-        return type_ == NDM_PROP_LIST && list_ ? static_cast<int>(list_->entries.size()) : 0;
+        return GetType() == NDM_PROP_LIST && list_ ? static_cast<int>(list_->entries.size()) : 0;
     }
 
     // Appends a text to a string list; false for other types.
@@ -79,24 +81,41 @@ public:
     // Replaces the value of a bool, int32, float64 or string property; a property of another
     // type is left as it is.
     void SetBool(bool value) {
-        if (type_ == NDM_PROP_BOOL) int_ = value ? 1 : 0;
+        if (GetType() == NDM_PROP_BOOL) int_ = value ? 1 : 0;
     }
     void SetInt32(int32_t value) {
-        if (type_ == NDM_PROP_INT32) int_ = value;
+        if (GetType() == NDM_PROP_INT32) int_ = value;
     }
     void SetFloat64(double value) {
-        if (type_ == NDM_PROP_FLOAT64) float_ = value;
+        if (GetType() == NDM_PROP_FLOAT64) float_ = value;
     }
     void SetValueString(const char* value);
 
 private:
     friend class Ndm_PropertyHolder;
+    friend class Ndm_PropertyRange;
     Ndm_Property(Ndm_PropertyHolder* owner, const char* interned_name, int type);
+    ~Ndm_Property() = default;
     // Properties and list data live in the design's cells.
     static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
     static Ndm_Property* Make(Ndm_PropertyHolder* owner, int type, const char* name);
-    static void Destroy(Ndm_Property* p);
+    static void Destroy(Ndm_Property* p, Ndm_PropertyCells& cells);
     Ndm_Property* AddEntry(int type, const char* name);
+
+    // The link: the next property of the same object, or at the end (and for list entries) the
+    // object itself, marked by the low bit; the second bit when a string list is the
+    // property's own; the type code in the top byte. Addresses take 48 bits and are 8-aligned.
+    static constexpr uint64_t kAtOwner = 1, kOwnsStrings = 2;
+    static constexpr int kTypeShift = 56;
+    static constexpr uint64_t kAddress = ((uint64_t{1} << 48) - 1) & ~uint64_t{7};
+    Ndm_Property* Next() const {
+        return link_ & kAtOwner ? nullptr : reinterpret_cast<Ndm_Property*>(static_cast<uintptr_t>(link_ & kAddress));
+    }
+    // Points the link at what another link points at (a property or the owner), keeping the
+    // type and the strings mark.
+    void LinkAs(uint64_t other) { link_ = (link_ & ~(kAddress | kAtOwner)) | (other & (kAddress | kAtOwner)); }
+    void LinkTo(const Ndm_Property* next) { LinkAs(reinterpret_cast<uintptr_t>(next)); }
+    bool OwnsStrings() const { return link_ & kOwnsStrings; }
 
     // Entries of a list property (owned), and the first entry of each name, built by the first
     // lookup in a list of more than kIndexFrom entries and kept up to date by additions.
@@ -105,12 +124,10 @@ private:
         std::unique_ptr<std::unordered_map<std::string_view, Ndm_Property*>> index;
     };
     static constexpr size_t kIndexFrom = 8;
-    static_assert(sizeof(ListData) <= 32);
 
     // Names and texts are interned in the design, and a short string list is a value the
     // design shares between every property holding the same texts (Ndm_TextLists): an object
-    // pays for its properties, not for their values.
-    Ndm_PropertyHolder* owner_;
+    // pays for its properties, 24 bytes each, not for their values.
     const char* name_;
     union {
         int32_t int_;
@@ -119,8 +136,54 @@ private:
         const std::vector<std::string>* strings_;  // string list: shared, or owned when long
         ListData* list_;                          // list (owned), null while empty
     };
-    uint8_t type_;
-    bool owns_strings_ = false;
+    uint64_t link_;
+};
+
+// The properties of an object in creation order, as a range of pointers.
+class Ndm_PropertyRange {
+public:
+    class iterator {
+    public:
+        using iterator_category = std::forward_iterator_tag;
+        using value_type = Ndm_Property*;
+        using difference_type = std::ptrdiff_t;
+        using pointer = Ndm_Property* const*;
+        using reference = Ndm_Property*;
+        iterator() = default;
+        explicit iterator(Ndm_Property* at) : at_(at) {}
+        Ndm_Property* operator*() const { return at_; }
+        iterator& operator++() {
+            at_ = at_->Next();
+            return *this;
+        }
+        iterator operator++(int) {
+            iterator before = *this;
+            at_ = at_->Next();
+            return before;
+        }
+        bool operator==(const iterator&) const = default;
+
+    private:
+        Ndm_Property* at_ = nullptr;
+    };
+    explicit Ndm_PropertyRange(Ndm_Property* first) : first_(first) {}
+    iterator begin() const { return iterator(first_); }
+    iterator end() const { return iterator(); }
+    bool empty() const { return !first_; }
+    size_t size() const {
+        size_t n = 0;
+        for (Ndm_Property* p = first_; p; p = p->Next()) ++n;
+        return n;
+    }
+    // The property at place i (i < size()).
+    Ndm_Property* operator[](size_t i) const {
+        Ndm_Property* p = first_;
+        while (i--) p = p->Next();
+        return p;
+    }
+
+private:
+    Ndm_Property* first_;
 };
 
 // Kinds of design objects.
@@ -142,7 +205,7 @@ public:
     // First property named name (exact), or null.
     Ndm_Property* GetPropertyByName(const char* name) const;
     // Properties in creation order.
-    std::span<Ndm_Property* const> GetPropertyItr() const;
+    Ndm_PropertyRange GetPropertyItr() const { return Ndm_PropertyRange(props_); }
     int GetNumProperties() const;
 
     // Creates a property, replacing one of the same name in place.
@@ -170,7 +233,6 @@ private:
     // The design the object belongs to, which interns the property names and texts.
     Ndm_Design* OwnDesign() const;
 
-    struct Props;            // count, room and the property pointers, in one allocation
-    Props* props_ = nullptr;  // allocated on the first property
+    Ndm_Property* props_ = nullptr;  // the first property, linked to the next
     Ndm_ObjKind kind_;
 };

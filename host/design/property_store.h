@@ -19,11 +19,11 @@
 #include <sanitizer/asan_interface.h>
 #endif
 
-// Cells of 32 bytes for a design's properties, taken from large chunks and reused once freed:
+// Cells of 24 bytes for a design's properties, taken from large chunks and reused once freed:
 // a property costs its own size, with no allocator overhead, and making one is a pointer pop.
 class Ndm_PropertyCells {
 public:
-    static constexpr size_t kCell = 32;
+    static constexpr size_t kCell = 24;
     void* Get() {
         if (free_) {
             void* cell = free_;
@@ -42,7 +42,7 @@ public:
     }
 
 private:
-    struct alignas(16) Cell {
+    struct alignas(8) Cell {
         unsigned char bytes[kCell];
     };
     void Refill();
