@@ -498,9 +498,16 @@ void Ndm_Block::ByPrefix(const List& members, int category, std::string_view pre
     auto at = std::lower_bound(list.begin(), list.end(), prefix, [&](const void* m, std::string_view key) {
         return CompareName(static_cast<const T*>(m)->GetName(), key, ignore_case) < 0;
     });
+    auto last = at;
+    while (last != list.end() && HasPrefix(static_cast<T*>(*last)->GetName(), prefix, ignore_case)) ++last;
+    // When many members match, going through them in stored order beats sorting the matches.
+    if (static_cast<size_t>(last - at) > members.size() / 4) {
+        for (T* m : members)
+            if (HasPrefix(m->GetName(), prefix, ignore_case)) out.push_back(m);
+        return;
+    }
     size_t start = out.size();
-    for (; at != list.end() && HasPrefix(static_cast<T*>(*at)->GetName(), prefix, ignore_case); ++at)
-        out.push_back(static_cast<T*>(*at));
+    for (; at != last; ++at) out.push_back(static_cast<T*>(*at));
     std::sort(out.begin() + static_cast<std::ptrdiff_t>(start), out.end(),
               [](const T* a, const T* b) { return a->GetOrder() < b->GetOrder(); });
 }

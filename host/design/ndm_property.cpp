@@ -76,9 +76,10 @@ void Ndm_Property::Destroy(Ndm_Property* p, Ndm_PropertyCells& cells) {
         work.pop_back();
         const int type = q->GetType();
         if (type == NDM_PROP_STRING_LIST && q->OwnsStrings()) delete q->strings_;
-        if (type == NDM_PROP_LIST && q->list_) {
-            work.insert(work.end(), q->list_->entries.begin(), q->list_->entries.end());
-            delete q->list_;
+        if (type == NDM_PROP_LIST) {
+            const std::span<Ndm_Property* const> entries = q->GetListItr();
+            work.insert(work.end(), entries.begin(), entries.end());
+            if (!(q->link_ & kOneEntry)) delete q->list_;
         }
         q->~Ndm_Property();
         cells.Put(q);
@@ -95,13 +96,17 @@ void Ndm_Property::SetValueString(const char* value) {
 }
 
 const std::vector<std::string>* Ndm_TextLists::Extend(const std::vector<std::string>* list, const char* text) {
-    std::unique_ptr<std::vector<std::string>>& slot = lists_[Key{list, text}];
+    const Key key{list, text};
+    Recent& recent = recent_[KeyHash()(key) % std::size(recent_)];
+    if (recent.list && recent.key == key) return recent.list;
+    std::unique_ptr<std::vector<std::string>>& slot = lists_[key];
     if (!slot) {
         slot = std::make_unique<std::vector<std::string>>();
         slot->reserve((list ? list->size() : 0) + 1);
         if (list) *slot = *list;
         slot->emplace_back(text);
     }
+    recent = Recent{key, slot.get()};
     return slot.get();
 }
 
@@ -131,8 +136,19 @@ bool Ndm_Property::AddString(const char* text) {
 Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
     if (GetType() != NDM_PROP_LIST) return nullptr;
     Ndm_PropertyHolder* owner = GetOwner();
-    if (!list_) list_ = new ListData();
-    Ndm_Property* entry = list_->entries.emplace_back(Make(owner, type, name));
+    Ndm_Property* entry = Make(owner, type, name);
+    if (!(link_ & kOneEntry) && !list_) {
+        entry_ = entry;
+        link_ |= kOneEntry;
+        return entry;
+    }
+    if (link_ & kOneEntry) {
+        auto data = std::make_unique<ListData>();
+        data->entries.push_back(entry_);
+        list_ = data.release();
+        link_ &= ~kOneEntry;
+    }
+    list_->entries.push_back(entry);
     if (list_->index) list_->index->try_emplace(entry->name_, entry);
     return entry;
 }
@@ -155,8 +171,8 @@ Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
 }
 
 Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
-    if (!name || GetType() != NDM_PROP_LIST || !list_) return nullptr;
-    std::vector<Ndm_Property*>& entries = list_->entries;
+    if (!name) return nullptr;
+    const std::span<Ndm_Property* const> entries = GetListItr();
     if (entries.size() <= kIndexFrom) {
         for (Ndm_Property* e : entries)
             if (std::strcmp(e->name_, name) == 0) return e;
@@ -174,7 +190,15 @@ Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
 }
 
 bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
-    if (GetType() != NDM_PROP_LIST || !list_) return false;
+    if (GetType() != NDM_PROP_LIST || !entry) return false;
+    if (link_ & kOneEntry) {
+        if (entry_ != entry) return false;
+        list_ = nullptr;
+        link_ &= ~kOneEntry;
+        Destroy(entry, CellsOf(GetOwner()));
+        return true;
+    }
+    if (!list_) return false;
     auto it = std::find(list_->entries.begin(), list_->entries.end(), entry);
     if (it == list_->entries.end()) return false;
     list_->entries.erase(it);

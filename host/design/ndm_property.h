@@ -57,12 +57,11 @@ public:
     const std::vector<std::string>& GetStrings() const;
     // Entries of a list property, in order (empty for other types).
     std::span<Ndm_Property* const> GetListItr() const {
-        return GetType() == NDM_PROP_LIST && list_ ? std::span<Ndm_Property* const>(list_->entries)
-                                                   : std::span<Ndm_Property* const>();
+        if (GetType() != NDM_PROP_LIST) return {};
+        if (link_ & kOneEntry) return {&entry_, 1};
+        return list_ ? std::span<Ndm_Property* const>(list_->entries) : std::span<Ndm_Property* const>();
     }
-    int GetNumEntries() const {
-        return GetType() == NDM_PROP_LIST && list_ ? static_cast<int>(list_->entries.size()) : 0;
-    }
+    int GetNumEntries() const { return static_cast<int>(GetListItr().size()); }
 
     // Appends a text to a string list; false for other types.
     bool AddString(const char* text);
@@ -104,8 +103,10 @@ private:
 
     // The link: the next property of the same object, or at the end (and for list entries) the
     // object itself, marked by the low bit; the second bit when a string list is the
-    // property's own; the type code in the top byte. Addresses take 48 bits and are 8-aligned.
-    static constexpr uint64_t kAtOwner = 1, kOwnsStrings = 2;
+    // property's own, the third when a list holds one entry, in entry_ (a list made to carry one
+    // value through the filter costs no allocation); the type code in the top byte. Addresses
+    // take 48 bits and are 8-aligned.
+    static constexpr uint64_t kAtOwner = 1, kOwnsStrings = 2, kOneEntry = 4;
     static constexpr int kTypeShift = 56;
     static constexpr uint64_t kAddress = ((uint64_t{1} << 48) - 1) & ~uint64_t{7};
     Ndm_Property* Next() const {
@@ -134,7 +135,8 @@ private:
         double float_;
         const char* text_;                        // string
         const std::vector<std::string>* strings_;  // string list: shared, or owned when long
-        ListData* list_;                          // list (owned), null while empty
+        ListData* list_;                          // list of two entries or more (owned), else null
+        Ndm_Property* entry_;                     // list of one entry
     };
     uint64_t link_;
 };

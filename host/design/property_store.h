@@ -80,4 +80,11 @@ private:
         }
     };
     std::unordered_map<Key, std::unique_ptr<std::vector<std::string>>, KeyHash> lists_;
+    // The last lists made or found, by their key: a statement gives thousands of objects the
+    // same lists, one text at a time.
+    struct Recent {
+        Key key{};
+        const std::vector<std::string>* list = nullptr;
+    };
+    Recent recent_[64];
 };
