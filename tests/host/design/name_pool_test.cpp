@@ -1,5 +1,6 @@
 // Interning: one stored copy for each distinct text, whichever way it was found (short texts
-// have a table of their own in front of the hash set, which must never confuse two texts).
+// have a table of their own in front of the hash set, which must never confuse two texts; the
+// set is rebuilt from the stored texts as it grows).
 #include <gtest/gtest.h>
 
 #include <set>
@@ -19,7 +20,8 @@ TEST(NamePool, EqualTextsShareOneCopyAndDifferentTextsNever) {
     const std::vector<std::string> texts = {
         "", "a", "a\0"s, "\0a"s, "a\0b"s, "a\0c"s, "I0", "I1", "FROM_UCF", "FROM_UCX", "_TempPropList",
         "1234567890123456", "1234567890123457", "12345678901234567", "12345678901234568", "12345678",
-        "123456789", std::string(1000, 'x'),
+        "123456789", std::string(1000, 'x'), std::string(254, 'y'), std::string(255, 'y'), std::string(256, 'y'),
+        std::string(300, '\0'), std::string(1 << 19, 'z'),  // lengths a byte cannot hold; a chunk of its own
     };
     std::set<const char*> stored;
     for (int round = 0; round < 3; ++round) {

@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <vector>
 
 #include "host/design/ndm.h"
 
@@ -251,6 +252,132 @@ TEST(DesignDatabase, DeleteBlockRemovesTheSubtreeFromLookupsAndNetworks) {
     // New children are indexed as before.
     Ndm_Block* fresh = t.top->CreateBlock("dup2");
     EXPECT_EQ(t.top->GetBlockByName("dup2"), fresh);
+}
+
+// Properties are linked one to the next and the last to their object: every edit at the front,
+// in the middle and at the end must keep the order, the owner and the list entries right.
+TEST(DesignDatabase, PropertyEditsKeepOrderAndOwnerAnywhereInTheList) {
+    Tree t;
+    Ndm_Block* cell = t.top->CreateBlock("u");
+    const std::vector<Ndm_PropertyHolder*> holders = {&t.design, t.view, t.top, cell, cell->CreatePin("A"),
+                                                      t.top->CreateSignal("s"), t.view->CreateNetwork()};
+    struct Step {
+        const char* op;  // "+name" creates or replaces, "-name" deletes
+        const char* expect;
+    };
+    const std::vector<Step> steps = {
+        {"+a", "a"},        {"+b", "a b"},      {"+c", "a b c"},    {"+a", "a b c"},  {"+b", "a b c"},
+        {"+c", "a b c"},    {"-b", "a c"},      {"+d", "a c d"},    {"-a", "c d"},    {"-d", "c"},
+        {"-c", ""},         {"+e", "e"},        {"-x", "e"},
+    };
+    for (Ndm_PropertyHolder* h : holders) {
+        int made = 0;
+        for (const Step& step : steps) {
+            const std::string name = step.op + 1;
+            if (step.op[0] == '+')
+                h->CreatePropertyInt32(name.c_str(), ++made);
+            else
+                EXPECT_EQ(h->DeleteProperty(name.c_str()), name != "x");
+            std::string names;
+            for (Ndm_Property* p : h->GetPropertyItr()) {
+                names += (names.empty() ? "" : " ") + std::string(p->GetName());
+                EXPECT_EQ(p->GetOwner(), h) << step.op;
+                EXPECT_EQ(h->GetPropertyByName(p->GetName()), p);
+            }
+            EXPECT_EQ(names, step.expect) << h->GetName() << " after " << step.op;
+            EXPECT_EQ(h->GetNumProperties(), static_cast<int>(h->GetPropertyItr().size()));
+        }
+        EXPECT_EQ(h->GetPropertyByName("e")->GetInt32(), made);
+    }
+
+    // A list of one entry, grown to two, shrunk to none and grown again.
+    Ndm_Property* list = cell->CreatePropertyList("L");
+    Ndm_Property* one = list->CreatePropertyString("A", "1");
+    EXPECT_EQ(list->GetNumEntries(), 1);
+    EXPECT_EQ(list->GetEntryByName("A"), one);
+    EXPECT_FALSE(list->DeleteEntry(cell->GetPropertyByName("e")));
+    Ndm_Property* two = list->CreatePropertyString("B", "2");
+    ASSERT_EQ(list->GetNumEntries(), 2);
+    EXPECT_EQ(list->GetListItr()[0], one);
+    EXPECT_EQ(two->GetOwner(), cell);
+    EXPECT_TRUE(list->DeleteEntry(one));
+    EXPECT_TRUE(list->DeleteEntry(two));
+    EXPECT_EQ(list->GetNumEntries(), 0);
+    Ndm_Property* again = list->CreatePropertyString("C", "3");
+    EXPECT_EQ(list->GetEntryByName("C"), again);
+    Ndm_Property* single = cell->CreatePropertyList("S");
+    EXPECT_TRUE(single->DeleteEntry(single->CreatePropertyBool("X")));
+    EXPECT_EQ(single->GetNumEntries(), 0);
+    EXPECT_EQ(single->GetEntryByName("X"), nullptr);
+}
+
+// Signals and pins live in chunks of their block: members made one at a time past a
+// reservation, and a reservation made when the block already has some, keep stored order, their
+// block and their lookups.
+TEST(DesignDatabase, MembersMadePastTheirReservationKeepOrderAndBlock) {
+    Tree t;
+    for (int reserve : {0, 1, 3, 40}) {
+        Ndm_Block* b = t.top->CreateBlock(("b" + std::to_string(reserve)).c_str());
+        b->Reserve(0, reserve, reserve);
+        std::vector<Ndm_Signal*> signals;
+        std::vector<Ndm_Pin*> pins;
+        for (int i = 0; i < 30; ++i) {
+            if (i == 7) b->Reserve(0, 5, 5);
+            const std::string name = "m" + std::to_string(i);
+            signals.push_back(b->CreateSignal(name.c_str()));
+            pins.push_back(b->CreatePin(name.c_str()));
+        }
+        ASSERT_EQ(b->GetNumSignals(), 30);
+        ASSERT_EQ(b->GetNumPins(), 30);
+        int i = 0;
+        for (Ndm_Signal* s : b->GetSignalItr()) {
+            EXPECT_EQ(s, signals[i]);
+            EXPECT_EQ(b->GetSignalItr()[i], s);
+            EXPECT_EQ(s->GetBlock(), b);
+            EXPECT_EQ(s->GetOrder(), static_cast<uint32_t>(i));
+            EXPECT_EQ(b->GetSignalByName(s->GetName()), s);
+            ++i;
+        }
+        i = 0;
+        for (Ndm_Pin* p : b->GetPinItr()) {
+            EXPECT_EQ(p, pins[i]);
+            EXPECT_EQ(b->GetPinItr()[i], p);
+            EXPECT_EQ(p->GetBlock(), b);
+            EXPECT_EQ(b->GetPinByIName(("M" + std::to_string(i)).c_str()), p);
+            ++i;
+        }
+        std::vector<Ndm_Signal*> prefixed;
+        b->GetSignalsByPrefix("m2", false, prefixed);
+        ASSERT_EQ(prefixed.size(), 11u);  // m2, m20..m29 in stored order
+        EXPECT_EQ(prefixed.front(), signals[2]);
+        EXPECT_EQ(prefixed.back(), signals[29]);
+    }
+}
+
+// A network keeps its signals in a ring: deleting a subtree that holds its first, a middle or
+// its last signal leaves the others in their order.
+TEST(DesignDatabase, DeletedSignalsLeaveTheirNetworksInOrder) {
+    for (int doomed = 0; doomed < 3; ++doomed) {
+        Tree t;
+        std::vector<Ndm_Block*> blocks;
+        Ndm_Network* net = t.view->CreateNetwork();
+        for (int i = 0; i < 3; ++i) {
+            blocks.push_back(t.top->CreateBlock(("u" + std::to_string(i)).c_str()));
+            net->AddSignal(blocks.back()->CreateSignal("s"));
+        }
+        ASSERT_TRUE(t.top->DeleteBlock(blocks[doomed]));
+        std::string order;
+        for (Ndm_Signal* s = net->GetFirstSignal(); s; s = s->GetNextInNetwork()) order += s->GetBlock()->GetName();
+        const std::vector<std::string> expect = {"u1u2", "u0u2", "u0u1"};
+        EXPECT_EQ(order, expect[doomed]);
+        EXPECT_EQ(net->GetNumSignals(), 2);
+        Ndm_Signal* later = blocks[doomed == 2 ? 0 : 2]->CreateSignal("t");
+        net->AddSignal(later);
+        EXPECT_EQ(net->GetNumSignals(), 3);
+        Ndm_Signal* last = net->GetFirstSignal();
+        while (last->GetNextInNetwork()) last = last->GetNextInNetwork();
+        EXPECT_EQ(last, later);
+    }
 }
 
 TEST(DesignDatabase, ViewsAndStats) {
