@@ -168,13 +168,18 @@ public:
 
 // The design's blocks and networks, and the arena of the blocks' chunks of signals and pins.
 // Members go in reverse order: networks, then blocks, each of which takes its signals and pins
-// along.
+// along (following the links between their chunks).
 struct Ndm_Objects {
     Ndm_Arena arena;
+    std::unordered_map<const void*, void*> chunk_links;  // a full chunk -> the one after it
     Ndm_Pool<Ndm_Block> blocks;
     Ndm_Pool<Ndm_Network> networks;
     std::unordered_map<const Ndm_Block*, std::unique_ptr<Ndm_MemberIndex>> indexes;
 };
+
+void* Ndm_NextChunk(const void* chunk, const Ndm_Block* block) {
+    return block->GetView()->GetDesign()->objects_->chunk_links.at(chunk);
+}
 
 const char* Ndm_DirName(Ndm_Dir dir) {
     switch (dir) {
@@ -254,7 +259,7 @@ Ndm_Block::Ndm_Block(Ndm_Token, const char* name, Ndm_Block* parent, Ndm_View* v
 namespace {
 template <class T>
 void DestroyChunks(Ndm_Chunk<T>* first) {
-    for (Ndm_Chunk<T>* c = first; c; c = c->next)
+    for (Ndm_Chunk<T>* c = first; c; c = c->Next())
         for (uint32_t i = 0; i < c->size; ++i) c->Items()[i].~T();
 }
 }  // namespace
@@ -268,7 +273,7 @@ Ndm_Block::~Ndm_Block() {
 uint32_t Ndm_Signal::GetOrder() const {
     const Ndm_Chunk<Ndm_Signal>* mine = Ndm_Chunk<Ndm_Signal>::Of(this, slot_);
     uint32_t order = slot_;
-    for (const Ndm_Chunk<Ndm_Signal>* c = mine->block->signals_; c && c != mine; c = c->next) order += c->size;
+    for (const Ndm_Chunk<Ndm_Signal>* c = mine->block->signals_; c && c != mine; c = c->Next()) order += c->size;
     return order;
 }
 
@@ -341,16 +346,21 @@ template <class T>
 Ndm_Chunk<T>* Ndm_Block::ChunkWithRoom(Ndm_Chunk<T>*& first, size_t more) {
     Ndm_Chunk<T>* last = first;
     size_t count = 0;
-    for (; last; last = last->next) {
+    for (; last; last = last->Next()) {
         count += last->size;
-        if (!last->next) break;
+        if (!(last->room & Ndm_Chunk<T>::kFollowed)) break;
     }
-    if (last && last->room - last->size >= more) return last;
+    if (last && last->Room() - last->size >= more) return last;
     const size_t room = std::max<size_t>({more, count, 4});
     if (count + room > INT32_MAX) throw std::length_error("too many members in one block");
     void* at = view_->GetDesign()->objects_->arena.Allocate(sizeof(Ndm_Chunk<T>) + room * sizeof(T));
-    auto* chunk = new (at) Ndm_Chunk<T>{this, nullptr, 0, static_cast<uint32_t>(room)};
-    (last ? last->next : first) = chunk;
+    auto* chunk = new (at) Ndm_Chunk<T>{this, 0, static_cast<uint32_t>(room)};
+    if (last) {
+        view_->GetDesign()->objects_->chunk_links[last] = chunk;
+        last->room |= Ndm_Chunk<T>::kFollowed;
+    } else {
+        first = chunk;
+    }
     return chunk;
 }
 

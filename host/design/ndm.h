@@ -166,12 +166,20 @@ private:
 // A block's signals and pins live in chunks of their own, one chunk of each kind for a block
 // whose counts were reserved: a member finds its block through the head of its chunk, and the
 // block keeps no list of pointers. Chunks never move; a full chunk is followed by a larger one.
+// The chunk after a chunk of block's members (ndm.cpp keeps the links of the few chunks that
+// have one).
+void* Ndm_NextChunk(const void* chunk, const Ndm_Block* block);
+
 template <class T>
 struct Ndm_Chunk {
+    static constexpr uint32_t kFollowed = uint32_t{1} << 31;  // in room: a later chunk follows
     Ndm_Block* block;
-    Ndm_Chunk* next;
     uint32_t size, room;
     T* Items() { return reinterpret_cast<T*>(this + 1); }
+    uint32_t Room() const { return room & ~kFollowed; }
+    Ndm_Chunk* Next() const {
+        return room & kFollowed ? static_cast<Ndm_Chunk*>(Ndm_NextChunk(this, block)) : nullptr;
+    }
     // The chunk of a member that sits at place slot in it.
     static const Ndm_Chunk* Of(const T* member, uint32_t slot) {
         return reinterpret_cast<const Ndm_Chunk*>(member - slot) - 1;
@@ -207,7 +215,7 @@ public:
     private:
         void Settle() {
             while (chunk_ && at_ == chunk_->size) {
-                chunk_ = chunk_->next;
+                chunk_ = chunk_->Next();
                 at_ = 0;
             }
         }
@@ -220,7 +228,7 @@ public:
     iterator end() const { return iterator(); }
     size_t size() const {
         size_t n = 0;
-        for (const Ndm_Chunk<T>* c = first_; c; c = c->next) n += c->size;
+        for (const Ndm_Chunk<T>* c = first_; c; c = c->Next()) n += c->size;
         return n;
     }
     bool empty() const { return begin() == end(); }
@@ -230,7 +238,7 @@ public:
         Ndm_Chunk<T>* c = first_;
         while (i >= c->size) {
             i -= c->size;
-            c = c->next;
+            c = c->Next();
         }
         return c->Items() + i;
     }
@@ -450,6 +458,7 @@ public:
     Stats GetStats() const;
 
 private:
+    friend void* Ndm_NextChunk(const void* chunk, const Ndm_Block* block);
     friend class Ndm_Block;
     friend class Ndm_View;
     friend class Ndm_Network;
