@@ -163,13 +163,13 @@ private:
     Ndm_Signal* signal_ = nullptr;
 };
 
+// The chunk after a chunk of block's members: the design keeps the links of the few chunks
+// that have one.
+void* Ndm_NextChunk(const void* chunk, const Ndm_Block* block);
+
 // A block's signals and pins live in chunks of their own, one chunk of each kind for a block
 // whose counts were reserved: a member finds its block through the head of its chunk, and the
 // block keeps no list of pointers. Chunks never move; a full chunk is followed by a larger one.
-// The chunk after a chunk of block's members (ndm.cpp keeps the links of the few chunks that
-// have one).
-void* Ndm_NextChunk(const void* chunk, const Ndm_Block* block);
-
 template <class T>
 struct Ndm_Chunk {
     static constexpr uint32_t kFollowed = uint32_t{1} << 31;  // in room: a later chunk follows

@@ -67,22 +67,32 @@ Ndm_PropertyHolder* Ndm_Property::GetOwner() const {
     return reinterpret_cast<Ndm_PropertyHolder*>(static_cast<uintptr_t>(p->link_ & kAddress));
 }
 
+// Frees one property, not its entries.
+void Ndm_Property::Free(Ndm_Property* p, Ndm_PropertyCells& cells) {
+    const int type = p->GetType();
+    if (type == NDM_PROP_STRING_LIST && p->OwnsStrings()) delete p->strings_;
+    if (type == NDM_PROP_LIST && !(p->link_ & kOneEntry)) delete p->list_;
+    p->~Ndm_Property();
+    cells.Put(p);
+}
+
 // Lists may nest as deeply as a file makes them: entries are freed from a work list, each
-// after its own entries were taken out, so that nothing recurses.
+// after its own entries were taken out, so that nothing recurses. Most properties hold no
+// entries, and a list of one plain entry is what every value passing the filter makes: those
+// go without the work list.
 void Ndm_Property::Destroy(Ndm_Property* p, Ndm_PropertyCells& cells) {
+    if (p->GetType() != NDM_PROP_LIST || p->GetNumEntries() == 0) return Free(p, cells);
+    if (p->link_ & kOneEntry && p->entry_->GetType() != NDM_PROP_LIST) {
+        Free(p->entry_, cells);
+        return Free(p, cells);
+    }
     std::vector<Ndm_Property*> work{p};
     while (!work.empty()) {
         Ndm_Property* q = work.back();
         work.pop_back();
-        const int type = q->GetType();
-        if (type == NDM_PROP_STRING_LIST && q->OwnsStrings()) delete q->strings_;
-        if (type == NDM_PROP_LIST) {
-            const std::span<Ndm_Property* const> entries = q->GetListItr();
-            work.insert(work.end(), entries.begin(), entries.end());
-            if (!(q->link_ & kOneEntry)) delete q->list_;
-        }
-        q->~Ndm_Property();
-        cells.Put(q);
+        const std::span<Ndm_Property* const> entries = q->GetListItr();
+        work.insert(work.end(), entries.begin(), entries.end());
+        Free(q, cells);
     }
 }
 

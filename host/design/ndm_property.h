@@ -99,6 +99,7 @@ private:
     static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
     static Ndm_Property* Make(Ndm_PropertyHolder* owner, int type, const char* name);
     static void Destroy(Ndm_Property* p, Ndm_PropertyCells& cells);
+    static void Free(Ndm_Property* p, Ndm_PropertyCells& cells);
     Ndm_Property* AddEntry(int type, const char* name);
 
     // The link: the next property of the same object, or at the end (and for list entries) the
