@@ -15,6 +15,9 @@ public:
     Ndm_NamePool& operator=(const Ndm_NamePool&) = delete;
     // Stored copy of text (terminated), the same pointer for equal texts.
     const char* Intern(std::string_view text);
+    // The same for a text that seldom comes back soon (an instance or a net name): it skips the
+    // short texts' table, which it would only churn.
+    const char* InternRare(std::string_view text) { return Lookup(text); }
     // Stored copy when the text was interned before, else null.
     const char* Find(std::string_view text) const;
     size_t bytes() const { return bytes_; }

@@ -138,11 +138,12 @@ private:
         return true;
     }
 
-    // Interned, terminated copy of a string value.
-    bool Name(od::value value, const char*& out, const char* what) {
+    // Interned, terminated copy of a string value; rare for block and signal names, which seldom
+    // come back soon (pin names and types do).
+    bool Name(od::value value, const char*& out, const char* what, bool rare = false) {
         std::string_view text;
         if (!String(value, text, what)) return false;
-        out = design_.Intern(text);
+        out = rare ? design_.InternRare(text) : design_.Intern(text);
         return true;
     }
 
@@ -259,7 +260,7 @@ private:
                      od::value value) {
         if (key == "name") {
             const char* name;
-            if (!Name(value, name, "block \"name\"")) return false;
+            if (!Name(value, name, "block \"name\"", true)) return false;
             if (block) return Shape("a block has two names");
             block = parent ? parent->CreateBlock(Ndm_Interned{name}) : view->CreateTopBlock(name);
             return true;
@@ -420,7 +421,7 @@ private:
         if (error_code e = value.type().get(type)) return JsonError(e, "bad signal");
         if (type == od::json_type::string) {  // a signal without properties: its name
             const char* name;
-            if (!Name(value, name, "signal name")) return false;
+            if (!Name(value, name, "signal name", true)) return false;
             signals_.push_back(block.CreateSignal(Ndm_Interned{name}));
             return true;
         }
@@ -433,7 +434,7 @@ private:
             od::raw_json_string key = field.key();
             if (key == "name") {
                 const char* name;
-                if (!Name(field.value(), name, "signal \"name\"")) return false;
+                if (!Name(field.value(), name, "signal \"name\"", true)) return false;
                 if (signal) return Shape("a signal has two names");
                 signal = block.CreateSignal(Ndm_Interned{name});
                 signals_.push_back(signal);

@@ -639,6 +639,7 @@ Ndm_Design::Ndm_Design(const char* name)
 Ndm_Design::~Ndm_Design() { DeleteAllProperties(); }
 
 const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
+const char* Ndm_Design::InternRare(std::string_view name) { return names_->InternRare(name); }
 
 const char* Ndm_Design::FindInterned(std::string_view name) const { return names_->Find(name); }
 

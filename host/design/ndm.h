@@ -441,6 +441,9 @@ public:
 
     // Interned copy of a name, valid as long as the design.
     const char* Intern(std::string_view name);
+    // The same for a name that seldom comes back soon, as instance and net names do not: readers
+    // intern millions of those.
+    const char* InternRare(std::string_view name);
     // Interned copy when the name is known to the design, else null.
     const char* FindInterned(std::string_view name) const;
 

@@ -337,7 +337,9 @@ bool Reader::MemberName(Module& m, od::raw_json_string key, const char* kind, in
     std::string_view text;
     if (!KeyText(key, text)) return false;
     if (!NameOk(StripEscape(text), &m, kind)) return true;
-    const char* interned = design_.Intern(StripEscape(text));
+    // Port names come back on every cell of the module's type; cell and net names seldom do.
+    const std::string_view bare = StripEscape(text);
+    const char* interned = seen == kSeenPorts ? design_.Intern(bare) : design_.InternRare(bare);
     if (FirstOfName(seen_[seen], interned, m, kind)) name = interned;
     return true;
 }
