@@ -124,6 +124,10 @@ public:
             list->insert(at, member);
         }
     }
+    // A member made after the index: in it once the index of its kind is built.
+    void Added(Ndm_Design* design, int category, const char* name, void* member) {
+        if (built[category]) Add(design, category, name, member);
+    }
     void AddFolded(Ndm_Design* design, int category, const char* name, void* member) {
         if (folded[category].InsertIfAbsent(design->Intern(FoldName(name)), member) != member)
             dup_folded[category] = true;
@@ -305,7 +309,7 @@ Ndm_Block* Ndm_Block::CreateBlock(Ndm_Interned name) {
     Ndm_Block* block = design->objects_->blocks.Make(Ndm_Token(), stored, this, view_);
     block->order_ = blocks_.empty() ? 0 : blocks_.back()->order_ + 1;
     blocks_.push_back(block);
-    if (indexed_ && Index().built[kBlocks]) Index().Add(design, kBlocks, stored, block);
+    if (indexed_) Index().Added(design, kBlocks, stored, block);
     return block;
 }
 
@@ -320,7 +324,7 @@ Ndm_Signal* Ndm_Block::CreateSignal(Ndm_Interned name) {
     Ndm_Chunk<Ndm_Signal>* chunk = ChunkWithRoom(signals_, 1);
     Ndm_Signal* signal = new (chunk->Items() + chunk->size) Ndm_Signal(Ndm_Token(), stored, chunk->size);
     ++chunk->size;
-    if (indexed_ && Index().built[kSignals]) Index().Add(design, kSignals, stored, signal);
+    if (indexed_) Index().Added(design, kSignals, stored, signal);
     return signal;
 }
 
@@ -335,7 +339,7 @@ Ndm_Pin* Ndm_Block::CreatePin(Ndm_Interned name, Ndm_Dir dir) {
     Ndm_Chunk<Ndm_Pin>* chunk = ChunkWithRoom(pins_, 1);
     Ndm_Pin* pin = new (chunk->Items() + chunk->size) Ndm_Pin(Ndm_Token(), stored, dir, chunk->size);
     ++chunk->size;
-    if (indexed_ && Index().built[kPins]) Index().Add(design, kPins, stored, pin);
+    if (indexed_) Index().Added(design, kPins, stored, pin);
     return pin;
 }
 
