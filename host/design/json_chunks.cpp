@@ -117,6 +117,7 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
         size_t open, separator, cut, element;
         uint32_t record;
         bool object;
+        size_t commas = 0;
     };
     std::vector<Open> stack;
     auto record = [&out](Open& t) {
@@ -157,6 +158,7 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
                     t.cut = pos;
                 }
                 t.separator = pos;
+                ++t.commas;
             } else if (c == '{' || c == '[') {
                 if (closed) return false;
                 const size_t element = stack.empty() ? pos : stack.back().separator + 1;
@@ -170,6 +172,7 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
                 if (t.record == UINT32_MAX && pos - t.open < piece) continue;
                 const uint32_t r = record(t);
                 out.containers[r].close = pos;
+                out.containers[r].members = t.commas + 1;  // a large container is not empty
                 if (stack.empty())
                     out.root = r;
                 else
@@ -290,7 +293,7 @@ bool Reader::Read(const Outline& outline, Visitor& visitor) {
         end_ = child->open;
         run_size_ = 0;
         Visitor::Take take = Visitor::Take::Parts;
-        if (!visitor.Enter(key, child->object, take)) return false;
+        if (!visitor.Enter(key, child->object, child->members, take)) return false;
         if (take == Visitor::Take::Whole) {
             if (!Whole(key, *child, visitor) || !after(f, child->close)) return false;
             continue;

@@ -31,6 +31,7 @@ Sizes& GetSizes();
 // commas that cut it into runs, and the large containers directly inside it, in order.
 struct Container {
     size_t open = 0, close = 0, element = 0;
+    size_t members = 0;  // how many members or elements it has, for readers that reserve room
     bool object = false;
     std::vector<size_t> cuts;
     std::vector<uint32_t> children;
@@ -57,10 +58,11 @@ public:
     // A member of the large container being read (key is unset for an array element), with a
     // value small enough to be read at once. False stops the reading (the visitor has reported).
     virtual bool Member(simdjson::ondemand::raw_json_string key, simdjson::ondemand::value value) = 0;
-    // A large member begins. The visitor either takes it whole (a single Member call follows,
-    // with the whole value parsed at once) or in parts (its own members follow, then Leave).
+    // A large member begins, an object or an array of that many members. The visitor either
+    // takes it whole (a single Member call follows, with the whole value parsed at once) or in
+    // parts (its own members follow, then Leave).
     enum class Take { Parts, Whole };
-    virtual bool Enter(simdjson::ondemand::raw_json_string key, bool object, Take& take) = 0;
+    virtual bool Enter(simdjson::ondemand::raw_json_string key, bool object, size_t members, Take& take) = 0;
     virtual bool Leave() = 0;
 };
 

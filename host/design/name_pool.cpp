@@ -1,5 +1,7 @@
 #include "host/design/name_pool.h"
 
+#include <algorithm>
+#include <bit>
 #include <cstdint>
 #include <cstring>
 #include <new>
@@ -143,8 +145,18 @@ void Ndm_NamePool::Insert(const char* stored, uint64_t hash) {
     slots_[i] = TagOf(hash) | reinterpret_cast<uintptr_t>(stored);
 }
 
-void Ndm_NamePool::Grow() {
-    std::vector<uint64_t>(slots_.size() * 2).swap(slots_);
+namespace {
+// Slots for that many entries at most half full: a power of two.
+size_t SlotsFor(size_t entries) { return std::bit_ceil(std::max<size_t>(16, entries * 2)); }
+}  // namespace
+
+void Ndm_NamePool::Reserve(size_t more) {
+    const size_t slots = SlotsFor(used_ + more);
+    if (slots > slots_.size()) Rehash(slots);
+}
+
+void Ndm_NamePool::Rehash(size_t slots) {
+    std::vector<uint64_t>(slots).swap(slots_);
     for (const Chunk& chunk : chunks_) {
         const char* at = chunk.bytes.get();
         const char* const end = at + chunk.used;
@@ -187,8 +199,13 @@ void* Ndm_PtrMap::InsertIfAbsent(const void* key, void* value) {
     }
 }
 
-void Ndm_PtrMap::Grow() {
-    std::vector<Slot> old(slots_.empty() ? 16 : slots_.size() * 2);
+void Ndm_PtrMap::Reserve(size_t keys) {
+    const size_t slots = SlotsFor(keys + 1);
+    if (slots > slots_.size()) Rehash(slots);
+}
+
+void Ndm_PtrMap::Rehash(size_t slots) {
+    std::vector<Slot> old(slots);
     old.swap(slots_);
     size_t mask = slots_.size() - 1;
     for (const Slot& s : old) {

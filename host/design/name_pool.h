@@ -21,6 +21,8 @@ public:
     // Stored copy when the text was interned before, else null.
     const char* Find(std::string_view text) const;
     size_t bytes() const { return bytes_; }
+    // Makes room for that many more texts, so that the set grows at most once for them.
+    void Reserve(size_t more);
     // A block of size bytes that the pool keeps with its texts, for texts a caller lays out
     // itself (they are not interned).
     char* Keep(size_t size);
@@ -33,7 +35,8 @@ private:
     // texts again, reading the chunks front to back.
     static constexpr int kAddressBits = 48;
     const char* Store(std::string_view text);
-    void Grow();
+    void Grow() { Rehash(slots_.size() * 2); }
+    void Rehash(size_t slots);
     void Insert(const char* stored, uint64_t hash);
     // A stored text is preceded by its length: one byte below 255, else 255, eight bytes of
     // length and 255 again; it is followed by a NUL.
@@ -68,6 +71,8 @@ public:
     // Inserts unless the key is there; returns the value now stored.
     void* InsertIfAbsent(const void* key, void* value);
     void* Find(const void* key) const;
+    // Makes room for that many keys in all.
+    void Reserve(size_t keys);
     void Clear() {
         slots_.clear();
         used_ = 0;
@@ -79,7 +84,8 @@ private:
         void* value = nullptr;
     };
     static size_t HashPtr(const void* key);
-    void Grow();
+    void Grow() { Rehash(slots_.empty() ? 16 : slots_.size() * 2); }
+    void Rehash(size_t slots);
     std::vector<Slot> slots_;
     size_t used_ = 0;
 };

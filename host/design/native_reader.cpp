@@ -319,7 +319,7 @@ private:
 
         // A large member is read in parts where the whole-file reading would walk into it, and
         // whole (where its reader reports what is wrong with it) anywhere else.
-        bool Enter(od::raw_json_string key, bool object, Take& take) override {
+        bool Enter(od::raw_json_string key, bool object, size_t members, Take& take) override {
             const Level l = stack_.back();
             Level next{Ctx::Skip, l.view, l.block, l.parent};
             take = Take::Whole;
@@ -353,6 +353,9 @@ private:
                     if (!object && (key == "signals" || key == "pins" || key == "blocks")) {
                         next = {key == "signals" ? Ctx::Signals : key == "pins" ? Ctx::Pins : Ctx::Blocks, l.view,
                                 l.block, nullptr};
+                        // Names of signals and child blocks seldom repeat: they get room at once,
+                        // and a block has about as many children as signals, which come first.
+                        if (next.ctx != Ctx::Pins) r_.design_.ReserveNames(next.ctx == Ctx::Signals ? 2 * members : members);
                     } else if (key == "name" || key == "type" || key == "properties" || key == "signals" ||
                                key == "pins" || key == "blocks") {
                         return true;

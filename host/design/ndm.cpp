@@ -645,6 +645,8 @@ Ndm_Design::~Ndm_Design() { DeleteAllProperties(); }
 const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
 const char* Ndm_Design::InternRare(std::string_view name) { return names_->InternRare(name); }
 
+void Ndm_Design::ReserveNames(size_t more) { names_->Reserve(more); }
+
 const char* Ndm_Design::FindInterned(std::string_view name) const { return names_->Find(name); }
 
 Ndm_View* Ndm_Design::GetViewByName(const char* name) const {

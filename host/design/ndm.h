@@ -444,6 +444,8 @@ public:
     // The same for a name that seldom comes back soon, as instance and net names do not: readers
     // intern millions of those.
     const char* InternRare(std::string_view name);
+    // Makes room for that many more names, for readers that know how many are coming.
+    void ReserveNames(size_t more);
     // Interned copy when the name is known to the design, else null.
     const char* FindInterned(std::string_view name) const;
 

@@ -94,7 +94,7 @@ public:
 
     // A large member is read in parts where the whole-file reading would walk into it, and
     // whole (where its reader reports what is wrong with it) anywhere else.
-    bool Enter(od::raw_json_string key, bool object, Take& take) override {
+    bool Enter(od::raw_json_string key, bool object, size_t members, Take& take) override {
         Ctx next = Ctx::Skip;
         take = Take::Whole;
         switch (stack_.back()) {
@@ -115,10 +115,13 @@ public:
             case Ctx::Module:
                 if (object && key == "cells") {
                     next = Ctx::Cells;
+                    r_.ExpectMembers(kSeenCells, members);
                 } else if (object && key == "netnames") {
                     next = Ctx::Nets;
+                    r_.ExpectMembers(kSeenNets, members);
                 } else if (object && key == "ports") {
                     next = Ctx::Ports;
+                    r_.ExpectMembers(kSeenPorts, members);
                 } else if (key == "attributes" || key == "cells" || key == "netnames" || key == "ports") {
                     return true;
                 }
@@ -328,6 +331,16 @@ bool Reader::ParsePorts(od::value value, Module& m) {
         if (!PortMember(m, field.key(), field.value())) return false;
     }
     return true;
+}
+
+// A large module's ports, cells or netnames (seen: which of seen_) are about to be read: their
+// names get room at once rather than as they come.
+void Reader::ExpectMembers(int seen, size_t members) {
+    // A netlist has about as many nets as cells, and the cells come first: room for both at once
+    // spares the name set a second growth.
+    if (seen == kSeenCells) design_.ReserveNames(2 * members);
+    if (seen == kSeenNets) design_.ReserveNames(members);
+    seen_[seen].Reserve(members);
 }
 
 // The interned name of a port, cell or net of m from its key (seen: which of seen_). False for a

@@ -234,6 +234,7 @@ private:
     bool ModuleMember(od::raw_json_string key, od::value value);  // of module_
     bool ParseAttributes(od::value value, Module& m);
     bool ParsePorts(od::value value, Module& m);
+    void ExpectMembers(int seen, size_t members);
     bool MemberName(Module& m, od::raw_json_string key, const char* kind, int seen, const char*& name);
     bool PortMember(Module& m, od::raw_json_string name_key, od::value value);
     bool ParseCells(od::value value, Module& m);
