@@ -22,6 +22,7 @@ bool SlowOutline(const std::string& t, size_t piece, Outline& out) {
         size_t open, separator, cut, element;
         uint32_t record;
         bool object;
+        size_t commas = 0;
     };
     std::vector<Open> stack;
     auto record = [&](Open& o) {
@@ -50,6 +51,7 @@ bool SlowOutline(const std::string& t, size_t piece, Outline& out) {
                 stack.back().cut = i;
             }
             stack.back().separator = i;
+            ++stack.back().commas;
         } else if (c == '[' || c == '{') {
             if (closed) return false;
             stack.push_back({i, i, i, stack.empty() ? i : stack.back().separator + 1, UINT32_MAX, c == '{'});
@@ -62,6 +64,7 @@ bool SlowOutline(const std::string& t, size_t piece, Outline& out) {
             if (o.record == UINT32_MAX && i - o.open < piece) continue;
             const uint32_t r = record(o);
             out.containers[r].close = i;
+            out.containers[r].members = o.commas + 1;
             if (stack.empty())
                 out.root = r;
             else
@@ -129,6 +132,7 @@ void ExpectSame(const std::string& text, size_t piece) {
         ASSERT_EQ(f.object, s.object) << text;
         ASSERT_EQ(f.cuts, s.cuts) << text;
         ASSERT_EQ(f.children, s.children) << text;
+        ASSERT_EQ(f.members, s.members) << text;
     }
 }
 
@@ -175,6 +179,7 @@ TEST(JsonOutline, RefusesWhatIsNotOneArrayOrObject) {
     EXPECT_EQ(root.open, 1u);
     EXPECT_EQ(root.close, text.size() - 3);
     EXPECT_EQ(root.cuts, std::vector<size_t>{9});
+    EXPECT_EQ(root.members, 2u);
     ASSERT_EQ(root.children.size(), 1u);  // {"k": [3]} spans 10 bytes, [1, 2] only 6
     EXPECT_EQ(out.containers[root.children[0]].open, 11u);
     EXPECT_EQ(out.containers[root.children[0]].element, 10u);
