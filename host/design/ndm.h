@@ -190,13 +190,8 @@ struct Ndm_Chunk {
 template <class T>
 class Ndm_ChunkRange {
 public:
-    class iterator {
+    class iterator : public Ndm_PointerIterator<T> {
     public:
-        using iterator_category = std::forward_iterator_tag;
-        using value_type = T*;
-        using difference_type = std::ptrdiff_t;
-        using pointer = T* const*;
-        using reference = T*;
         iterator() = default;
         explicit iterator(Ndm_Chunk<T>* chunk) : chunk_(chunk) { Settle(); }
         T* operator*() const { return chunk_->Items() + at_; }

@@ -142,16 +142,22 @@ private:
     uint64_t link_;
 };
 
+// What an iterator that hands out pointers to T by value declares of itself.
+template <class T>
+struct Ndm_PointerIterator {
+    using iterator_category = std::forward_iterator_tag;
+    using value_type = T*;
+    using difference_type = std::ptrdiff_t;
+    using pointer = T* const*;
+    using reference = T*;
+    bool operator==(const Ndm_PointerIterator&) const = default;
+};
+
 // The properties of an object in creation order, as a range of pointers.
 class Ndm_PropertyRange {
 public:
-    class iterator {
+    class iterator : public Ndm_PointerIterator<Ndm_Property> {
     public:
-        using iterator_category = std::forward_iterator_tag;
-        using value_type = Ndm_Property*;
-        using difference_type = std::ptrdiff_t;
-        using pointer = Ndm_Property* const*;
-        using reference = Ndm_Property*;
         iterator() = default;
         explicit iterator(Ndm_Property* at) : at_(at) {}
         Ndm_Property* operator*() const { return at_; }
