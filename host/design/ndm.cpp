@@ -357,10 +357,11 @@ Ndm_Chunk<T>* Ndm_Block::ChunkWithRoom(Ndm_Chunk<T>*& first, size_t more) {
     if (last && last->Room() - last->size >= more) return last;
     const size_t room = std::max<size_t>({more, count, 4});
     if (count + room > INT32_MAX) throw std::length_error("too many members in one block");
-    void* at = view_->GetDesign()->objects_->arena.Allocate(sizeof(Ndm_Chunk<T>) + room * sizeof(T));
+    Ndm_Objects& objects = *view_->GetDesign()->objects_;
+    void* at = objects.arena.Allocate(sizeof(Ndm_Chunk<T>) + room * sizeof(T));
     auto* chunk = new (at) Ndm_Chunk<T>{this, 0, static_cast<uint32_t>(room)};
     if (last) {
-        view_->GetDesign()->objects_->chunk_links[last] = chunk;
+        objects.chunk_links[last] = chunk;
         last->room |= Ndm_Chunk<T>::kFollowed;
     } else {
         first = chunk;

@@ -281,14 +281,18 @@ Ndm_Property* Ndm_PropertyHolder::Create(int type, const char* name) {
     if (!name) return nullptr;
     Ndm_Property* fresh = Ndm_Property::Make(this, type, name);
     Ndm_Property* prev = nullptr;
-    for (Ndm_Property* p = props_; p; prev = p, p = p->Next()) {
-        if (std::strcmp(p->name_, name) != 0) continue;
-        fresh->LinkAs(p->link_);
-        (prev ? prev->LinkTo(fresh) : void(props_ = fresh));
-        Ndm_Property::Destroy(p, Ndm_Property::CellsOf(this));
-        return fresh;
+    Ndm_Property* p = props_;
+    // Names are interned: equal names are the same pointer.
+    while (p && p->name_ != fresh->name_) {
+        prev = p;
+        p = p->Next();
     }
-    (prev ? prev->LinkTo(fresh) : void(props_ = fresh));
+    if (p) fresh->LinkAs(p->link_);  // in the old one's place
+    if (prev)
+        prev->LinkTo(fresh);
+    else
+        props_ = fresh;
+    if (p) Ndm_Property::Destroy(p, Ndm_Property::CellsOf(this));
     return fresh;
 }
 

@@ -26,8 +26,6 @@ public:
         left_ -= bytes;
         return out;
     }
-    // Bytes taken from the system.
-    size_t Reserved() const { return reserved_; }
 
 private:
     static constexpr size_t kChunk = size_t{1} << 20;
@@ -37,11 +35,9 @@ private:
     void* Refill(size_t bytes) {
         if (bytes > kChunk / 4) {
             chunks_.emplace_back(new Word[bytes / 8]);
-            reserved_ += bytes;
             return chunks_.back().get();
         }
         chunks_.emplace_back(new Word[kChunk / 8]);
-        reserved_ += kChunk;
         cursor_ = reinterpret_cast<unsigned char*>(chunks_.back().get()) + bytes;
         left_ = kChunk - bytes;
         return chunks_.back().get();
@@ -49,7 +45,6 @@ private:
     std::vector<std::unique_ptr<Word[]>> chunks_;
     unsigned char* cursor_ = nullptr;
     size_t left_ = 0;
-    size_t reserved_ = 0;
 };
 
 // Objects of one type, made in chunks of kPer and destroyed in the order they were made.
