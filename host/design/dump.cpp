@@ -112,8 +112,8 @@ private:
         if (!holder.GetNumProperties()) return;
         const Ndm_PropertyRange props = holder.GetPropertyItr();
         top_props_.assign(props.begin(), props.end());
-        std::vector<std::pair<std::span<Ndm_Property* const>, size_t>>& stack = lists_;
-        stack.assign(1, {top_props_, 0});
+        std::vector<std::pair<Ndm_EntryRange, size_t>>& stack = lists_;
+        stack.assign(1, {Ndm_EntryRange(top_props_), 0});
         while (!stack.empty()) {
             auto& [list, next] = stack.back();
             if (next == list.size()) {
@@ -214,7 +214,7 @@ private:
     std::ostream& out_;
     std::string buf_;
     std::string name_;
-    std::vector<std::pair<std::span<Ndm_Property* const>, size_t>> lists_;  // open property lists
+    std::vector<std::pair<Ndm_EntryRange, size_t>> lists_;  // open property lists
     std::vector<Ndm_Property*> top_props_;  // the properties of the object being printed
 };
 

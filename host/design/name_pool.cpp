@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <cstring>
 #include <new>
+#include <stdexcept>
 
 namespace {
 constexpr size_t kChunk = 1 << 20;
@@ -37,8 +38,60 @@ uint64_t Ndm_NamePool::Hash(std::string_view text) {
     return h;
 }
 
+namespace {
+// The chunks that gave out text ids, process-wide, so that an id alone finds its text. Numbers
+// of released chunks are reused; 0 is not a chunk.
+constexpr size_t kMaxTextChunks = size_t{1} << 12;
+const char* g_text_chunks[kMaxTextChunks];
+std::vector<uint32_t>& FreeTextChunks() {
+    static std::vector<uint32_t> free;
+    return free;
+}
+uint32_t g_text_chunks_used = 1;
+}  // namespace
+
+const char* Ndm_NamePool::TextBase(uint32_t chunk_id) { return g_text_chunks[chunk_id]; }
+
 Ndm_NamePool::Ndm_NamePool() : slots_(1024) {}
-Ndm_NamePool::~Ndm_NamePool() = default;
+Ndm_NamePool::~Ndm_NamePool() {
+    for (const Chunk& chunk : chunks_) {
+        if (!chunk.id) continue;
+        g_text_chunks[chunk.id] = nullptr;
+        FreeTextChunks().push_back(chunk.id);
+    }
+}
+
+uint32_t Ndm_NamePool::IdOf(const char* stored) {
+    if (!stored || !*stored) return 0;
+    const auto at = reinterpret_cast<uintptr_t>(stored);
+    auto holds = [&](size_t c) {
+        const auto base = reinterpret_cast<uintptr_t>(chunks_[c].bytes.get());
+        return at >= base && at < base + chunks_[c].used;
+    };
+    size_t c = last_id_chunk_;
+    if (c >= chunks_.size() || !holds(c)) {
+        auto it = std::upper_bound(by_address_.begin(), by_address_.end(), at, [&](uintptr_t a, uint32_t i) {
+            return a < reinterpret_cast<uintptr_t>(chunks_[i].bytes.get());
+        });
+        // Only texts this pool stored have ids.
+        if (it == by_address_.begin() || !holds(*(it - 1))) throw std::invalid_argument("text not interned here");
+        c = *(it - 1);
+        last_id_chunk_ = c;
+    }
+    Chunk& chunk = chunks_[c];
+    if (!chunk.id) {
+        std::vector<uint32_t>& free = FreeTextChunks();
+        if (!free.empty()) {
+            chunk.id = free.back();
+            free.pop_back();
+        } else {
+            if (g_text_chunks_used == kMaxTextChunks) throw std::bad_alloc();
+            chunk.id = g_text_chunks_used++;
+        }
+        g_text_chunks[chunk.id] = chunk.bytes.get();
+    }
+    return chunk.id << kOffsetBits | static_cast<uint32_t>(at - reinterpret_cast<uintptr_t>(chunk.bytes.get()));
+}
 
 namespace {
 constexpr uint64_t kAddressMask = (uint64_t{1} << 48) - 1;
@@ -119,7 +172,11 @@ const char* Ndm_NamePool::Store(std::string_view text) {
         std::unique_ptr<char[]> bytes(new char[size]);
         // Addresses are kept in 48 bits, as every 64-bit system gives them to programs.
         if ((reinterpret_cast<uintptr_t>(bytes.get()) + size) >> kAddressBits) throw std::bad_alloc();
+        const char* base = bytes.get();
         chunks_.push_back(Chunk{std::move(bytes), 0});
+        auto place = std::upper_bound(by_address_.begin(), by_address_.end(), base,
+                                      [&](const char* a, uint32_t i) { return a < chunks_[i].bytes.get(); });
+        by_address_.insert(place, static_cast<uint32_t>(chunks_.size() - 1));
         if (!alone || chunks_.size() == 1) open_ = chunks_.size() - 1;
         chunk = &chunks_.back();
     }

@@ -29,11 +29,21 @@ public:
 
     static uint64_t Hash(std::string_view text);
 
+    // A 32-bit id of a text this pool interned (the same id for the same text), for values that
+    // keep their text in four bytes; Text(id) gives it back, and 0 stands for the empty text.
+    uint32_t IdOf(const char* stored);
+    static const char* Text(uint32_t id) { return id ? TextBase(id >> kOffsetBits) + (id & kOffsetMask) : ""; }
+
 private:
     // A slot is 8 bytes: the stored text's address in the low 48 bits and the top 16 bits of
     // its hash above them (0: empty). The full hash is not kept: growing the set hashes the
     // texts again, reading the chunks front to back.
     static constexpr int kAddressBits = 48;
+    // An id is the number of the chunk (registered with the process on the first id asked of
+    // it) and the text's place in it.
+    static constexpr int kOffsetBits = 20;
+    static constexpr uint32_t kOffsetMask = (uint32_t{1} << kOffsetBits) - 1;
+    static const char* TextBase(uint32_t chunk_id);
     const char* Store(std::string_view text);
     void Grow() { Rehash(slots_.size() * 2); }
     void Rehash(size_t slots);
@@ -57,8 +67,11 @@ private:
     struct Chunk {
         std::unique_ptr<char[]> bytes;
         size_t used;
+        uint32_t id = 0;  // registered number, or 0
     };
     std::vector<Chunk> chunks_;  // stored texts, in the order they came
+    std::vector<uint32_t> by_address_;  // places in chunks_, by the chunks' addresses
+    size_t last_id_chunk_ = 0;          // the chunk the last id came from
     size_t open_ = 0;            // the chunk texts are added to, when chunks_ is not empty
     std::vector<std::unique_ptr<char[]>> kept_;
     size_t bytes_ = 0;

@@ -222,8 +222,8 @@ private:
     // Lists may nest as deeply as a file made them: the writer keeps its own stack.
     void PropertyList(Ndm_PropertyRange props) {
         top_props_.assign(props.begin(), props.end());
-        std::vector<std::pair<std::span<Ndm_Property* const>, size_t>>& stack = lists_;
-        stack.assign(1, {top_props_, 0});
+        std::vector<std::pair<Ndm_EntryRange, size_t>>& stack = lists_;
+        stack.assign(1, {Ndm_EntryRange(top_props_), 0});
         buf_ += '[';
         while (!stack.empty()) {
             auto& [list, next] = stack.back();
@@ -313,7 +313,7 @@ private:
     Port::AtomicFile file_;
     std::string buf_;
     Ndm_PtrMap ordinal_;  // signal -> 1 + its number
-    std::vector<std::pair<std::span<Ndm_Property* const>, size_t>> lists_;  // open property lists
+    std::vector<std::pair<Ndm_EntryRange, size_t>> lists_;  // open property lists
     std::vector<Ndm_Property*> top_props_;  // the properties of the object being written
     bool ok_ = true;
     std::string why_;

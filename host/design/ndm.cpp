@@ -645,6 +645,7 @@ Ndm_Design::~Ndm_Design() { DeleteAllProperties(); }
 
 const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
 const char* Ndm_Design::InternRare(std::string_view name) { return names_->InternRare(name); }
+uint32_t Ndm_Design::TextId(const char* interned) { return names_->IdOf(interned); }
 
 void Ndm_Design::ReserveNames(size_t more) { names_->Reserve(more); }
 

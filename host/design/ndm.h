@@ -439,6 +439,8 @@ public:
     // The same for a name that seldom comes back soon, as instance and net names do not: readers
     // intern millions of those.
     const char* InternRare(std::string_view name);
+    // A 32-bit id of an interned name (Ndm_NamePool::IdOf).
+    uint32_t TextId(const char* interned);
     // Makes room for that many more names, for readers that know how many are coming.
     void ReserveNames(size_t more);
     // Interned copy when the name is known to the design, else null.

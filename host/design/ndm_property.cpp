@@ -6,6 +6,7 @@
 #include <new>
 
 #include "host/design/ndm.h"
+#include "host/design/name_pool.h"
 #include "host/design/property_store.h"
 
 const char* Ndm_PropTypeName(int type) {
@@ -28,96 +29,261 @@ Ndm_Property* Set(Ndm_Property* p, double v) { return p ? (p->SetFloat64(v), p) 
 Ndm_Property* Set(Ndm_Property* p, const char* v) { return p ? (p->SetValueString(v), p) : p; }
 }  // namespace
 
+// ---- storage ----
+
+unsigned char* Ndm_PropertyTables::chunks[Ndm_PropertyTables::kMaxChunks];
+const char* const* Ndm_PropertyTables::names = nullptr;
+
+namespace {
+// Chunk numbers given back by designs that went, for the next ones; 0 is never a chunk.
+std::vector<uint32_t>& FreeCellChunks() {
+    static std::vector<uint32_t> free;
+    return free;
+}
+uint32_t g_cell_chunks_used = 1;
+}  // namespace
+
 void Ndm_PropertyCells::Refill() {
-    // Chunks grow with the design, from 4 KB to 1 MB.
-    const size_t count = std::min<size_t>(size_t{128} << std::min<size_t>(chunks_.size(), 8), 32768);
-    std::unique_ptr<Cell[]> chunk(new Cell[count]);
-    // Properties link to one another through 48-bit addresses, as every 64-bit system gives.
-    if ((reinterpret_cast<uintptr_t>(chunk.get() + count) >> 48) != 0) throw std::bad_alloc();
-    chunks_.push_back(std::move(chunk));
-    cursor_ = chunks_.back().get();
-    left_ = count;
+    uint32_t number;
+    if (!FreeCellChunks().empty()) {
+        number = FreeCellChunks().back();
+        FreeCellChunks().pop_back();
+    } else {
+        if (g_cell_chunks_used == kMaxChunks) throw std::bad_alloc();
+        number = g_cell_chunks_used++;
+    }
+    Ndm_PropertyTables::chunks[number] = static_cast<unsigned char*>(::operator new(kCell << kPlaceBits));
+    chunks_.push_back(number);
+    next_ = number << kPlaceBits;
+    left_ = uint32_t{1} << kPlaceBits;
+    if (number == 0) {  // never: 0 is no cell
+        ++next_;
+        --left_;
+    }
 }
 
-static_assert(sizeof(Ndm_Property) == Ndm_PropertyCells::kCell, "a property is three words");
+Ndm_PropertyCells::~Ndm_PropertyCells() {
+    for (uint32_t number : chunks_) {
+#if NDM_ASAN
+        ASAN_UNPOISON_MEMORY_REGION(Ndm_PropertyTables::chunks[number], kCell << kPlaceBits);
+#endif
+        ::operator delete(Ndm_PropertyTables::chunks[number]);
+        Ndm_PropertyTables::chunks[number] = nullptr;
+        FreeCellChunks().push_back(number);
+    }
+}
+
+void** Ndm_Handles::pages_[Ndm_Handles::kMaxPages];
+
+namespace {
+// Released handles, for reuse; handles are numbered from 1.
+std::vector<uint32_t>& FreeHandles() {
+    static std::vector<uint32_t> free;
+    return free;
+}
+uint32_t g_handles_used = 1;
+}  // namespace
+
+uint32_t Ndm_Handles::Add(void* p) {
+    uint32_t handle;
+    if (!FreeHandles().empty()) {
+        handle = FreeHandles().back();
+        FreeHandles().pop_back();
+    } else {
+        handle = g_handles_used;
+        void**& page = pages_[handle >> kPageBits];
+        if (!page) {
+            if ((handle >> kPageBits) >= kMaxPages - 1) throw std::bad_alloc();
+            page = new void*[size_t{1} << kPageBits]();
+        }
+        ++g_handles_used;
+    }
+    pages_[handle >> kPageBits][handle & kPageMask] = p;
+    return handle;
+}
+
+void Ndm_Handles::Remove(uint32_t handle) {
+    if (!handle) return;
+    pages_[handle >> kPageBits][handle & kPageMask] = nullptr;
+    FreeHandles().push_back(handle);
+}
+
+Ndm_PropertyNames::Table& Ndm_PropertyNames::Tables() {
+    static Table table;
+    return table;
+}
+
+std::vector<const char*> Ndm_PropertyNames::names_;
+Ndm_PropertyNames::Recent Ndm_PropertyNames::recent_[64];
+
+uint32_t Ndm_PropertyNames::Id(const char* name) {
+    const size_t n = std::strlen(name);
+    Recent* recent = nullptr;
+    Recent key;
+    if (n <= 16) {
+        key.size = static_cast<uint32_t>(n);
+        if (n > 8) {
+            std::memcpy(&key.head, name, 8);
+            std::memcpy(&key.tail, name + 8, n - 8);
+        } else {
+            std::memcpy(&key.head, name, n);
+        }
+        recent = &recent_[((key.head * 0x9e3779b97f4a7c15ull) ^ (key.tail * 0x94d049bb133111ebull) ^ n) >> 58];
+        if (recent->id != kMaxIds && recent->head == key.head && recent->tail == key.tail && recent->size == n)
+            return recent->id;
+    }
+    Table& t = Tables();
+    const char* stored = t.pool.Intern(std::string_view(name, n));
+    const auto fresh = reinterpret_cast<void*>(uintptr_t{names_.size()} + 1);
+    const auto id = static_cast<uint32_t>(reinterpret_cast<uintptr_t>(t.ids.InsertIfAbsent(stored, fresh)) - 1);
+    if (id == names_.size()) {
+        if (id == kMaxIds) throw std::bad_alloc();
+        names_.push_back(stored);
+        Ndm_PropertyTables::names = names_.data();
+    }
+    if (recent) {
+        key.id = id;
+        *recent = key;
+    }
+    return id;
+}
+
+Ndm_TextLists::~Ndm_TextLists() {
+    for (const auto& [key, value] : lists_) Ndm_Handles::Remove(value.handle);
+}
+
+uint32_t Ndm_TextLists::Extend(uint32_t list, const char* text) {
+    const Key key{list, text};
+    Recent& recent = recent_[KeyHash()(key) % std::size(recent_)];
+    if (recent.handle && recent.key == key) return recent.handle;
+    Value& slot = lists_[key];
+    if (!slot.texts) {
+        const auto* before = list ? static_cast<const std::vector<std::string>*>(Ndm_Handles::Get(list)) : nullptr;
+        slot.texts = std::make_unique<std::vector<std::string>>();
+        slot.texts->reserve((before ? before->size() : 0) + 1);
+        if (before) *slot.texts = *before;
+        slot.texts->emplace_back(text);
+        slot.handle = Ndm_Handles::Add(slot.texts.get());
+    }
+    recent = Recent{key, slot.handle};
+    return slot.handle;
+}
+
+// ---- properties ----
+
+static_assert(sizeof(Ndm_Property) == Ndm_PropertyCells::kCell, "a property is three 32-bit words");
 
 Ndm_PropertyCells& Ndm_Property::CellsOf(const Ndm_PropertyHolder* owner) {
     return owner->OwnDesign()->PropertyCells();
 }
 
-Ndm_Property* Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char* name) {
-    Ndm_Design* design = owner->OwnDesign();
-    return new (design->PropertyCells().Get()) Ndm_Property(owner, design->Intern(name ? name : ""), type);
-}
-
-Ndm_Property::Ndm_Property(Ndm_PropertyHolder* owner, const char* interned_name, int type)
-    : name_(interned_name), float_(0.0), link_(uint64_t{static_cast<uint8_t>(type)} << kTypeShift) {
-    const auto at = reinterpret_cast<uintptr_t>(owner);
-    // Every 64-bit system gives programs addresses of 48 bits.
-    if ((at & ~kAddress) != 0) throw std::bad_alloc();
-    LinkAs(at | kAtOwner);
-    if (type == NDM_PROP_STRING) text_ = "";
-    if (type == NDM_PROP_STRING_LIST) strings_ = nullptr;
-    if (type == NDM_PROP_LIST) list_ = nullptr;
+uint32_t Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char* name) {
+    Ndm_PropertyCells& cells = CellsOf(owner);
+    const uint32_t name_id = Ndm_PropertyNames::Id(name ? name : "");
+    const uint32_t handle = owner->Handle();
+    const uint32_t cell = cells.Get();
+    Ndm_Property* p = new (At(cell)) Ndm_Property(handle, name_id, type);
+    if (type == NDM_PROP_FLOAT64) {
+        p->value_ = cells.Get();
+        const double zero = 0.0;
+        std::memcpy(Ndm_PropertyCells::At(p->value_), &zero, sizeof zero);
+    }
+    return cell;
 }
 
 Ndm_PropertyHolder* Ndm_Property::GetOwner() const {
     const Ndm_Property* p = this;
-    while (!(p->link_ & kAtOwner)) p = p->Next();
-    return reinterpret_cast<Ndm_PropertyHolder*>(static_cast<uintptr_t>(p->link_ & kAddress));
+    while (!(p->link_ & kAtOwner)) p = At(p->link_ >> 1);
+    return static_cast<Ndm_PropertyHolder*>(Ndm_Handles::Get(p->link_ >> 1));
 }
 
+double Ndm_Property::GetFloat64() const {
+    if (GetType() != NDM_PROP_FLOAT64) return 0.0;
+    double value;
+    std::memcpy(&value, Ndm_PropertyCells::At(value_), sizeof value);
+    return value;
+}
+
+void Ndm_Property::SetFloat64(double value) {
+    if (GetType() == NDM_PROP_FLOAT64) std::memcpy(Ndm_PropertyCells::At(value_), &value, sizeof value);
+}
+
+const char* Ndm_Property::GetValueString() const {
+    return GetType() == NDM_PROP_STRING ? Ndm_NamePool::Text(value_) : nullptr;
+}
+
+Ndm_Property::ListData* Ndm_Property::List() const {
+    return GetType() == NDM_PROP_LIST && !(head_ & kOneEntry) && value_
+               ? static_cast<ListData*>(Ndm_Handles::Get(value_))
+               : nullptr;
+}
+
+Ndm_EntryRange Ndm_Property::GetListItr() const {
+    Ndm_EntryRange range;
+    if (GetType() != NDM_PROP_LIST) return range;
+    if (head_ & kOneEntry) {
+        range.one_ = value_;
+        range.size_ = 1;
+    } else if (const ListData* list = List()) {
+        range.cells_ = list->entries.data();
+        range.size_ = list->entries.size();
+    }
+    return range;
+}
+
+int Ndm_Property::GetNumEntries() const { return static_cast<int>(GetListItr().size()); }
+
 // Frees one property, not its entries.
-void Ndm_Property::Free(Ndm_Property* p, Ndm_PropertyCells& cells) {
+void Ndm_Property::Free(uint32_t cell, Ndm_PropertyCells& cells) {
+    Ndm_Property* p = At(cell);
     const int type = p->GetType();
-    if (type == NDM_PROP_STRING_LIST && p->OwnsStrings()) delete p->strings_;
-    if (type == NDM_PROP_LIST && !(p->link_ & kOneEntry)) delete p->list_;
+    if (type == NDM_PROP_STRING_LIST && p->OwnsStrings()) {
+        delete static_cast<std::vector<std::string>*>(Ndm_Handles::Get(p->value_));
+        Ndm_Handles::Remove(p->value_);
+    }
+    if (ListData* list = p->List()) {
+        delete list;
+        Ndm_Handles::Remove(p->value_);
+    }
+    if (type == NDM_PROP_FLOAT64) cells.Put(p->value_);
     p->~Ndm_Property();
-    cells.Put(p);
+    cells.Put(cell);
 }
 
 // Lists may nest as deeply as a file makes them: entries are freed from a work list, each
 // after its own entries were taken out, so that nothing recurses. Most properties hold no
 // entries, and a list of one plain entry is what every value passing the filter makes: those
 // go without the work list.
-void Ndm_Property::Destroy(Ndm_Property* p, Ndm_PropertyCells& cells) {
-    if (p->GetType() != NDM_PROP_LIST || p->GetNumEntries() == 0) return Free(p, cells);
-    if (p->link_ & kOneEntry && p->entry_->GetType() != NDM_PROP_LIST) {
-        Free(p->entry_, cells);
-        return Free(p, cells);
+void Ndm_Property::Destroy(uint32_t cell, Ndm_PropertyCells& cells) {
+    Ndm_Property* p = At(cell);
+    if (p->GetType() != NDM_PROP_LIST || p->GetNumEntries() == 0) return Free(cell, cells);
+    if (p->head_ & kOneEntry && At(p->value_)->GetType() != NDM_PROP_LIST) {
+        Free(p->value_, cells);
+        return Free(cell, cells);
     }
-    std::vector<Ndm_Property*> work{p};
+    std::vector<uint32_t> work{cell};
     while (!work.empty()) {
-        Ndm_Property* q = work.back();
+        const uint32_t q = work.back();
         work.pop_back();
-        const std::span<Ndm_Property* const> entries = q->GetListItr();
-        work.insert(work.end(), entries.begin(), entries.end());
+        const Ndm_Property* list = At(q);
+        if (list->head_ & kOneEntry)
+            work.push_back(list->value_);
+        else if (const ListData* data = list->List())
+            work.insert(work.end(), data->entries.begin(), data->entries.end());
         Free(q, cells);
     }
 }
 
 const std::vector<std::string>& Ndm_Property::GetStrings() const {
     static const std::vector<std::string> none;
-    return GetType() == NDM_PROP_STRING_LIST && strings_ ? *strings_ : none;
+    if (GetType() != NDM_PROP_STRING_LIST || !value_) return none;
+    return *static_cast<const std::vector<std::string>*>(Ndm_Handles::Get(value_));
 }
 
 void Ndm_Property::SetValueString(const char* value) {
-    if (GetType() == NDM_PROP_STRING) text_ = GetOwner()->OwnDesign()->Intern(value ? value : "");
-}
-
-const std::vector<std::string>* Ndm_TextLists::Extend(const std::vector<std::string>* list, const char* text) {
-    const Key key{list, text};
-    Recent& recent = recent_[KeyHash()(key) % std::size(recent_)];
-    if (recent.list && recent.key == key) return recent.list;
-    std::unique_ptr<std::vector<std::string>>& slot = lists_[key];
-    if (!slot) {
-        slot = std::make_unique<std::vector<std::string>>();
-        slot->reserve((list ? list->size() : 0) + 1);
-        if (list) *slot = *list;
-        slot->emplace_back(text);
-    }
-    recent = Recent{key, slot.get()};
-    return slot.get();
+    if (GetType() != NDM_PROP_STRING) return;
+    Ndm_Design* design = GetOwner()->OwnDesign();
+    value_ = design->TextId(design->Intern(value ? value : ""));
 }
 
 // Lists up to this long are shared; a longer one, which grows one text at a time (a statement
@@ -128,93 +294,98 @@ bool Ndm_Property::AddString(const char* text) {
     if (GetType() != NDM_PROP_STRING_LIST) return false;
     if (!text) text = "";
     if (OwnsStrings()) {
-        const_cast<std::vector<std::string>*>(strings_)->emplace_back(text);
-    } else if (!strings_ || strings_->size() < kSharedTexts) {
+        static_cast<std::vector<std::string>*>(Ndm_Handles::Get(value_))->emplace_back(text);
+    } else if (GetStrings().size() < kSharedTexts) {
         Ndm_Design* design = GetOwner()->OwnDesign();
-        strings_ = design->TextLists().Extend(strings_, design->Intern(text));
+        value_ = design->TextLists().Extend(value_, design->Intern(text));
     } else {
-        auto* own = new std::vector<std::string>();
-        own->reserve(strings_->size() * 2);
-        *own = *strings_;
+        auto own = std::make_unique<std::vector<std::string>>();
+        own->reserve(GetStrings().size() * 2);
+        *own = GetStrings();
         own->emplace_back(text);
-        strings_ = own;
-        link_ |= kOwnsStrings;
+        value_ = Ndm_Handles::Add(own.release());
+        head_ |= kOwnsStrings;
     }
     return true;
 }
 
-Ndm_Property* Ndm_Property::AddEntry(int type, const char* name) {
-    if (GetType() != NDM_PROP_LIST) return nullptr;
-    Ndm_PropertyHolder* owner = GetOwner();
-    Ndm_Property* entry = Make(owner, type, name);
-    if (!(link_ & kOneEntry) && !list_) {
-        entry_ = entry;
-        link_ |= kOneEntry;
+uint32_t Ndm_Property::AddEntry(int type, const char* name) {
+    if (GetType() != NDM_PROP_LIST) return 0;
+    const uint32_t entry = Make(GetOwner(), type, name);
+    if (!(head_ & kOneEntry) && !value_) {
+        value_ = entry;
+        head_ |= kOneEntry;
         return entry;
     }
-    if (link_ & kOneEntry) {
+    if (head_ & kOneEntry) {
         auto data = std::make_unique<ListData>();
-        data->entries.push_back(entry_);
-        list_ = data.release();
-        link_ &= ~kOneEntry;
+        data->entries.push_back(value_);
+        value_ = Ndm_Handles::Add(data.release());
+        head_ &= ~kOneEntry;
     }
-    list_->entries.push_back(entry);
-    if (list_->index) list_->index->try_emplace(entry->name_, entry);
+    ListData* list = List();
+    list->entries.push_back(entry);
+    if (list->index) list->index->try_emplace(At(entry)->GetName(), entry);
     return entry;
 }
 
 Ndm_Property* Ndm_Property::CreatePropertyString(const char* name, const char* value) {
-    return Set(AddEntry(NDM_PROP_STRING, name), value);
+    return Set(Entry(AddEntry(NDM_PROP_STRING, name)), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyBool(const char* name, bool value) {
-    return Set(AddEntry(NDM_PROP_BOOL, name), value);
+    return Set(Entry(AddEntry(NDM_PROP_BOOL, name)), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyInt32(const char* name, int32_t value) {
-    return Set(AddEntry(NDM_PROP_INT32, name), value);
+    return Set(Entry(AddEntry(NDM_PROP_INT32, name)), value);
 }
 Ndm_Property* Ndm_Property::CreatePropertyFloat64(const char* name, double value) {
-    return Set(AddEntry(NDM_PROP_FLOAT64, name), value);
+    return Set(Entry(AddEntry(NDM_PROP_FLOAT64, name)), value);
 }
-Ndm_Property* Ndm_Property::CreatePropertyList(const char* name) { return AddEntry(NDM_PROP_LIST, name); }
+Ndm_Property* Ndm_Property::CreatePropertyList(const char* name) { return Entry(AddEntry(NDM_PROP_LIST, name)); }
 Ndm_Property* Ndm_Property::CreatePropertyStringList(const char* name) {
-    return AddEntry(NDM_PROP_STRING_LIST, name);
+    return Entry(AddEntry(NDM_PROP_STRING_LIST, name));
 }
 
 Ndm_Property* Ndm_Property::GetEntryByName(const char* name) const {
-    if (!name) return nullptr;
-    const std::span<Ndm_Property* const> entries = GetListItr();
-    if (entries.size() <= kIndexFrom) {
-        for (Ndm_Property* e : entries)
-            if (std::strcmp(e->name_, name) == 0) return e;
+    if (!name || GetType() != NDM_PROP_LIST) return nullptr;
+    if (head_ & kOneEntry) return std::strcmp(At(value_)->GetName(), name) == 0 ? At(value_) : nullptr;
+    ListData* list = List();
+    if (!list) return nullptr;
+    if (list->entries.size() <= kIndexFrom) {
+        for (uint32_t e : list->entries)
+            if (std::strcmp(At(e)->GetName(), name) == 0) return At(e);
         return nullptr;
     }
-    auto& index = list_->index;
+    auto& index = list->index;
     if (!index) {
         // Timing lists grow to tens of thousands of entries; look them up by hash.
-        index = std::make_unique<std::unordered_map<std::string_view, Ndm_Property*>>();
-        index->reserve(entries.size());
-        for (Ndm_Property* e : entries) index->try_emplace(e->name_, e);
+        index = std::make_unique<std::unordered_map<std::string_view, uint32_t>>();
+        index->reserve(list->entries.size());
+        for (uint32_t e : list->entries) index->try_emplace(At(e)->GetName(), e);
     }
     auto it = index->find(name);
-    return it == index->end() ? nullptr : it->second;
+    return it == index->end() ? nullptr : At(it->second);
 }
 
 bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
     if (GetType() != NDM_PROP_LIST || !entry) return false;
-    if (link_ & kOneEntry) {
-        if (entry_ != entry) return false;
-        list_ = nullptr;
-        link_ &= ~kOneEntry;
-        Destroy(entry, CellsOf(GetOwner()));
+    if (head_ & kOneEntry) {
+        if (At(value_) != entry) return false;
+        const uint32_t cell = value_;
+        value_ = 0;
+        head_ &= ~kOneEntry;
+        Destroy(cell, CellsOf(GetOwner()));
         return true;
     }
-    if (!list_) return false;
-    auto it = std::find(list_->entries.begin(), list_->entries.end(), entry);
-    if (it == list_->entries.end()) return false;
-    list_->entries.erase(it);
+    ListData* list = List();
+    if (!list) return false;
+    auto it = std::find_if(list->entries.begin(), list->entries.end(), [&](uint32_t e) { return At(e) == entry; });
+    if (it == list->entries.end()) return false;
+    const uint32_t cell = *it;
+    list->entries.erase(it);
     // The first entry of that name may have changed: the index is rebuilt on the next lookup.
-    list_->index.reset();
-    Destroy(entry, CellsOf(GetOwner()));
+    list->index.reset();
+    Destroy(cell, CellsOf(GetOwner()));
     return true;
 }
 
@@ -234,15 +405,26 @@ Ndm_Design* Ndm_PropertyHolder::OwnDesign() const {
 
 Ndm_PropertyHolder::~Ndm_PropertyHolder() { DeleteAllProperties(); }
 
+uint32_t Ndm_PropertyHolder::Handle() {
+    if (!handle_) handle_ = Ndm_Handles::Add(this);
+    return handle_;
+}
+
+void Ndm_PropertyHolder::DropHandle() {
+    Ndm_Handles::Remove(handle_);
+    handle_ = 0;
+}
+
 void Ndm_PropertyHolder::DeleteAllProperties() {
-    if (!props_) return;
+    if (!first_) return;
     Ndm_PropertyCells& cells = Ndm_Property::CellsOf(this);
-    for (Ndm_Property* p = props_; p;) {
-        Ndm_Property* next = p->Next();
-        Ndm_Property::Destroy(p, cells);
-        p = next;
+    for (uint32_t cell = first_; cell;) {
+        const uint32_t link = Ndm_Property::At(cell)->link_;
+        Ndm_Property::Destroy(cell, cells);
+        cell = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
     }
-    props_ = nullptr;
+    first_ = 0;
+    DropHandle();
 }
 
 const char* Ndm_PropertyHolder::GetName() const {
@@ -268,9 +450,9 @@ std::string Ndm_PropertyHolder::GetFullName() const {
 }
 
 Ndm_Property* Ndm_PropertyHolder::GetPropertyByName(const char* name) const {
-    if (!name) return nullptr;
-    for (Ndm_Property* p = props_; p; p = p->Next())
-        if (std::strcmp(p->name_, name) == 0) return p;
+    if (!name || !first_) return nullptr;
+    for (Ndm_Property* p = Ndm_Property::At(first_); p; p = p->Next())
+        if (std::strcmp(p->GetName(), name) == 0) return p;
     return nullptr;
 }
 
@@ -279,20 +461,21 @@ int Ndm_PropertyHolder::GetNumProperties() const { return static_cast<int>(GetPr
 // A property of a name the object has takes the place of the old one; a new name goes last.
 Ndm_Property* Ndm_PropertyHolder::Create(int type, const char* name) {
     if (!name) return nullptr;
-    Ndm_Property* fresh = Ndm_Property::Make(this, type, name);
+    const uint32_t cell = Ndm_Property::Make(this, type, name);
+    Ndm_Property* fresh = Ndm_Property::At(cell);
     Ndm_Property* prev = nullptr;
-    Ndm_Property* p = props_;
-    // Names are interned: equal names are the same pointer.
-    while (p && p->name_ != fresh->name_) {
-        prev = p;
-        p = p->Next();
+    uint32_t old = first_;
+    while (old && Ndm_Property::At(old)->NameId() != fresh->NameId()) {
+        prev = Ndm_Property::At(old);
+        const uint32_t link = prev->link_;
+        old = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
     }
-    if (p) fresh->LinkAs(p->link_);  // in the old one's place
+    if (old) fresh->link_ = Ndm_Property::At(old)->link_;  // in the old one's place
     if (prev)
-        prev->LinkTo(fresh);
+        prev->LinkTo(cell);
     else
-        props_ = fresh;
-    if (p) Ndm_Property::Destroy(p, Ndm_Property::CellsOf(this));
+        first_ = cell;
+    if (old) Ndm_Property::Destroy(old, Ndm_Property::CellsOf(this));
     return fresh;
 }
 
@@ -320,13 +503,20 @@ bool Ndm_PropertyHolder::DeleteProperty(const char* name) {
 bool Ndm_PropertyHolder::DeleteProperty(Ndm_Property* property) {
     if (!property) return false;
     Ndm_Property* prev = nullptr;
-    for (Ndm_Property* p = props_; p; prev = p, p = p->Next()) {
-        if (p != property) continue;
+    for (uint32_t cell = first_; cell;) {
+        Ndm_Property* p = Ndm_Property::At(cell);
+        const uint32_t link = p->link_;
+        if (p != property) {
+            prev = p;
+            cell = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
+            continue;
+        }
         if (prev)
-            prev->LinkAs(p->link_);
+            prev->link_ = link;
         else
-            props_ = p->Next();
-        Ndm_Property::Destroy(p, Ndm_Property::CellsOf(this));
+            first_ = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
+        Ndm_Property::Destroy(cell, Ndm_Property::CellsOf(this));
+        if (!first_) DropHandle();
         return true;
     }
     return false;

@@ -34,34 +34,45 @@ enum Ndm_PropType : int {
 // "float64", "list", "string", "string_list"), or null.
 const char* Ndm_PropTypeName(int type);
 
+class Ndm_EntryRange;
+
+// Where properties are, for the inline accessors below (kept by property_store.h): the chunks of
+// 12-byte cells of every design, by number, and the property names, by id.
+struct Ndm_PropertyTables {
+    static constexpr int kPlaceBits = 13;
+    static constexpr size_t kCell = 12;
+    static constexpr size_t kMaxChunks = size_t{1} << (31 - kPlaceBits);
+    static unsigned char* chunks[kMaxChunks];
+    static const char* const* names;
+    static unsigned char* Cell(uint32_t cell) {
+        return chunks[cell >> kPlaceBits] + (cell & ((uint32_t{1} << kPlaceBits) - 1)) * kCell;
+    }
+};
+
 class Ndm_Property {
 public:
     Ndm_Property(const Ndm_Property&) = delete;
     Ndm_Property& operator=(const Ndm_Property&) = delete;
 
     // Property name.
-    const char* GetName() const { return name_; }
+    const char* GetName() const { return Ndm_PropertyTables::names[NameId()]; }
     // Type code (Ndm_PropType).
-    int GetType() const { return static_cast<int>(link_ >> kTypeShift); }
+    int GetType() const { return static_cast<int>(head_ >> kTypeShift & 15); }
     // Object the property sits on (for list entries: the object of the list). Found at the end
     // of the object's properties, which are few.
     Ndm_PropertyHolder* GetOwner() const;
 
     // Value accessors; each answers a neutral value for a property of another type.
-    bool GetBool() const { return GetType() == NDM_PROP_BOOL && int_ != 0; }
-    int32_t GetInt32() const { return GetType() == NDM_PROP_INT32 ? int_ : 0; }
-    double GetFloat64() const { return GetType() == NDM_PROP_FLOAT64 ? float_ : 0.0; }
+    bool GetBool() const { return GetType() == NDM_PROP_BOOL && value_ != 0; }
+    int32_t GetInt32() const { return GetType() == NDM_PROP_INT32 ? static_cast<int32_t>(value_) : 0; }
+    double GetFloat64() const;
     // Text of a string property, or null.
-    const char* GetValueString() const { return GetType() == NDM_PROP_STRING ? text_ : nullptr; }
+    const char* GetValueString() const;
     // Texts of a string list, in order (empty for other types).
     const std::vector<std::string>& GetStrings() const;
     // Entries of a list property, in order (empty for other types).
-    std::span<Ndm_Property* const> GetListItr() const {
-        if (GetType() != NDM_PROP_LIST) return {};
-        if (link_ & kOneEntry) return {&entry_, 1};
-        return list_ ? std::span<Ndm_Property* const>(list_->entries) : std::span<Ndm_Property* const>();
-    }
-    int GetNumEntries() const { return static_cast<int>(GetListItr().size()); }
+    Ndm_EntryRange GetListItr() const;
+    int GetNumEntries() const;
 
     // Appends a text to a string list; false for other types.
     bool AddString(const char* text);
@@ -80,66 +91,62 @@ public:
     // Replaces the value of a bool, int32, float64 or string property; a property of another
     // type is left as it is.
     void SetBool(bool value) {
-        if (GetType() == NDM_PROP_BOOL) int_ = value ? 1 : 0;
+        if (GetType() == NDM_PROP_BOOL) value_ = value ? 1 : 0;
     }
     void SetInt32(int32_t value) {
-        if (GetType() == NDM_PROP_INT32) int_ = value;
+        if (GetType() == NDM_PROP_INT32) value_ = static_cast<uint32_t>(value);
     }
-    void SetFloat64(double value) {
-        if (GetType() == NDM_PROP_FLOAT64) float_ = value;
-    }
+    void SetFloat64(double value);
     void SetValueString(const char* value);
 
 private:
     friend class Ndm_PropertyHolder;
     friend class Ndm_PropertyRange;
-    Ndm_Property(Ndm_PropertyHolder* owner, const char* interned_name, int type);
+    friend class Ndm_EntryRange;
+    Ndm_Property(uint32_t owner, uint32_t name, int type) : head_(name | static_cast<uint32_t>(type) << kTypeShift), link_(owner << 1 | kAtOwner), value_(0) {}
     ~Ndm_Property() = default;
-    // Properties and list data live in the design's cells.
+    // Properties live in the design's cells and are known there by index.
     static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
-    static Ndm_Property* Make(Ndm_PropertyHolder* owner, int type, const char* name);
-    static void Destroy(Ndm_Property* p, Ndm_PropertyCells& cells);
-    static void Free(Ndm_Property* p, Ndm_PropertyCells& cells);
-    Ndm_Property* AddEntry(int type, const char* name);
+    static Ndm_Property* At(uint32_t cell) { return reinterpret_cast<Ndm_Property*>(Ndm_PropertyTables::Cell(cell)); }
+    // A new property of owner, as its cell's index.
+    static uint32_t Make(Ndm_PropertyHolder* owner, int type, const char* name);
+    static void Destroy(uint32_t cell, Ndm_PropertyCells& cells);
+    static void Free(uint32_t cell, Ndm_PropertyCells& cells);
+    uint32_t AddEntry(int type, const char* name);
+    Ndm_Property* Entry(uint32_t cell) { return cell ? At(cell) : nullptr; }
+
+    // The name's id (Ndm_PropertyNames), the type code and two marks: the string list is the
+    // property's own, and the list holds one entry, whose index is the value (a list made to
+    // carry one value through the filter costs no allocation).
+    static constexpr int kTypeShift = 24;
+    static constexpr uint32_t kNameMask = (uint32_t{1} << kTypeShift) - 1;
+    static constexpr uint32_t kOwnsStrings = uint32_t{1} << 28, kOneEntry = uint32_t{1} << 29;
+    uint32_t NameId() const { return head_ & kNameMask; }
+    bool OwnsStrings() const { return head_ & kOwnsStrings; }
 
     // The link: the next property of the same object, or at the end (and for list entries) the
-    // object itself, marked by the low bit; the second bit when a string list is the
-    // property's own, the third when a list holds one entry, in entry_ (a list made to carry one
-    // value through the filter costs no allocation); the type code in the top byte. Addresses
-    // take 48 bits and are 8-aligned.
-    static constexpr uint64_t kAtOwner = 1, kOwnsStrings = 2, kOneEntry = 4;
-    static constexpr int kTypeShift = 56;
-    static constexpr uint64_t kAddress = ((uint64_t{1} << 48) - 1) & ~uint64_t{7};
-    Ndm_Property* Next() const {
-        return link_ & kAtOwner ? nullptr : reinterpret_cast<Ndm_Property*>(static_cast<uintptr_t>(link_ & kAddress));
-    }
-    // Points the link at what another link points at (a property or the owner), keeping the
-    // type and the strings mark.
-    void LinkAs(uint64_t other) { link_ = (link_ & ~(kAddress | kAtOwner)) | (other & (kAddress | kAtOwner)); }
-    void LinkTo(const Ndm_Property* next) { LinkAs(reinterpret_cast<uintptr_t>(next)); }
-    bool OwnsStrings() const { return link_ & kOwnsStrings; }
+    // object itself, as a handle, marked by the low bit.
+    static constexpr uint32_t kAtOwner = 1;
+    Ndm_Property* Next() const { return link_ & kAtOwner ? nullptr : At(link_ >> 1); }
+    void LinkTo(uint32_t cell) { link_ = cell << 1; }
 
-    // Entries of a list property (owned), and the first entry of each name, built by the first
-    // lookup in a list of more than kIndexFrom entries and kept up to date by additions.
+    // Entries of a list property (owned, by index), and the first entry of each name, built by
+    // the first lookup in a list of more than kIndexFrom entries and kept up to date by
+    // additions.
     struct ListData {
-        std::vector<Ndm_Property*> entries;
-        std::unique_ptr<std::unordered_map<std::string_view, Ndm_Property*>> index;
+        std::vector<uint32_t> entries;
+        std::unique_ptr<std::unordered_map<std::string_view, uint32_t>> index;
     };
     static constexpr size_t kIndexFrom = 8;
+    ListData* List() const;
 
-    // Names and texts are interned in the design, and a short string list is a value the
-    // design shares between every property holding the same texts (Ndm_TextLists): an object
-    // pays for its properties, 24 bytes each, not for their values.
-    const char* name_;
-    union {
-        int32_t int_;
-        double float_;
-        const char* text_;                        // string
-        const std::vector<std::string>* strings_;  // string list: shared, or owned when long
-        ListData* list_;                          // list of two entries or more (owned), else null
-        Ndm_Property* entry_;                     // list of one entry
-    };
-    uint64_t link_;
+    // A property is 12 bytes. Its value: an int32 or bool; a string's text id in the design's
+    // name pool; a float64's own cell; a string list's handle (shared between every property
+    // holding the same texts, Ndm_TextLists, or owned when long); a list's one entry, or the
+    // handle of its entries.
+    uint32_t head_;
+    uint32_t link_;
+    uint32_t value_;
 };
 
 // What an iterator that hands out pointers to T by value declares of itself.
@@ -195,11 +202,54 @@ private:
     Ndm_Property* first_;
 };
 
+// The entries of a list property in order, as a range of pointers; also made over any span of
+// properties. It stays valid while the list is not changed.
+class Ndm_EntryRange {
+public:
+    class iterator : public Ndm_PointerIterator<Ndm_Property> {
+    public:
+        iterator() = default;
+        iterator(const Ndm_EntryRange* range, size_t at) : range_(range), at_(at) {}
+        Ndm_Property* operator*() const { return (*range_)[at_]; }
+        iterator& operator++() {
+            ++at_;
+            return *this;
+        }
+        iterator operator++(int) {
+            iterator before = *this;
+            ++at_;
+            return before;
+        }
+        bool operator==(const iterator&) const = default;
+
+    private:
+        const Ndm_EntryRange* range_ = nullptr;
+        size_t at_ = 0;
+    };
+    Ndm_EntryRange() = default;
+    Ndm_EntryRange(std::span<Ndm_Property* const> props) : pointers_(props.data()), size_(props.size()) {}  // NOLINT
+    iterator begin() const { return iterator(this, 0); }
+    iterator end() const { return iterator(this, size_); }
+    size_t size() const { return size_; }
+    bool empty() const { return size_ == 0; }
+    Ndm_Property* operator[](size_t i) const {
+        if (pointers_) return pointers_[i];
+        return Ndm_Property::At(cells_ ? cells_[i] : one_);
+    }
+
+private:
+    friend class Ndm_Property;
+    Ndm_Property* const* pointers_ = nullptr;
+    const uint32_t* cells_ = nullptr;
+    uint32_t one_ = 0;
+    size_t size_ = 0;
+};
+
 // Kinds of design objects.
 enum class Ndm_ObjKind : uint8_t { Design, View, Block, Signal, Pin, Network };
 
 // Base of every design object: an ordered set of typed properties. Objects without
-// properties pay one pointer.
+// properties pay eight bytes.
 class Ndm_PropertyHolder {
 public:
     Ndm_PropertyHolder(const Ndm_PropertyHolder&) = delete;
@@ -214,7 +264,7 @@ public:
     // First property named name (exact), or null.
     Ndm_Property* GetPropertyByName(const char* name) const;
     // Properties in creation order.
-    Ndm_PropertyRange GetPropertyItr() const { return Ndm_PropertyRange(props_); }
+    Ndm_PropertyRange GetPropertyItr() const { return Ndm_PropertyRange(first_ ? Ndm_Property::At(first_) : nullptr); }
     int GetNumProperties() const;
 
     // Creates a property, replacing one of the same name in place.
@@ -238,10 +288,14 @@ protected:
 private:
     friend class Ndm_Property;
     Ndm_Property* Create(int type, const char* name);
+    // The object's handle, which its last property links to; made with the first property.
+    uint32_t Handle();
+    void DropHandle();
 
     // The design the object belongs to, which interns the property names and texts.
     Ndm_Design* OwnDesign() const;
 
-    Ndm_Property* props_ = nullptr;  // the first property, linked to the next
+    uint32_t first_ = 0;   // the first property's cell, linked to the next
+    uint32_t handle_ = 0;  // while the object has properties
     Ndm_ObjKind kind_;
 };

@@ -1,12 +1,20 @@
-// How a design stores its properties (internal to host/design): the cells properties live in
-// and the string-list values shared between them.
+// How a design stores its properties (internal to host/design): the cells properties live in,
+// the 32-bit handles that stand for pointers inside a property, the property names, and the
+// string-list values shared between properties.
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <deque>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <vector>
+
+#include "host/design/name_pool.h"
+#include "host/design/ndm_property.h"
 
 #if defined(__SANITIZE_ADDRESS__)
 #define NDM_ASAN 1
@@ -19,72 +27,127 @@
 #include <sanitizer/asan_interface.h>
 #endif
 
-// Cells of 24 bytes for a design's properties, taken from large chunks and reused once freed:
-// a property costs its own size, with no allocator overhead, and making one is a pointer pop.
+// Cells of 12 bytes for a design's properties, taken from chunks of 8,192 and reused once
+// freed. A cell is known by a 32-bit index: the chunk's number, registered with the process so
+// that an index alone finds its cell, and the place in the chunk. Index 0 is no cell.
 class Ndm_PropertyCells {
 public:
-    static constexpr size_t kCell = 24;
-    void* Get() {
+    static constexpr size_t kCell = Ndm_PropertyTables::kCell;
+    static constexpr int kPlaceBits = Ndm_PropertyTables::kPlaceBits;
+    // Indexes take 31 bits, which leaves a link its mark bit.
+    static constexpr size_t kMaxChunks = Ndm_PropertyTables::kMaxChunks;
+
+    Ndm_PropertyCells() = default;
+    ~Ndm_PropertyCells();
+    Ndm_PropertyCells(const Ndm_PropertyCells&) = delete;
+    Ndm_PropertyCells& operator=(const Ndm_PropertyCells&) = delete;
+
+    // A free cell's index.
+    uint32_t Get() {
         if (free_) {
-            void* cell = free_;
-            Unpoison(cell);
-            free_ = *static_cast<void**>(cell);
+            const uint32_t cell = free_;
+            Unpoison(At(cell));
+            std::memcpy(&free_, At(cell), sizeof free_);
             return cell;
         }
         if (!left_) Refill();
         --left_;
-        return cursor_++;
+        return next_++;
     }
-    void Put(void* cell) {
-        *static_cast<void**>(cell) = free_;
+    void Put(uint32_t cell) {
+        std::memcpy(At(cell), &free_, sizeof free_);
         free_ = cell;
-        Poison(cell);
+        Poison(At(cell));
     }
+    // The cell at a (non-zero) index, of whichever design.
+    static unsigned char* At(uint32_t cell) { return Ndm_PropertyTables::Cell(cell); }
 
 private:
-    struct alignas(8) Cell {
-        unsigned char bytes[kCell];
-    };
     void Refill();
+#if NDM_ASAN
     // Under AddressSanitizer a free cell is poisoned, so that a property used after it was
     // deleted is still reported.
-#if NDM_ASAN
     static void Poison(void* cell) { ASAN_POISON_MEMORY_REGION(cell, kCell); }
     static void Unpoison(void* cell) { ASAN_UNPOISON_MEMORY_REGION(cell, kCell); }
 #else
     static void Poison(void*) {}
     static void Unpoison(void*) {}
 #endif
-    std::vector<std::unique_ptr<Cell[]>> chunks_;
-    Cell* cursor_ = nullptr;
-    size_t left_ = 0;
-    void* free_ = nullptr;
+    std::vector<uint32_t> chunks_;  // numbers of this design's chunks
+    uint32_t next_ = 0, left_ = 0, free_ = 0;
+};
+
+// 32-bit handles for pointers, process-wide: a property keeps its owner, its list data or a
+// shared string list as a handle. Handle 0 is none; released handles are reused.
+class Ndm_Handles {
+public:
+    static uint32_t Add(void* p);
+    static void Remove(uint32_t handle);
+    static void* Get(uint32_t handle) { return pages_[handle >> kPageBits][handle & kPageMask]; }
+
+private:
+    static constexpr int kPageBits = 12;
+    static constexpr uint32_t kPageMask = (uint32_t{1} << kPageBits) - 1;
+    static constexpr size_t kMaxPages = size_t{1} << (31 - kPageBits);
+    static void** pages_[kMaxPages];
+};
+
+// Property names, process-wide: a name is kept once and known by a 24-bit id. Names are few (the
+// constraint and attribute names) and stay for the life of the process.
+class Ndm_PropertyNames {
+public:
+    static constexpr uint32_t kMaxIds = uint32_t{1} << 24;
+    // The id of name, added if new.
+    static uint32_t Id(const char* name);
+    static const char* Name(uint32_t id) { return names_[id]; }
+
+private:
+    struct Table {
+        Ndm_NamePool pool;
+        Ndm_PtrMap ids;  // stored name -> id + 1
+    };
+    static Table& Tables();
+    static std::vector<const char*> names_;
+    // The ids of the short names asked for last, keyed by their bytes: callers pass the same
+    // few names millions of times.
+    struct Recent {
+        uint64_t head = 0, tail = 0;  // the bytes, zero-padded
+        uint32_t size = 0, id = kMaxIds;
+    };
+    static Recent recent_[64];
 };
 
 // The string-list values of a design: one for each distinct short list, reached from the list
-// it extends by one text. Lists are never freed before the design.
+// it extends by one text. Lists are never freed before the design; each has a handle.
 class Ndm_TextLists {
 public:
-    // The list made of list's texts (null: none) followed by text, which the design has interned.
-    const std::vector<std::string>* Extend(const std::vector<std::string>* list, const char* text);
+    Ndm_TextLists() = default;
+    ~Ndm_TextLists();
+    Ndm_TextLists(const Ndm_TextLists&) = delete;
+    Ndm_TextLists& operator=(const Ndm_TextLists&) = delete;
+    // The handle of the list made of list's texts (0: none) followed by text, which the design
+    // has interned.
+    uint32_t Extend(uint32_t list, const char* text);
 
 private:
     struct Key {
-        const void* list;
+        uint32_t list;
         const char* text;
         bool operator==(const Key&) const = default;
     };
     struct KeyHash {
-        size_t operator()(const Key& k) const {
-            return std::hash<const void*>()(k.list) * 31 + std::hash<const void*>()(k.text);
-        }
+        size_t operator()(const Key& k) const { return std::hash<const void*>()(k.text) * 31 + k.list; }
     };
-    std::unordered_map<Key, std::unique_ptr<std::vector<std::string>>, KeyHash> lists_;
+    struct Value {
+        std::unique_ptr<std::vector<std::string>> texts;
+        uint32_t handle = 0;
+    };
+    std::unordered_map<Key, Value, KeyHash> lists_;
     // The last lists made or found, by their key: a statement gives thousands of objects the
     // same lists, one text at a time.
     struct Recent {
         Key key{};
-        const std::vector<std::string>* list = nullptr;
+        uint32_t handle = 0;
     };
     Recent recent_[64];
 };
