@@ -56,10 +56,6 @@ void Ndm_PropertyCells::Refill() {
     chunks_.push_back(number);
     next_ = number << kPlaceBits;
     left_ = uint32_t{1} << kPlaceBits;
-    if (number == 0) {  // never: 0 is no cell
-        ++next_;
-        --left_;
-    }
 }
 
 Ndm_PropertyCells::~Ndm_PropertyCells() {

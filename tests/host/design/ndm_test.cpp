@@ -1,6 +1,7 @@
 // The design database: name lookups, full names, properties, deletion and networks.
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <string>
 #include <vector>
 
@@ -188,6 +189,55 @@ TEST(DesignDatabase, SharedValuesNeverLeakBetweenObjects) {
     number->AddString("x");
     EXPECT_EQ(number->GetInt32(), 3);
     EXPECT_TRUE(number->GetStrings().empty());
+}
+
+// Property storage is shared by every design of the process: designs made, used and dropped
+// in turn must each read back exactly their own names and values, wherever the texts sit among
+// the design's names (past the first megabyte, or a text too long to share a chunk).
+TEST(DesignDatabase, PropertiesOfDesignsAliveTogetherStayApart) {
+    const std::string huge(300000, 'h');
+    const std::string long_name = "A_PROPERTY_NAME_LONGER_THAN_SIXTEEN";
+    auto fill = [&](Tree& t, int tag) {
+        for (int i = 0; i < 40000; ++i)  // over a megabyte of names before the later values
+            t.top->CreateSignal(("a_rather_long_signal_name_" + std::to_string(i) + "_" + std::to_string(tag)).c_str());
+        for (int i = 0; i < 50; ++i) {
+            Ndm_Block* b = t.top->CreateBlock(("u" + std::to_string(i)).c_str());
+            b->CreatePropertyString("LOC", ("SITE_" + std::to_string(tag) + "_" + std::to_string(i)).c_str());
+            b->CreatePropertyFloat64(long_name.c_str(), tag + i / 4.0);
+            Ndm_Property* list = b->CreatePropertyList("TIMING");
+            list->CreatePropertyString("OFFSET", std::to_string(tag).c_str());
+            list->CreatePropertyInt32("N", tag * 100 + i);
+        }
+        t.top->CreatePropertyString("HUGE", (huge + std::to_string(tag)).c_str());
+    };
+    auto check = [&](Tree& t, int tag) {
+        for (int i = 0; i < 50; ++i) {
+            Ndm_Block* b = t.top->GetBlockByName(("u" + std::to_string(i)).c_str());
+            ASSERT_NE(b, nullptr);
+            EXPECT_EQ(b->GetPropertyByName("LOC")->GetValueString(), "SITE_" + std::to_string(tag) + "_" + std::to_string(i));
+            EXPECT_EQ(b->GetPropertyByName(long_name.c_str())->GetFloat64(), tag + i / 4.0);
+            Ndm_Property* list = b->GetPropertyByName("TIMING");
+            ASSERT_EQ(list->GetNumEntries(), 2);
+            EXPECT_EQ(list->GetListItr()[0]->GetValueString(), std::to_string(tag));
+            EXPECT_EQ(list->GetListItr()[1]->GetInt32(), tag * 100 + i);
+            EXPECT_EQ(list->GetListItr()[1]->GetOwner(), b);
+        }
+        EXPECT_EQ(t.top->GetPropertyByName("HUGE")->GetValueString(), huge + std::to_string(tag));
+    };
+    auto first = std::make_unique<Tree>();
+    auto second = std::make_unique<Tree>();
+    fill(*first, 1);
+    fill(*second, 2);
+    check(*first, 1);
+    first.reset();  // its cells, handles and text chunks go back to be reused
+    Tree third;
+    fill(third, 3);
+    check(*second, 2);
+    check(third, 3);
+    for (int i = 0; i < 50; i += 2) third.top->GetBlockByName(("u" + std::to_string(i)).c_str())->DeleteAllProperties();
+    second.reset();
+    EXPECT_EQ(third.top->GetBlockByName("u0")->GetNumProperties(), 0);
+    EXPECT_STREQ(third.top->GetBlockByName("u1")->GetPropertyByName("LOC")->GetValueString(), "SITE_3_1");
 }
 
 TEST(DesignDatabase, NetworksAreNamedAfterTheHighestSignal) {
