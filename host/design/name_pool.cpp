@@ -122,19 +122,12 @@ const char* Ndm_NamePool::Find(std::string_view text) const {
 }
 
 const char* Ndm_NamePool::Intern(std::string_view text) {
-    const size_t n = text.size();
-    if (n > kShortBytes) return Lookup(text);
-    uint64_t head = 0, tail = 0;
-    if (n > 8) {
-        std::memcpy(&head, text.data(), 8);
-        std::memcpy(&tail, text.data() + 8, n - 8);
-    } else if (n) {
-        std::memcpy(&head, text.data(), n);
-    }
-    Short& entry = short_[((head * 0x9e3779b97f4a7c15ull) ^ (tail * 0x94d049bb133111ebull)) >> 56];
-    if (entry.stored && entry.head == head && entry.tail == tail && entry.size == n) return entry.stored;
+    Ndm_ShortText key;
+    if (!key.Of(text)) return Lookup(text);
+    Short& entry = short_[key.Slot(8)];
+    if (entry.stored && entry.key == key) return entry.stored;
     const char* stored = Lookup(text);
-    entry = Short{head, tail, n, stored};
+    entry = Short{key, stored};
     return stored;
 }
 

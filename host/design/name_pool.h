@@ -3,9 +3,36 @@
 #pragma once
 
 #include <cstdint>
+#include <cstring>
 #include <memory>
 #include <string_view>
 #include <vector>
+
+// The bytes of a text of up to 16 bytes, zero-padded, as a key for small caches of texts that
+// come back millions of times (cell types, port and property names): no hashing of the text.
+struct Ndm_ShortText {
+    static constexpr size_t kMaxBytes = 16;
+    uint64_t head = 0, tail = 0;
+    size_t size = 0;
+    // The key of text; false when text is too long to have one.
+    bool Of(std::string_view text) {
+        size = text.size();
+        if (size > kMaxBytes) return false;
+        head = tail = 0;
+        if (size > 8) {
+            std::memcpy(&head, text.data(), 8);
+            std::memcpy(&tail, text.data() + 8, size - 8);
+        } else if (size) {
+            std::memcpy(&head, text.data(), size);
+        }
+        return true;
+    }
+    // A place among 2^bits cache entries.
+    size_t Slot(int bits) const {
+        return ((head * 0x9e3779b97f4a7c15ull) ^ (tail * 0x94d049bb133111ebull) ^ size) >> (64 - bits);
+    }
+    bool operator==(const Ndm_ShortText&) const = default;
+};
 
 class Ndm_NamePool {
 public:
@@ -55,11 +82,9 @@ private:
     // Short texts (cell types, port and property names) come back millions of times: the last
     // one stored at each of a few hundred places, keyed by its bytes, is found without hashing.
     struct Short {
-        uint64_t head = 0, tail = 0;  // the bytes, zero-padded
-        size_t size = 0;
+        Ndm_ShortText key;
         const char* stored = nullptr;
     };
-    static constexpr size_t kShortBytes = 16;
     Short short_[256];
     const char* Lookup(std::string_view text);  // Intern, without the short texts
     std::vector<uint64_t> slots_;

@@ -113,33 +113,22 @@ std::vector<const char*> Ndm_PropertyNames::names_;
 Ndm_PropertyNames::Recent Ndm_PropertyNames::recent_[64];
 
 uint32_t Ndm_PropertyNames::Id(const char* name) {
-    const size_t n = std::strlen(name);
-    Recent* recent = nullptr;
-    Recent key;
-    if (n <= 16) {
-        key.size = static_cast<uint32_t>(n);
-        if (n > 8) {
-            std::memcpy(&key.head, name, 8);
-            std::memcpy(&key.tail, name + 8, n - 8);
-        } else {
-            std::memcpy(&key.head, name, n);
-        }
-        recent = &recent_[((key.head * 0x9e3779b97f4a7c15ull) ^ (key.tail * 0x94d049bb133111ebull) ^ n) >> 58];
-        if (recent->id != kMaxIds && recent->head == key.head && recent->tail == key.tail && recent->size == n)
-            return recent->id;
-    }
+    const std::string_view text(name);
+    Recent asked;
+    Recent* recent = asked.key.Of(text) ? &recent_[asked.key.Slot(6)] : nullptr;
+    if (recent && recent->id != kMaxIds && recent->key == asked.key) return recent->id;
     Table& t = Tables();
-    const char* stored = t.pool.Intern(std::string_view(name, n));
-    const auto fresh = reinterpret_cast<void*>(uintptr_t{names_.size()} + 1);
-    const auto id = static_cast<uint32_t>(reinterpret_cast<uintptr_t>(t.ids.InsertIfAbsent(stored, fresh)) - 1);
+    const char* stored = t.pool.Intern(text);
+    const auto next = reinterpret_cast<void*>(uintptr_t{names_.size()} + 1);
+    const auto id = static_cast<uint32_t>(reinterpret_cast<uintptr_t>(t.ids.InsertIfAbsent(stored, next)) - 1);
     if (id == names_.size()) {
         if (id == kMaxIds) throw std::bad_alloc();
         names_.push_back(stored);
         Ndm_PropertyTables::names = names_.data();
     }
     if (recent) {
-        key.id = id;
-        *recent = key;
+        asked.id = id;
+        *recent = asked;
     }
     return id;
 }

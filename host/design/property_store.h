@@ -111,8 +111,8 @@ private:
     // The ids of the short names asked for last, keyed by their bytes: callers pass the same
     // few names millions of times.
     struct Recent {
-        uint64_t head = 0, tail = 0;  // the bytes, zero-padded
-        uint32_t size = 0, id = kMaxIds;
+        Ndm_ShortText key;
+        uint32_t id = kMaxIds;
     };
     static Recent recent_[64];
 };

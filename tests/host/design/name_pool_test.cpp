@@ -1,9 +1,10 @@
 // Interning: one stored copy for each distinct text, whichever way it was found (short texts
 // have a table of their own in front of the hash set, which must never confuse two texts; the
-// set is rebuilt from the stored texts as it grows).
+// set is rebuilt from the stored texts as it grows), and each text's id.
 #include <gtest/gtest.h>
 
 #include <set>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -32,6 +33,11 @@ TEST(NamePool, EqualTextsShareOneCopyAndDifferentTextsNever) {
             EXPECT_EQ(p[text.size()], '\0');
             EXPECT_EQ(pool.Intern(text), p);
             EXPECT_EQ(pool.Find(text), p);
+            // A text's 32-bit id gives its bytes back up to the first NUL, and stays the same.
+            const uint32_t id = pool.IdOf(p);
+            EXPECT_EQ(id, pool.IdOf(pool.Intern(copy)));
+            EXPECT_STREQ(Ndm_NamePool::Text(id), p);
+            EXPECT_EQ(id == 0, *p == '\0');
             stored.insert(p);
         }
         // Thousands of short texts between the rounds evict one another from the short table.
@@ -40,6 +46,8 @@ TEST(NamePool, EqualTextsShareOneCopyAndDifferentTextsNever) {
     EXPECT_EQ(stored.size(), texts.size());
     EXPECT_EQ(pool.Find("never interned"), nullptr);
     EXPECT_EQ(pool.Find("n12"), nullptr);
+    const std::string elsewhere = "not stored by the pool";
+    EXPECT_THROW(pool.IdOf(elsewhere.c_str()), std::invalid_argument);
 }
 
 }  // namespace
