@@ -4,12 +4,40 @@
 #include <bit>
 #include <cstdint>
 #include <cstring>
+#include <cstdlib>
+#include <sys/mman.h>
 #include <new>
 #include <stdexcept>
 
 namespace {
 constexpr size_t kChunk = 1 << 20;
 }
+
+namespace {
+constexpr size_t kHugePage = size_t{2} << 20;
+}
+
+template <class T>
+T* Ndm_TableAllocator<T>::allocate(size_t n) {
+    const size_t bytes = n * sizeof(T);
+    if (bytes < 2 * kHugePage) return static_cast<T*>(::operator new(bytes));
+    const size_t rounded = (bytes + kHugePage - 1) & ~(kHugePage - 1);
+    void* p = std::aligned_alloc(kHugePage, rounded);
+    if (!p) throw std::bad_alloc();
+    ::madvise(p, rounded, MADV_HUGEPAGE);
+    return static_cast<T*>(p);
+}
+
+template <class T>
+void Ndm_TableAllocator<T>::deallocate(T* p, size_t n) {
+    if (n * sizeof(T) < 2 * kHugePage)
+        ::operator delete(p);
+    else
+        std::free(p);
+}
+
+template struct Ndm_TableAllocator<uint64_t>;
+template struct Ndm_TableAllocator<Ndm_PtrMap::Slot>;
 
 uint64_t Ndm_NamePool::Hash(std::string_view text) {
     // Eight bytes a step (names are short, file contents long), then a final mix so that low
@@ -206,7 +234,7 @@ void Ndm_NamePool::Reserve(size_t more) {
 }
 
 void Ndm_NamePool::Rehash(size_t slots) {
-    std::vector<uint64_t>(slots).swap(slots_);
+    decltype(slots_)(slots).swap(slots_);
     for (const Chunk& chunk : chunks_) {
         const char* at = chunk.bytes.get();
         const char* const end = at + chunk.used;
@@ -255,7 +283,7 @@ void Ndm_PtrMap::Reserve(size_t keys) {
 }
 
 void Ndm_PtrMap::Rehash(size_t slots) {
-    std::vector<Slot> old(slots);
+    decltype(slots_) old(slots);
     old.swap(slots_);
     size_t mask = slots_.size() - 1;
     for (const Slot& s : old) {

@@ -34,6 +34,19 @@ struct Ndm_ShortText {
     bool operator==(const Ndm_ShortText&) const = default;
 };
 
+// Allocator of large hash tables: a table of megabytes is reached at random, one cache miss and
+// one page-table walk per access; in huge pages the walks mostly go away.
+template <class T>
+struct Ndm_TableAllocator {
+    using value_type = T;
+    Ndm_TableAllocator() = default;
+    template <class U>
+    Ndm_TableAllocator(const Ndm_TableAllocator<U>&) {}  // NOLINT
+    T* allocate(size_t n);
+    void deallocate(T* p, size_t n);
+    bool operator==(const Ndm_TableAllocator&) const = default;
+};
+
 class Ndm_NamePool {
 public:
     Ndm_NamePool();
@@ -87,7 +100,7 @@ private:
     };
     Short short_[256];
     const char* Lookup(std::string_view text);  // Intern, without the short texts
-    std::vector<uint64_t> slots_;
+    std::vector<uint64_t, Ndm_TableAllocator<uint64_t>> slots_;
     size_t used_ = 0;
     struct Chunk {
         std::unique_ptr<char[]> bytes;
@@ -124,6 +137,6 @@ private:
     static size_t HashPtr(const void* key);
     void Grow() { Rehash(slots_.empty() ? 16 : slots_.size() * 2); }
     void Rehash(size_t slots);
-    std::vector<Slot> slots_;
+    std::vector<Slot, Ndm_TableAllocator<Slot>> slots_;
     size_t used_ = 0;
 };
