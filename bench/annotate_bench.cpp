@@ -131,8 +131,8 @@ void BM_MassAttach(benchmark::State& state) {
     state.counters["ns_per_object"] = per_object_ns;
     state.counters["bytes_per_object"] = per_object_bytes;
     std::printf("%d instances matched by one pattern: %.3f us (target <= 0.2) and %.1f heap bytes (target <= 24) for "
-                "each constraint attached to an object\n",
-                cells, per_object_ns / 1000, per_object_bytes);
+                "each constraint attached to an object (%.1f bytes for each object, which carries two)\n",
+                cells, per_object_ns / 1000, per_object_bytes, per_object_bytes * 2);
     std::remove(file.c_str());
 }
 
