@@ -633,9 +633,9 @@ Ndm_Network* Ndm_View::CreateNetwork() {
 
 Ndm_Design::Ndm_Design(const char* name)
     : Ndm_PropertyHolder(Ndm_ObjKind::Design),
-      property_cells_(std::make_unique<Ndm_PropertyCells>()),
+      property_cells_(std::make_unique<Ndm_PropertyCells>(this)),
       names_(std::make_unique<Ndm_NamePool>()),
-      text_lists_(std::make_unique<Ndm_TextLists>()),
+      text_lists_(std::make_unique<Ndm_TextLists>(*property_cells_)),
       objects_(std::make_unique<Ndm_Objects>()) {
     name_ = names_->Intern(name ? name : "");
 }
@@ -646,6 +646,30 @@ Ndm_Design::~Ndm_Design() { DeleteAllProperties(); }
 const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
 const char* Ndm_Design::InternRare(std::string_view name) { return names_->InternRare(name); }
 uint32_t Ndm_Design::TextId(const char* interned) { return names_->IdOf(interned); }
+
+Ndm_PropertyHolder* Ndm_Design::OwnerOfLast(const Ndm_Property* last) {
+    if (!owners_) {
+        owners_ = std::make_unique<std::unordered_map<const Ndm_Property*, Ndm_PropertyHolder*>>();
+        auto note = [this](Ndm_PropertyHolder* holder) {
+            if (const Ndm_Property* p = holder->Last()) owners_->emplace(p, holder);
+        };
+        note(this);
+        for (Ndm_View& view : view_pool_) note(&view);
+        objects_->blocks.ForEach([&](Ndm_Block* block) {
+            note(block);
+            for (Ndm_Signal* signal : block->GetSignalItr()) note(signal);
+            for (Ndm_Pin* pin : block->GetPinItr()) note(pin);
+        });
+        objects_->networks.ForEach(note);
+    }
+    auto it = owners_->find(last);
+    return it == owners_->end() ? nullptr : it->second;
+}
+
+void Ndm_Design::MoveLast(Ndm_PropertyHolder* owner, const Ndm_Property* was, const Ndm_Property* now) {
+    if (was) owners_->erase(was);
+    if (now) (*owners_)[now] = owner;
+}
 
 void Ndm_Design::ReserveNames(size_t more) { names_->Reserve(more); }
 

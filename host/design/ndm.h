@@ -19,6 +19,7 @@
 #include <span>
 #include <string>
 #include <string_view>
+#include <unordered_map>
 #include <vector>
 
 #include "host/design/ndm_property.h"
@@ -466,11 +467,20 @@ private:
     friend class Ndm_Network;
     friend class Ndm_MemberIndex;
     friend class Ndm_Property;
+    friend class Ndm_PropertyHolder;
     Ndm_TextLists& TextLists() { return *text_lists_; }
     Ndm_PropertyCells& PropertyCells() { return *property_cells_; }
+    // The object whose last property is last, found in a map of all objects with properties
+    // made on the first call; later changes to the objects' last properties keep it up to date.
+    Ndm_PropertyHolder* OwnerOfLast(const Ndm_Property* last);
+    void NoteLast(Ndm_PropertyHolder* owner, const Ndm_Property* was, const Ndm_Property* now) {
+        if (owners_) MoveLast(owner, was, now);
+    }
+    void MoveLast(Ndm_PropertyHolder* owner, const Ndm_Property* was, const Ndm_Property* now);
 
     // Declared first, so that it outlives every object whose properties it holds.
     std::unique_ptr<Ndm_PropertyCells> property_cells_;
+    std::unique_ptr<std::unordered_map<const Ndm_Property*, Ndm_PropertyHolder*>> owners_;
     std::unique_ptr<Ndm_NamePool> names_;
     std::unique_ptr<Ndm_TextLists> text_lists_;
     const char* name_;

@@ -52,56 +52,28 @@ void Ndm_PropertyCells::Refill() {
         if (g_cell_chunks_used == kMaxChunks) throw std::bad_alloc();
         number = g_cell_chunks_used++;
     }
-    Ndm_PropertyTables::chunks[number] = static_cast<unsigned char*>(::operator new(kCell << kPlaceBits));
+    void* chunk = std::aligned_alloc(Ndm_PropertyTables::kChunkBytes, Ndm_PropertyTables::kChunkBytes);
+    if (!chunk) {
+        FreeCellChunks().push_back(number);
+        throw std::bad_alloc();
+    }
+    std::memcpy(chunk, &design_, sizeof design_);
+    std::memcpy(static_cast<unsigned char*>(chunk) + sizeof design_, &number, sizeof number);
+    Ndm_PropertyTables::chunks[number] = static_cast<unsigned char*>(chunk);
     chunks_.push_back(number);
     next_ = number << kPlaceBits;
-    left_ = uint32_t{1} << kPlaceBits;
+    left_ = Ndm_PropertyTables::kCellsPerChunk;
 }
 
 Ndm_PropertyCells::~Ndm_PropertyCells() {
     for (uint32_t number : chunks_) {
 #if NDM_ASAN
-        ASAN_UNPOISON_MEMORY_REGION(Ndm_PropertyTables::chunks[number], kCell << kPlaceBits);
+        ASAN_UNPOISON_MEMORY_REGION(Ndm_PropertyTables::chunks[number], Ndm_PropertyTables::kChunkBytes);
 #endif
-        ::operator delete(Ndm_PropertyTables::chunks[number]);
+        std::free(Ndm_PropertyTables::chunks[number]);
         Ndm_PropertyTables::chunks[number] = nullptr;
         FreeCellChunks().push_back(number);
     }
-}
-
-void** Ndm_Handles::pages_[Ndm_Handles::kMaxPages];
-
-namespace {
-// Released handles, for reuse; handles are numbered from 1.
-std::vector<uint32_t>& FreeHandles() {
-    static std::vector<uint32_t> free;
-    return free;
-}
-uint32_t g_handles_used = 1;
-}  // namespace
-
-uint32_t Ndm_Handles::Add(void* p) {
-    uint32_t handle;
-    if (!FreeHandles().empty()) {
-        handle = FreeHandles().back();
-        FreeHandles().pop_back();
-    } else {
-        handle = g_handles_used;
-        void**& page = pages_[handle >> kPageBits];
-        if (!page) {
-            if ((handle >> kPageBits) >= kMaxPages - 1) throw std::bad_alloc();
-            page = new void*[size_t{1} << kPageBits]();
-        }
-        ++g_handles_used;
-    }
-    pages_[handle >> kPageBits][handle & kPageMask] = p;
-    return handle;
-}
-
-void Ndm_Handles::Remove(uint32_t handle) {
-    if (!handle) return;
-    pages_[handle >> kPageBits][handle & kPageMask] = nullptr;
-    FreeHandles().push_back(handle);
 }
 
 Ndm_PropertyNames::Table& Ndm_PropertyNames::Tables() {
@@ -133,25 +105,21 @@ uint32_t Ndm_PropertyNames::Id(const char* name) {
     return id;
 }
 
-Ndm_TextLists::~Ndm_TextLists() {
-    for (const auto& [key, value] : lists_) Ndm_Handles::Remove(value.handle);
-}
-
 uint32_t Ndm_TextLists::Extend(uint32_t list, const char* text) {
     const Key key{list, text};
     Recent& recent = recent_[KeyHash()(key) % std::size(recent_)];
-    if (recent.handle && recent.key == key) return recent.handle;
+    if (recent.cell && recent.key == key) return recent.cell;
     Value& slot = lists_[key];
     if (!slot.texts) {
-        const auto* before = list ? static_cast<const std::vector<std::string>*>(Ndm_Handles::Get(list)) : nullptr;
+        const auto* before = list ? static_cast<const std::vector<std::string>*>(Ndm_PropertyCells::Held(list)) : nullptr;
         slot.texts = std::make_unique<std::vector<std::string>>();
         slot.texts->reserve((before ? before->size() : 0) + 1);
         if (before) *slot.texts = *before;
         slot.texts->emplace_back(text);
-        slot.handle = Ndm_Handles::Add(slot.texts.get());
+        slot.cell = cells_.Hold(slot.texts.get());
     }
-    recent = Recent{key, slot.handle};
-    return slot.handle;
+    recent = Recent{key, slot.cell};
+    return slot.cell;
 }
 
 // ---- properties ----
@@ -162,12 +130,11 @@ Ndm_PropertyCells& Ndm_Property::CellsOf(const Ndm_PropertyHolder* owner) {
     return owner->OwnDesign()->PropertyCells();
 }
 
-uint32_t Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char* name) {
-    Ndm_PropertyCells& cells = CellsOf(owner);
+uint32_t Ndm_Property::Make(Ndm_Design* design, uint32_t link, int type, const char* name) {
+    Ndm_PropertyCells& cells = design->PropertyCells();
     const uint32_t name_id = Ndm_PropertyNames::Id(name ? name : "");
-    const uint32_t handle = owner->Handle();
     const uint32_t cell = cells.Get();
-    Ndm_Property* p = new (At(cell)) Ndm_Property(handle, name_id, type);
+    Ndm_Property* p = new (At(cell)) Ndm_Property(link, name_id, type);
     if (type == NDM_PROP_FLOAT64) {
         p->value_ = cells.Get();
         const double zero = 0.0;
@@ -176,11 +143,18 @@ uint32_t Ndm_Property::Make(Ndm_PropertyHolder* owner, int type, const char* nam
     return cell;
 }
 
+// An entry climbs to its list, a property of an object to the object's last property, which
+// the design knows the object of.
 Ndm_PropertyHolder* Ndm_Property::GetOwner() const {
     const Ndm_Property* p = this;
-    while (!(p->link_ & kAtOwner)) p = At(p->link_ >> 1);
-    return static_cast<Ndm_PropertyHolder*>(Ndm_Handles::Get(p->link_ >> 1));
+    for (;;) {
+        while (!(p->link_ & kLast)) p = At(p->link_ >> 1);
+        if (p->link_ == kLast) return Design()->OwnerOfLast(p);
+        p = At(p->link_ >> 1);
+    }
 }
+
+void* Ndm_Property::Pointer() const { return value_ ? Ndm_PropertyCells::Held(value_) : nullptr; }
 
 double Ndm_Property::GetFloat64() const {
     if (GetType() != NDM_PROP_FLOAT64) return 0.0;
@@ -199,7 +173,7 @@ const char* Ndm_Property::GetValueString() const {
 
 Ndm_Property::ListData* Ndm_Property::List() const {
     return GetType() == NDM_PROP_LIST && !(head_ & kOneEntry) && value_
-               ? static_cast<ListData*>(Ndm_Handles::Get(value_))
+               ? static_cast<ListData*>(Pointer())
                : nullptr;
 }
 
@@ -223,12 +197,12 @@ void Ndm_Property::Free(uint32_t cell, Ndm_PropertyCells& cells) {
     Ndm_Property* p = At(cell);
     const int type = p->GetType();
     if (type == NDM_PROP_STRING_LIST && p->OwnsStrings()) {
-        delete static_cast<std::vector<std::string>*>(Ndm_Handles::Get(p->value_));
-        Ndm_Handles::Remove(p->value_);
+        delete static_cast<std::vector<std::string>*>(p->Pointer());
+        cells.Put(p->value_);
     }
     if (ListData* list = p->List()) {
         delete list;
-        Ndm_Handles::Remove(p->value_);
+        cells.Put(p->value_);
     }
     if (type == NDM_PROP_FLOAT64) cells.Put(p->value_);
     p->~Ndm_Property();
@@ -262,12 +236,12 @@ void Ndm_Property::Destroy(uint32_t cell, Ndm_PropertyCells& cells) {
 const std::vector<std::string>& Ndm_Property::GetStrings() const {
     static const std::vector<std::string> none;
     if (GetType() != NDM_PROP_STRING_LIST || !value_) return none;
-    return *static_cast<const std::vector<std::string>*>(Ndm_Handles::Get(value_));
+    return *static_cast<const std::vector<std::string>*>(Pointer());
 }
 
 void Ndm_Property::SetValueString(const char* value) {
     if (GetType() != NDM_PROP_STRING) return;
-    Ndm_Design* design = GetOwner()->OwnDesign();
+    Ndm_Design* design = Design();
     value_ = design->TextId(design->Intern(value ? value : ""));
 }
 
@@ -279,16 +253,16 @@ bool Ndm_Property::AddString(const char* text) {
     if (GetType() != NDM_PROP_STRING_LIST) return false;
     if (!text) text = "";
     if (OwnsStrings()) {
-        static_cast<std::vector<std::string>*>(Ndm_Handles::Get(value_))->emplace_back(text);
+        static_cast<std::vector<std::string>*>(Pointer())->emplace_back(text);
     } else if (GetStrings().size() < kSharedTexts) {
-        Ndm_Design* design = GetOwner()->OwnDesign();
+        Ndm_Design* design = Design();
         value_ = design->TextLists().Extend(value_, design->Intern(text));
     } else {
         auto own = std::make_unique<std::vector<std::string>>();
         own->reserve(GetStrings().size() * 2);
         *own = GetStrings();
         own->emplace_back(text);
-        value_ = Ndm_Handles::Add(own.release());
+        value_ = Design()->PropertyCells().Hold(own.release());
         head_ |= kOwnsStrings;
     }
     return true;
@@ -296,7 +270,7 @@ bool Ndm_Property::AddString(const char* text) {
 
 uint32_t Ndm_Property::AddEntry(int type, const char* name) {
     if (GetType() != NDM_PROP_LIST) return 0;
-    const uint32_t entry = Make(GetOwner(), type, name);
+    const uint32_t entry = Make(Design(), EntryOf(Ndm_PropertyTables::IndexOf(this)), type, name);
     if (!(head_ & kOneEntry) && !value_) {
         value_ = entry;
         head_ |= kOneEntry;
@@ -305,7 +279,7 @@ uint32_t Ndm_Property::AddEntry(int type, const char* name) {
     if (head_ & kOneEntry) {
         auto data = std::make_unique<ListData>();
         data->entries.push_back(value_);
-        value_ = Ndm_Handles::Add(data.release());
+        value_ = Design()->PropertyCells().Hold(data.release());
         head_ &= ~kOneEntry;
     }
     ListData* list = List();
@@ -359,7 +333,7 @@ bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
         const uint32_t cell = value_;
         value_ = 0;
         head_ &= ~kOneEntry;
-        Destroy(cell, CellsOf(GetOwner()));
+        Destroy(cell, Design()->PropertyCells());
         return true;
     }
     ListData* list = List();
@@ -370,7 +344,7 @@ bool Ndm_Property::DeleteEntry(Ndm_Property* entry) {
     list->entries.erase(it);
     // The first entry of that name may have changed: the index is rebuilt on the next lookup.
     list->index.reset();
-    Destroy(cell, CellsOf(GetOwner()));
+    Destroy(cell, Design()->PropertyCells());
     return true;
 }
 
@@ -390,26 +364,24 @@ Ndm_Design* Ndm_PropertyHolder::OwnDesign() const {
 
 Ndm_PropertyHolder::~Ndm_PropertyHolder() { DeleteAllProperties(); }
 
-uint32_t Ndm_PropertyHolder::Handle() {
-    if (!handle_) handle_ = Ndm_Handles::Add(this);
-    return handle_;
-}
-
-void Ndm_PropertyHolder::DropHandle() {
-    Ndm_Handles::Remove(handle_);
-    handle_ = 0;
+Ndm_Property* Ndm_PropertyHolder::Last() const {
+    if (!first_) return nullptr;
+    Ndm_Property* p = Ndm_Property::At(first_);
+    while (Ndm_Property* next = p->Next()) p = next;
+    return p;
 }
 
 void Ndm_PropertyHolder::DeleteAllProperties() {
     if (!first_) return;
-    Ndm_PropertyCells& cells = Ndm_Property::CellsOf(this);
+    Ndm_Design* design = OwnDesign();
+    design->NoteLast(this, Last(), nullptr);
+    Ndm_PropertyCells& cells = design->PropertyCells();
     for (uint32_t cell = first_; cell;) {
         const uint32_t link = Ndm_Property::At(cell)->link_;
         Ndm_Property::Destroy(cell, cells);
-        cell = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
+        cell = link & Ndm_Property::kLast ? 0 : link >> 1;
     }
     first_ = 0;
-    DropHandle();
 }
 
 const char* Ndm_PropertyHolder::GetName() const {
@@ -446,21 +418,27 @@ int Ndm_PropertyHolder::GetNumProperties() const { return static_cast<int>(GetPr
 // A property of a name the object has takes the place of the old one; a new name goes last.
 Ndm_Property* Ndm_PropertyHolder::Create(int type, const char* name) {
     if (!name) return nullptr;
-    const uint32_t cell = Ndm_Property::Make(this, type, name);
+    Ndm_Design* design = OwnDesign();
+    const uint32_t cell = Ndm_Property::Make(design, Ndm_Property::kLast, type, name);
     Ndm_Property* fresh = Ndm_Property::At(cell);
     Ndm_Property* prev = nullptr;
     uint32_t old = first_;
     while (old && Ndm_Property::At(old)->NameId() != fresh->NameId()) {
         prev = Ndm_Property::At(old);
         const uint32_t link = prev->link_;
-        old = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
+        old = link & Ndm_Property::kLast ? 0 : link >> 1;
     }
     if (old) fresh->link_ = Ndm_Property::At(old)->link_;  // in the old one's place
     if (prev)
         prev->LinkTo(cell);
     else
         first_ = cell;
-    if (old) Ndm_Property::Destroy(old, Ndm_Property::CellsOf(this));
+    // The object's last property changes when the new one goes last or replaces the last one.
+    if (!old)
+        design->NoteLast(this, prev, fresh);
+    else if (fresh->link_ == Ndm_Property::kLast)
+        design->NoteLast(this, Ndm_Property::At(old), fresh);
+    if (old) Ndm_Property::Destroy(old, design->PropertyCells());
     return fresh;
 }
 
@@ -493,15 +471,16 @@ bool Ndm_PropertyHolder::DeleteProperty(Ndm_Property* property) {
         const uint32_t link = p->link_;
         if (p != property) {
             prev = p;
-            cell = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
+            cell = link & Ndm_Property::kLast ? 0 : link >> 1;
             continue;
         }
         if (prev)
             prev->link_ = link;
         else
-            first_ = link & Ndm_Property::kAtOwner ? 0 : link >> 1;
-        Ndm_Property::Destroy(cell, Ndm_Property::CellsOf(this));
-        if (!first_) DropHandle();
+            first_ = link & Ndm_Property::kLast ? 0 : link >> 1;
+        Ndm_Design* design = OwnDesign();
+        if (link == Ndm_Property::kLast) design->NoteLast(this, p, prev);
+        Ndm_Property::Destroy(cell, design->PropertyCells());
         return true;
     }
     return false;

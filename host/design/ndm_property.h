@@ -37,15 +37,28 @@ const char* Ndm_PropTypeName(int type);
 class Ndm_EntryRange;
 
 // Where properties are, for the inline accessors below (kept by property_store.h): the chunks of
-// 12-byte cells of every design, by number, and the property names, by id.
+// 12-byte cells of every design, by number, and the property names, by id. A chunk is 64 KB,
+// aligned to its size, and begins with its design and its number, so that a property finds its
+// design and its own index from its address.
 struct Ndm_PropertyTables {
     static constexpr int kPlaceBits = 13;
     static constexpr size_t kCell = 12;
+    static constexpr size_t kChunkBytes = size_t{1} << 16;
+    static constexpr size_t kHead = 16;
+    static constexpr uint32_t kCellsPerChunk = (kChunkBytes - kHead) / kCell;
     static constexpr size_t kMaxChunks = size_t{1} << (31 - kPlaceBits);
     static unsigned char* chunks[kMaxChunks];
     static const char* const* names;
     static unsigned char* Cell(uint32_t cell) {
-        return chunks[cell >> kPlaceBits] + (cell & ((uint32_t{1} << kPlaceBits) - 1)) * kCell;
+        return chunks[cell >> kPlaceBits] + kHead + (cell & ((uint32_t{1} << kPlaceBits) - 1)) * kCell;
+    }
+    static Ndm_Design* DesignOf(const void* cell) {
+        return *reinterpret_cast<Ndm_Design* const*>(reinterpret_cast<uintptr_t>(cell) & ~(kChunkBytes - 1));
+    }
+    static uint32_t IndexOf(const void* cell) {
+        const uintptr_t at = reinterpret_cast<uintptr_t>(cell), chunk = at & ~(kChunkBytes - 1);
+        const uint32_t number = *reinterpret_cast<const uint32_t*>(chunk + sizeof(void*));
+        return number << kPlaceBits | static_cast<uint32_t>((at - chunk - kHead) / kCell);
     }
 };
 
@@ -103,13 +116,15 @@ private:
     friend class Ndm_PropertyHolder;
     friend class Ndm_PropertyRange;
     friend class Ndm_EntryRange;
-    Ndm_Property(uint32_t owner, uint32_t name, int type) : head_(name | static_cast<uint32_t>(type) << kTypeShift), link_(owner << 1 | kAtOwner), value_(0) {}
+    Ndm_Property(uint32_t link, uint32_t name, int type)
+        : head_(name | static_cast<uint32_t>(type) << kTypeShift), link_(link), value_(0) {}
     ~Ndm_Property() = default;
     // Properties live in the design's cells and are known there by index.
     static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
     static Ndm_Property* At(uint32_t cell) { return reinterpret_cast<Ndm_Property*>(Ndm_PropertyTables::Cell(cell)); }
-    // A new property of owner, as its cell's index.
-    static uint32_t Make(Ndm_PropertyHolder* owner, int type, const char* name);
+    Ndm_Design* Design() const { return Ndm_PropertyTables::DesignOf(this); }
+    // A new property in design's cells with that link, as its cell's index.
+    static uint32_t Make(Ndm_Design* design, uint32_t link, int type, const char* name);
     static void Destroy(uint32_t cell, Ndm_PropertyCells& cells);
     static void Free(uint32_t cell, Ndm_PropertyCells& cells);
     uint32_t AddEntry(int type, const char* name);
@@ -124,11 +139,14 @@ private:
     uint32_t NameId() const { return head_ & kNameMask; }
     bool OwnsStrings() const { return head_ & kOwnsStrings; }
 
-    // The link: the next property of the same object, or at the end (and for list entries) the
-    // object itself, as a handle, marked by the low bit.
-    static constexpr uint32_t kAtOwner = 1;
-    Ndm_Property* Next() const { return link_ & kAtOwner ? nullptr : At(link_ >> 1); }
+    // The link: the next property of the same object; or, marked by the low bit, nothing after
+    // the last property of an object, and the list for an entry of a list.
+    static constexpr uint32_t kLast = 1;
+    static uint32_t EntryOf(uint32_t list) { return list << 1 | kLast; }
+    Ndm_Property* Next() const { return link_ & kLast ? nullptr : At(link_ >> 1); }
     void LinkTo(uint32_t cell) { link_ = cell << 1; }
+    // What a string list or a list of several entries points to, kept in a cell of its own.
+    void* Pointer() const;
 
     // Entries of a list property (owned, by index), and the first entry of each name, built by
     // the first lookup in a list of more than kIndexFrom entries and kept up to date by
@@ -141,9 +159,9 @@ private:
     ListData* List() const;
 
     // A property is 12 bytes. Its value: an int32 or bool; a string's text id in the design's
-    // name pool; a float64's own cell; a string list's handle (shared between every property
-    // holding the same texts, Ndm_TextLists, or owned when long); a list's one entry, or the
-    // handle of its entries.
+    // name pool; a float64's own cell; the cell pointing to a string list (shared between every
+    // property holding the same texts, Ndm_TextLists, or owned when long); a list's one entry,
+    // or the cell pointing to its entries.
     uint32_t head_;
     uint32_t link_;
     uint32_t value_;
@@ -249,7 +267,7 @@ private:
 enum class Ndm_ObjKind : uint8_t { Design, View, Block, Signal, Pin, Network };
 
 // Base of every design object: an ordered set of typed properties. Objects without
-// properties pay eight bytes.
+// properties pay four bytes.
 class Ndm_PropertyHolder {
 public:
     Ndm_PropertyHolder(const Ndm_PropertyHolder&) = delete;
@@ -287,15 +305,14 @@ protected:
 
 private:
     friend class Ndm_Property;
+    friend class Ndm_Design;
     Ndm_Property* Create(int type, const char* name);
-    // The object's handle, which its last property links to; made with the first property.
-    uint32_t Handle();
-    void DropHandle();
+    // The last property, or null.
+    Ndm_Property* Last() const;
 
     // The design the object belongs to, which interns the property names and texts.
     Ndm_Design* OwnDesign() const;
 
-    uint32_t first_ = 0;   // the first property's cell, linked to the next
-    uint32_t handle_ = 0;  // while the object has properties
+    uint32_t first_ = 0;  // the first property's cell, linked to the next
     Ndm_ObjKind kind_;
 };

@@ -55,10 +55,16 @@ public:
     Ndm_Pool(const Ndm_Pool&) = delete;
     Ndm_Pool& operator=(const Ndm_Pool&) = delete;
     ~Ndm_Pool() {
+        ForEach([](T* item) { item->~T(); });
+    }
+
+    // Calls f on every object, in the order they were made.
+    template <class F>
+    void ForEach(F f) {
         for (size_t c = 0; c < chunks_.size(); ++c) {
             T* items = reinterpret_cast<T*>(chunks_[c].get());
             const size_t n = c + 1 < chunks_.size() ? kPer : used_;
-            for (size_t i = 0; i < n; ++i) items[i].~T();
+            for (size_t i = 0; i < n; ++i) f(items + i);
         }
     }
 

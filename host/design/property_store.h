@@ -1,6 +1,5 @@
 // How a design stores its properties (internal to host/design): the cells properties live in,
-// the 32-bit handles that stand for pointers inside a property, the property names, and the
-// string-list values shared between properties.
+// the property names, and the string-list values shared between properties.
 #pragma once
 
 #include <cstddef>
@@ -27,9 +26,9 @@
 #include <sanitizer/asan_interface.h>
 #endif
 
-// Cells of 12 bytes for a design's properties, taken from chunks of 8,192 and reused once
-// freed. A cell is known by a 32-bit index: the chunk's number, registered with the process so
-// that an index alone finds its cell, and the place in the chunk. Index 0 is no cell.
+// Cells of 12 bytes for a design's properties, taken from chunks of 5,460 and reused once freed.
+// A cell is known by a 32-bit index: the chunk's number, registered with the process so that an
+// index alone finds its cell, and the place in the chunk. Index 0 is no cell.
 class Ndm_PropertyCells {
 public:
     static constexpr size_t kCell = Ndm_PropertyTables::kCell;
@@ -37,7 +36,7 @@ public:
     // Indexes take 31 bits, which leaves a link its mark bit.
     static constexpr size_t kMaxChunks = Ndm_PropertyTables::kMaxChunks;
 
-    Ndm_PropertyCells() = default;
+    explicit Ndm_PropertyCells(Ndm_Design* design) : design_(design) {}
     ~Ndm_PropertyCells();
     Ndm_PropertyCells(const Ndm_PropertyCells&) = delete;
     Ndm_PropertyCells& operator=(const Ndm_PropertyCells&) = delete;
@@ -61,6 +60,17 @@ public:
     }
     // The cell at a (non-zero) index, of whichever design.
     static unsigned char* At(uint32_t cell) { return Ndm_PropertyTables::Cell(cell); }
+    // A cell holding a pointer, and the pointer a cell holds.
+    uint32_t Hold(const void* p) {
+        const uint32_t cell = Get();
+        std::memcpy(At(cell), &p, sizeof p);
+        return cell;
+    }
+    static void* Held(uint32_t cell) {
+        void* p;
+        std::memcpy(&p, At(cell), sizeof p);
+        return p;
+    }
 
 private:
     void Refill();
@@ -73,23 +83,9 @@ private:
     static void Poison(void*) {}
     static void Unpoison(void*) {}
 #endif
+    Ndm_Design* design_;            // at the head of each chunk
     std::vector<uint32_t> chunks_;  // numbers of this design's chunks
     uint32_t next_ = 0, left_ = 0, free_ = 0;
-};
-
-// 32-bit handles for pointers, process-wide: a property keeps its owner, its list data or a
-// shared string list as a handle. Handle 0 is none; released handles are reused.
-class Ndm_Handles {
-public:
-    static uint32_t Add(void* p);
-    static void Remove(uint32_t handle);
-    static void* Get(uint32_t handle) { return pages_[handle >> kPageBits][handle & kPageMask]; }
-
-private:
-    static constexpr int kPageBits = 12;
-    static constexpr uint32_t kPageMask = (uint32_t{1} << kPageBits) - 1;
-    static constexpr size_t kMaxPages = size_t{1} << (31 - kPageBits);
-    static void** pages_[kMaxPages];
 };
 
 // Property names, process-wide: a name is kept once and known by a 24-bit id. Names are few (the
@@ -118,15 +114,15 @@ private:
 };
 
 // The string-list values of a design: one for each distinct short list, reached from the list
-// it extends by one text. Lists are never freed before the design; each has a handle.
+// it extends by one text. Lists are never freed before the design; each has a cell pointing to
+// it, which properties holding the list point to.
 class Ndm_TextLists {
 public:
-    Ndm_TextLists() = default;
-    ~Ndm_TextLists();
+    explicit Ndm_TextLists(Ndm_PropertyCells& cells) : cells_(cells) {}
     Ndm_TextLists(const Ndm_TextLists&) = delete;
     Ndm_TextLists& operator=(const Ndm_TextLists&) = delete;
-    // The handle of the list made of list's texts (0: none) followed by text, which the design
-    // has interned.
+    // The cell of the list made of list's texts (cell 0: none) followed by text, which the
+    // design has interned.
     uint32_t Extend(uint32_t list, const char* text);
 
 private:
@@ -140,14 +136,15 @@ private:
     };
     struct Value {
         std::unique_ptr<std::vector<std::string>> texts;
-        uint32_t handle = 0;
+        uint32_t cell = 0;
     };
+    Ndm_PropertyCells& cells_;
     std::unordered_map<Key, Value, KeyHash> lists_;
     // The last lists made or found, by their key: a statement gives thousands of objects the
     // same lists, one text at a time.
     struct Recent {
         Key key{};
-        uint32_t handle = 0;
+        uint32_t cell = 0;
     };
     Recent recent_[64];
 };
