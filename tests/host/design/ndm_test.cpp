@@ -355,6 +355,9 @@ TEST(DesignDatabase, PropertyEditsKeepOrderAndOwnerAnywhereInTheList) {
     EXPECT_EQ(list->GetNumEntries(), 0);
     Ndm_Property* again = list->CreatePropertyString("C", "3");
     EXPECT_EQ(list->GetEntryByName("C"), again);
+    Ndm_Property* deep = list->CreatePropertyList("IN")->CreatePropertyList("IN2")->CreatePropertyFloat64("D", 0.5);
+    EXPECT_EQ(deep->GetOwner(), cell);  // an entry of a list in a list in a list
+    EXPECT_EQ(deep->GetFloat64(), 0.5);
     Ndm_Property* single = cell->CreatePropertyList("S");
     EXPECT_TRUE(single->DeleteEntry(single->CreatePropertyBool("X")));
     EXPECT_EQ(single->GetNumEntries(), 0);
