@@ -126,10 +126,6 @@ uint32_t Ndm_TextLists::Extend(uint32_t list, const char* text) {
 
 static_assert(sizeof(Ndm_Property) == Ndm_PropertyCells::kCell, "a property is three 32-bit words");
 
-Ndm_PropertyCells& Ndm_Property::CellsOf(const Ndm_PropertyHolder* owner) {
-    return owner->OwnDesign()->PropertyCells();
-}
-
 uint32_t Ndm_Property::Make(Ndm_Design* design, uint32_t link, int type, const char* name) {
     Ndm_PropertyCells& cells = design->PropertyCells();
     const uint32_t name_id = Ndm_PropertyNames::Id(name ? name : "");

@@ -71,8 +71,9 @@ public:
     const char* GetName() const { return Ndm_PropertyTables::names[NameId()]; }
     // Type code (Ndm_PropType).
     int GetType() const { return static_cast<int>(head_ >> kTypeShift & 15); }
-    // Object the property sits on (for list entries: the object of the list). Found at the end
-    // of the object's properties, which are few.
+    // Object the property sits on (for list entries: the object of the list). Found from the
+    // object's last property, which the design maps to the object (the map is made by the first
+    // call).
     Ndm_PropertyHolder* GetOwner() const;
 
     // Value accessors; each answers a neutral value for a property of another type.
@@ -120,7 +121,6 @@ private:
         : head_(name | static_cast<uint32_t>(type) << kTypeShift), link_(link), value_(0) {}
     ~Ndm_Property() = default;
     // Properties live in the design's cells and are known there by index.
-    static Ndm_PropertyCells& CellsOf(const Ndm_PropertyHolder* owner);
     static Ndm_Property* At(uint32_t cell) { return reinterpret_cast<Ndm_Property*>(Ndm_PropertyTables::Cell(cell)); }
     Ndm_Design* Design() const { return Ndm_PropertyTables::DesignOf(this); }
     // A new property in design's cells with that link, as its cell's index.
