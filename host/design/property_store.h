@@ -93,9 +93,8 @@ private:
 class Ndm_PropertyNames {
 public:
     static constexpr uint32_t kMaxIds = uint32_t{1} << 24;
-    // The id of name, added if new.
+    // The id of name, added if new; Ndm_PropertyTables::names gives the name of an id.
     static uint32_t Id(const char* name);
-    static const char* Name(uint32_t id) { return names_[id]; }
 
 private:
     struct Table {
