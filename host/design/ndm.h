@@ -478,7 +478,7 @@ private:
     }
     void MoveLast(Ndm_PropertyHolder* owner, const Ndm_Property* was, const Ndm_Property* now);
 
-    // Declared first, so that it outlives every object whose properties it holds.
+    // Declared first, so that they outlive every object whose properties they hold or map.
     std::unique_ptr<Ndm_PropertyCells> property_cells_;
     std::unique_ptr<std::unordered_map<const Ndm_Property*, Ndm_PropertyHolder*>> owners_;
     std::unique_ptr<Ndm_NamePool> names_;
