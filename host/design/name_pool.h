@@ -18,12 +18,18 @@ struct Ndm_ShortText {
     bool Of(std::string_view text) {
         size = text.size();
         if (size > kMaxBytes) return false;
-        head = tail = 0;
+        // Fixed-size loads that may overlap, never past the text: no call to copy a few bytes.
+        const char* p = text.data();
         if (size > 8) {
-            std::memcpy(&head, text.data(), 8);
-            std::memcpy(&tail, text.data() + 8, size - 8);
-        } else if (size) {
-            std::memcpy(&head, text.data(), size);
+            head = Load<uint64_t>(p);
+            tail = Load<uint64_t>(p + size - 8) >> (8 * (16 - size));
+        } else if (size >= 4) {
+            head = Load<uint32_t>(p) | uint64_t{Load<uint32_t>(p + size - 4)} << (8 * (size - 4));
+            tail = 0;
+        } else {
+            const auto byte = [p](size_t i) { return uint64_t{static_cast<unsigned char>(p[i])} << (8 * i); };
+            head = size ? byte(0) | byte(size / 2) | byte(size - 1) : 0;
+            tail = 0;
         }
         return true;
     }
@@ -32,6 +38,14 @@ struct Ndm_ShortText {
         return ((head * 0x9e3779b97f4a7c15ull) ^ (tail * 0x94d049bb133111ebull) ^ size) >> (64 - bits);
     }
     bool operator==(const Ndm_ShortText&) const = default;
+
+private:
+    template <class T>
+    static T Load(const char* p) {
+        T v;
+        std::memcpy(&v, p, sizeof v);
+        return v;
+    }
 };
 
 // Allocator of large hash tables: a table of megabytes is reached at random, one cache miss and
