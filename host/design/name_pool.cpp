@@ -3,19 +3,19 @@
 #include <algorithm>
 #include <bit>
 #include <cstdint>
-#include <cstring>
 #include <cstdlib>
-#include <sys/mman.h>
+#include <cstring>
 #include <new>
 #include <stdexcept>
 
-namespace {
-constexpr size_t kChunk = 1 << 20;
-}
+#include <sys/mman.h>
+
+#include "host/design/object_pool.h"
 
 namespace {
+constexpr size_t kChunk = 1 << 20;
 constexpr size_t kHugePage = size_t{2} << 20;
-}
+}  // namespace
 
 template <class T>
 T* Ndm_TableAllocator<T>::allocate(size_t n) {
@@ -71,11 +71,10 @@ namespace {
 // of released chunks are reused; 0 is not a chunk.
 constexpr size_t kMaxTextChunks = size_t{1} << 12;
 const char* g_text_chunks[kMaxTextChunks];
-std::vector<uint32_t>& FreeTextChunks() {
-    static std::vector<uint32_t> free;
-    return free;
+Ndm_Numbers& TextChunkNumbers() {
+    static Ndm_Numbers numbers(kMaxTextChunks);
+    return numbers;
 }
-uint32_t g_text_chunks_used = 1;
 }  // namespace
 
 const char* Ndm_NamePool::TextBase(uint32_t chunk_id) { return g_text_chunks[chunk_id]; }
@@ -85,7 +84,7 @@ Ndm_NamePool::~Ndm_NamePool() {
     for (const Chunk& chunk : chunks_) {
         if (!chunk.id) continue;
         g_text_chunks[chunk.id] = nullptr;
-        FreeTextChunks().push_back(chunk.id);
+        TextChunkNumbers().Give(chunk.id);
     }
 }
 
@@ -108,14 +107,7 @@ uint32_t Ndm_NamePool::IdOf(const char* stored) {
     }
     Chunk& chunk = chunks_[c];
     if (!chunk.id) {
-        std::vector<uint32_t>& free = FreeTextChunks();
-        if (!free.empty()) {
-            chunk.id = free.back();
-            free.pop_back();
-        } else {
-            if (g_text_chunks_used == kMaxTextChunks) throw std::bad_alloc();
-            chunk.id = g_text_chunks_used++;
-        }
+        chunk.id = TextChunkNumbers().Take();
         g_text_chunks[chunk.id] = chunk.bytes.get();
     }
     return chunk.id << kOffsetBits | static_cast<uint32_t>(at - reinterpret_cast<uintptr_t>(chunk.bytes.get()));

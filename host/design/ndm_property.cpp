@@ -7,6 +7,7 @@
 
 #include "host/design/ndm.h"
 #include "host/design/name_pool.h"
+#include "host/design/object_pool.h"
 #include "host/design/property_store.h"
 
 const char* Ndm_PropTypeName(int type) {
@@ -35,26 +36,18 @@ unsigned char* Ndm_PropertyTables::chunks[Ndm_PropertyTables::kMaxChunks];
 const char* const* Ndm_PropertyTables::names = nullptr;
 
 namespace {
-// Chunk numbers given back by designs that went, for the next ones; 0 is never a chunk.
-std::vector<uint32_t>& FreeCellChunks() {
-    static std::vector<uint32_t> free;
-    return free;
+// Numbers of the chunks of cells; designs that go give theirs back for the next ones.
+Ndm_Numbers& CellChunkNumbers() {
+    static Ndm_Numbers numbers(Ndm_PropertyTables::kMaxChunks);
+    return numbers;
 }
-uint32_t g_cell_chunks_used = 1;
 }  // namespace
 
 void Ndm_PropertyCells::Refill() {
-    uint32_t number;
-    if (!FreeCellChunks().empty()) {
-        number = FreeCellChunks().back();
-        FreeCellChunks().pop_back();
-    } else {
-        if (g_cell_chunks_used == kMaxChunks) throw std::bad_alloc();
-        number = g_cell_chunks_used++;
-    }
+    const uint32_t number = CellChunkNumbers().Take();
     void* chunk = std::aligned_alloc(Ndm_PropertyTables::kChunkBytes, Ndm_PropertyTables::kChunkBytes);
     if (!chunk) {
-        FreeCellChunks().push_back(number);
+        CellChunkNumbers().Give(number);
         throw std::bad_alloc();
     }
     std::memcpy(chunk, &design_, sizeof design_);
@@ -72,7 +65,7 @@ Ndm_PropertyCells::~Ndm_PropertyCells() {
 #endif
         std::free(Ndm_PropertyTables::chunks[number]);
         Ndm_PropertyTables::chunks[number] = nullptr;
-        FreeCellChunks().push_back(number);
+        CellChunkNumbers().Give(number);
     }
 }
 

@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <cstdlib>
 #include <memory>
 #include <new>
@@ -45,6 +46,28 @@ private:
     std::vector<std::unique_ptr<Word[]>> chunks_;
     unsigned char* cursor_ = nullptr;
     size_t left_ = 0;
+};
+
+// Numbers from 1 up to a limit, handed out and given back for reuse: the process-wide numbers of
+// chunks that 32-bit ids point into. 0 is never handed out.
+class Ndm_Numbers {
+public:
+    explicit Ndm_Numbers(uint32_t limit) : limit_(limit) {}
+    // A free number; throws bad_alloc when all are taken.
+    uint32_t Take() {
+        if (!free_.empty()) {
+            const uint32_t n = free_.back();
+            free_.pop_back();
+            return n;
+        }
+        if (next_ == limit_) throw std::bad_alloc();
+        return next_++;
+    }
+    void Give(uint32_t n) { free_.push_back(n); }
+
+private:
+    uint32_t limit_, next_ = 1;
+    std::vector<uint32_t> free_;
 };
 
 // Objects of one type, made in chunks of kPer and destroyed in the order they were made.
