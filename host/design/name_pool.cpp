@@ -151,7 +151,7 @@ const char* Ndm_NamePool::Intern(std::string_view text) {
     return stored;
 }
 
-const char* Ndm_NamePool::Lookup(std::string_view text) {
+const char* Ndm_NamePool::Lookup(std::string_view text, bool* added) {
     const uint64_t h = Hash(text), tag = TagOf(h);
     const size_t mask = slots_.size() - 1;
     size_t i = h & mask;
@@ -160,9 +160,12 @@ const char* Ndm_NamePool::Lookup(std::string_view text) {
         if (!slot) break;
         if ((slot & ~kAddressMask) != tag) continue;
         const char* s = AddressOf(slot);
-        if (StoredLength(s) == text.size() && (text.empty() || std::memcmp(s, text.data(), text.size()) == 0))
+        if (StoredLength(s) == text.size() && (text.empty() || std::memcmp(s, text.data(), text.size()) == 0)) {
+            if (added) *added = false;
             return s;
+        }
     }
+    if (added) *added = true;
     const char* stored = Store(text);
     slots_[i] = tag | reinterpret_cast<uintptr_t>(stored);
     if (++used_ * 2 > slots_.size()) Grow();

@@ -72,6 +72,8 @@ public:
     // The same for a text that seldom comes back soon (an instance or a net name): it skips the
     // short texts' table, which it would only churn.
     const char* InternRare(std::string_view text) { return Lookup(text); }
+    // The same, telling whether the text is new to the pool.
+    const char* InternRare(std::string_view text, bool& added) { return Lookup(text, &added); }
     // Stored copy when the text was interned before, else null.
     const char* Find(std::string_view text) const;
     size_t bytes() const { return bytes_; }
@@ -82,6 +84,10 @@ public:
     char* Keep(size_t size);
 
     static uint64_t Hash(std::string_view text);
+    // Starts loading the slot of text into the cache, for a caller that interns it soon.
+    void Prefetch(std::string_view text) const {
+        if (!slots_.empty()) __builtin_prefetch(&slots_[Hash(text) & (slots_.size() - 1)]);
+    }
 
     // A 32-bit id of a text this pool interned (the same id for the same text), for values that
     // keep their text in four bytes; Text(id) gives it back, and 0 stands for the empty text.
@@ -113,7 +119,7 @@ private:
         const char* stored = nullptr;
     };
     Short short_[256];
-    const char* Lookup(std::string_view text);  // Intern, without the short texts
+    const char* Lookup(std::string_view text, bool* added = nullptr);  // Intern, without the short texts
     std::vector<uint64_t, Ndm_TableAllocator<uint64_t>> slots_;
     size_t used_ = 0;
     struct Chunk {
@@ -138,6 +144,10 @@ public:
     void* Find(const void* key) const;
     // Makes room for that many keys in all.
     void Reserve(size_t keys);
+    // Starts loading the slot of key into the cache, for a caller that will look it up soon.
+    void Prefetch(const void* key) const {
+        if (!slots_.empty()) __builtin_prefetch(&slots_[HashPtr(key) & (slots_.size() - 1)]);
+    }
     void Clear() {
         slots_.clear();
         used_ = 0;

@@ -440,6 +440,11 @@ public:
     // The same for a name that seldom comes back soon, as instance and net names do not: readers
     // intern millions of those.
     const char* InternRare(std::string_view name);
+    // The same, telling whether the name is new to the design.
+    const char* InternRare(std::string_view name, bool& added);
+    // Starts bringing what interning name will read into the cache (a reader that knows a
+    // name before it needs it).
+    void PrefetchName(std::string_view name) const;
     // A 32-bit id of an interned name (Ndm_NamePool::IdOf).
     uint32_t TextId(const char* interned);
     // Makes room for that many more names, for readers that know how many are coming.

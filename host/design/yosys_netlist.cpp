@@ -489,7 +489,8 @@ bool Reader::Build(const char* top_module) {
     doc_ = od::document();
     parser_ = od::parser();
     buf_.Release();
-    for (Ndm_PtrMap& seen : seen_) seen = Ndm_PtrMap();
+    for (SeenNames& seen : seen_) seen.Release();
+    seen_conns_ = Ndm_PtrMap();
 
     const Module& m = modules_[top];
     design_.SetName(m.name);

@@ -235,7 +235,7 @@ bool Reader::BeginModule(od::raw_json_string key, bool& skip) {
     module_ = Module();
     module_.name = design_.Intern(StripEscape(name));
     module_.offset = Where();
-    for (Ndm_PtrMap& seen : seen_) seen.Clear();
+    for (SeenNames& seen : seen_) seen.Clear();
     module_name_ = module_.name;
     if (module_index_.Find(module_.name))
         return ShapeError(Port_Format("module '%s' is defined twice", module_.name));
@@ -272,13 +272,21 @@ bool Reader::NameOk(std::string_view name, const Module* m, const char* kind, bo
     return false;
 }
 
+void SeenNames::Settle() {
+    set_.Reserve(noted_.size() + 1);
+    // The noted names go in eight ahead of their slots, which are far apart in a large set.
+    constexpr size_t kAhead = 8;
+    for (size_t i = 0; i < noted_.size(); ++i) {
+        if (i + kAhead < noted_.size()) set_.Prefetch(noted_[i + kAhead]);
+        set_.InsertIfAbsent(noted_[i], const_cast<char*>(noted_[i]));
+    }
+    noted_.clear();
+}
+
 // False, after an error naming the file, the module and the name, when the module already has
 // an object of that kind and name (interned); the caller leaves the second one out.
-bool Reader::FirstOfName(Ndm_PtrMap& seen, const char* name, const Module& m, const char* kind) {
-    if (!seen.Find(name)) {
-        seen.InsertIfAbsent(name, const_cast<char*>(name));
-        return true;
-    }
+bool Reader::FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind) {
+    if (seen.Add(name, new_to_design)) return true;
     Error(Port_Format("Module '%s' in '%s' has two %ss named '%s' (at byte %zu).", m.name, path_, kind, name, Where()));
     ++bad_names_;
     return false;
@@ -352,8 +360,9 @@ bool Reader::MemberName(Module& m, od::raw_json_string key, const char* kind, in
     if (!NameOk(StripEscape(text), &m, kind)) return true;
     // Port names come back on every cell of the module's type; cell and net names seldom do.
     const std::string_view bare = StripEscape(text);
-    const char* interned = seen == kSeenPorts ? design_.Intern(bare) : design_.InternRare(bare);
-    if (FirstOfName(seen_[seen], interned, m, kind)) name = interned;
+    bool added = false;
+    const char* interned = seen == kSeenPorts ? design_.Intern(bare) : design_.InternRare(bare, added);
+    if (FirstOfName(seen_[seen], interned, added, m, kind)) name = interned;
     return true;
 }
 
@@ -544,7 +553,7 @@ bool Reader::FirstConnection(const Module& m, const Cell& cell, const char* name
     if (count <= kDirect) {
         for (size_t k = cell.first_conn; k < m.conns.size() && !twice; ++k) twice = m.conns[k].name == name;
     } else {
-        Ndm_PtrMap& seen = seen_[kSeenConns];
+        Ndm_PtrMap& seen = seen_conns_;
         if (count == kDirect + 1) {
             seen.Clear();
             for (size_t k = cell.first_conn; k < m.conns.size(); ++k)

@@ -56,6 +56,40 @@ struct Conn {  // its direction is in Module::conn_dirs, which keeps a connectio
     Range bits;
 };
 
+// The names of one kind of object (ports, cells or nets) of the module being read, for telling
+// a second object of a name. A name new to the design cannot name a second object: it is only
+// noted, and the set is made when a name the design knew comes. A flat netlist's million cell
+// names then cost no lookup in a set that large.
+class SeenNames {
+public:
+    // False when the module has an object of this kind and name already; the name is noted.
+    bool Add(const char* name, bool new_to_design) {
+        if (new_to_design) {
+            noted_.push_back(name);
+            return true;
+        }
+        if (!noted_.empty()) Settle();
+        if (set_.Find(name)) return false;
+        set_.InsertIfAbsent(name, const_cast<char*>(name));
+        return true;
+    }
+    void Reserve(size_t names) { noted_.reserve(names); }
+    void Clear() {
+        set_.Clear();
+        noted_.clear();
+    }
+    // Gives back all memory (the reader is done with modules).
+    void Release() {
+        set_ = Ndm_PtrMap();
+        noted_ = std::vector<const char*>();
+    }
+
+private:
+    void Settle();
+    Ndm_PtrMap set_;
+    std::vector<const char*> noted_;
+};
+
 struct Cell {
     const char* name;
     const char* type = nullptr;
@@ -243,7 +277,7 @@ private:
     bool ParseNets(od::value value, Module& m);
     bool NetMember(Module& m, od::raw_json_string name_key, od::value value);
     bool NameOk(std::string_view name, const Module* m, const char* kind, bool may_be_empty = false);
-    bool FirstOfName(Ndm_PtrMap& seen, const char* name, const Module& m, const char* kind);
+    bool FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind);
     bool FirstConnection(const Module& m, const Cell& cell, const char* name);
     void Finish(Module& m);
 
@@ -287,9 +321,9 @@ private:
     std::vector<BitNames> pin_names_;
     Ndm_PtrMap pin_names_of_;  // port name -> its first entry in pin_names_, plus one
     const char* module_name_ = "";
-    enum { kSeenPorts, kSeenCells, kSeenNets, kSeenConns };
-    Ndm_PtrMap seen_[4];    // names of the ports, cells and netnames of the module being read,
-                            // and of the connections of a cell with many
+    enum { kSeenPorts, kSeenCells, kSeenNets };
+    SeenNames seen_[3];      // names of the ports, cells and netnames of the module being read
+    Ndm_PtrMap seen_conns_;  // names of the connections of a cell with many
     size_t bad_names_ = 0;  // objects left out for their names
 
     Ndm_JsonChunks::Reader* pieces_ = nullptr;  // while a large file is read in pieces
