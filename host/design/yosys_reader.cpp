@@ -285,9 +285,10 @@ void SeenNames::Settle() {
 
 // False, after an error naming the file, the module and the name, when the module already has
 // an object of that kind and name (interned); the caller leaves the second one out.
-bool Reader::FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind) {
+bool Reader::FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind,
+                         size_t where) {
     if (seen.Add(name, new_to_design)) return true;
-    Error(Port_Format("Module '%s' in '%s' has two %ss named '%s' (at byte %zu).", m.name, path_, kind, name, Where()));
+    Error(Port_Format("Module '%s' in '%s' has two %ss named '%s' (at byte %zu).", m.name, path_, kind, name, where));
     ++bad_names_;
     return false;
 }
@@ -362,8 +363,60 @@ bool Reader::MemberName(Module& m, od::raw_json_string key, const char* kind, in
     const std::string_view bare = StripEscape(text);
     bool added = false;
     const char* interned = seen == kSeenPorts ? design_.Intern(bare) : design_.InternRare(bare, added);
-    if (FirstOfName(seen_[seen], interned, added, m, kind)) name = interned;
+    if (FirstOfName(seen_[seen], interned, added, m, kind, Where())) name = interned;
     return true;
+}
+
+bool Reader::BeginName(od::raw_json_string key, PendingName& pending, const char*& text) {
+    text = nullptr;
+    std::string_view raw;
+    if (!KeyText(key, raw)) return false;
+    const std::string_view bare = StripEscape(raw);
+    if (!NameOk(bare, pending.module, pending.kind)) return true;
+    design_.PrefetchName(bare);
+    pending_text_.assign(bare);
+    Module& m = *pending.module;
+    pending.where = Where();
+    pending.bad_names = bad_names_;
+    pending.bits = m.bits.size();
+    pending.conns = m.conns.size();
+    pending.max_bit = m.max_bit;
+    pending_ = &pending;
+    text = pending_text_.c_str();
+    return true;
+}
+
+void Reader::Settle(PendingName& pending) {
+    bool added = false;
+    const char* interned = design_.InternRare(pending_text_, added);
+    if (FirstOfName(seen_[pending.seen], interned, added, *pending.module, pending.kind, pending.where))
+        pending.interned = interned;
+    else
+        pending.second = true;
+}
+
+bool Reader::SettleBeforeMessage() {
+    PendingName* pending = std::exchange(pending_, nullptr);
+    if (!pending->interned && !pending->second) Settle(*pending);
+    pending_ = pending;
+    return !pending->second;
+}
+
+bool Reader::EndName(PendingName& pending, const char*& name) {
+    pending_ = nullptr;
+    if (!pending.interned && !pending.second) Settle(pending);
+    if (!pending.second) {
+        name = pending.interned;
+        return true;
+    }
+    // Left out as if its body was never read (the netlist is refused for the name anyway).
+    Module& m = *pending.module;
+    m.bits.resize(pending.bits);
+    m.max_bit = pending.max_bit;
+    m.conns.Truncate(pending.conns);
+    m.conn_dirs.Truncate(pending.conns);
+    bad_names_ = pending.bad_names + 1;
+    return false;
 }
 
 bool Reader::PortMember(Module& m, od::raw_json_string name_key, od::value value) {
@@ -412,14 +465,16 @@ bool Reader::ParseCells(od::value value, Module& m) {
 
 bool Reader::CellMember(Module& m, od::raw_json_string name_key, od::value value) {
     Cell cell;
-    if (!MemberName(m, name_key, "cell", kSeenCells, cell.name)) return false;
+    PendingName pending{&m, kSeenCells, "cell"};
+    if (!BeginName(name_key, pending, cell.name)) return false;
     if (!cell.name) return true;  // left out
     od::object body;
-    if (error_code e = value.get_object().get(body))
-        return JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name));
-    const size_t bad = bad_names_;
-    if (!ParseCell(body, m, cell)) return false;
-    if (bad_names_ == bad) m.cells.push_back(cell);
+    const error_code e = value.get_object().get(body);
+    const bool ok = e ? JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name))
+                      : ParseCell(body, m, cell);
+    if (!EndName(pending, cell.name)) return true;  // left out
+    if (!ok) return false;
+    if (bad_names_ == pending.bad_names) m.cells.push_back(cell);
     if ((m.cells.size() & 1023) == 0) buf_.DropBefore(Where());
     return true;
 }
@@ -508,8 +563,16 @@ bool Reader::ParseNets(od::value value, Module& m) {
 
 bool Reader::NetMember(Module& m, od::raw_json_string name_key, od::value value) {
     Net net;
-    if (!MemberName(m, name_key, "net", kSeenNets, net.name)) return false;
+    PendingName pending{&m, kSeenNets, "net"};
+    if (!BeginName(name_key, pending, net.name)) return false;
     if (!net.name) return true;  // left out
+    const bool ok = NetBody(value, m, net);
+    if (!EndName(pending, net.name)) return true;  // left out
+    if (ok) m.nets.push_back(net);
+    return ok;
+}
+
+bool Reader::NetBody(od::value value, Module& m, Net& net) {
     od::object body;
     if (error_code e = value.get_object().get(body))
         return JsonError(e, Port_Format("netname '%s' in module '%s' must be an object", net.name, m.name));
@@ -540,7 +603,6 @@ bool Reader::NetMember(Module& m, od::raw_json_string name_key, od::value value)
     }
     if (!has_bits)
         return ShapeError(Port_Format("netname '%s' in module '%s' has no \"bits\"", net.name, m.name));
-    m.nets.push_back(net);
     return true;
 }
 

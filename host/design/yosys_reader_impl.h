@@ -108,6 +108,13 @@ public:
     size_t size() const { return size_; }
     T& operator[](size_t i) { return blocks_[i >> kShift][i & (kBlock - 1)]; }
     const T& operator[](size_t i) const { return blocks_[i >> kShift][i & (kBlock - 1)]; }
+    // Drops the entries from i on (entries of the block being filled).
+    void Truncate(size_t i) {
+        for (; size_ > i; --size_) {
+            blocks_.back().pop_back();
+            if (blocks_.back().empty()) blocks_.pop_back();
+        }
+    }
     void push_back(const T& value) {
         if (blocks_.empty() || blocks_.back().size() == kBlock) {
             blocks_.emplace_back();
@@ -230,6 +237,7 @@ public:
 private:
     // ---- messages ----
     bool Error(const std::string& text) {
+        if (pending_ && !SettleBeforeMessage()) return false;  // about a second object's body: left out
         Msg().issueError("%s", text.c_str());
         return false;
     }
@@ -270,6 +278,7 @@ private:
     bool ParsePorts(od::value value, Module& m);
     void ExpectMembers(int seen, size_t members);
     bool MemberName(Module& m, od::raw_json_string key, const char* kind, int seen, const char*& name);
+    bool NetBody(od::value value, Module& m, Net& net);
     bool PortMember(Module& m, od::raw_json_string name_key, od::value value);
     bool ParseCells(od::value value, Module& m);
     bool CellMember(Module& m, od::raw_json_string name_key, od::value value);
@@ -277,7 +286,33 @@ private:
     bool ParseNets(od::value value, Module& m);
     bool NetMember(Module& m, od::raw_json_string name_key, od::value value);
     bool NameOk(std::string_view name, const Module* m, const char* kind, bool may_be_empty = false);
-    bool FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind);
+    bool FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind,
+                     size_t where);
+    // A cell's or net's name from its key to the end of its body, interned only then: its slot
+    // in the name set has come into the cache meanwhile. A message about the body settles the
+    // name first, so that a second object of a name is reported, and its body left out, before
+    // anything in the body is.
+    struct PendingName {
+        Module* module;
+        int seen;  // which of seen_
+        const char* kind;
+        size_t where = 0;                // byte of the key, for the message about a second object
+        size_t bad_names = 0;            // bad_names_ before the body
+        size_t bits = 0, conns = 0;      // the module's bits and connections before the body
+        int64_t max_bit = 0;
+        const char* interned = nullptr;  // once settled
+        bool second = false;             // settled: the module has an object of this name already
+    };
+    // Starts a pending name: text is the name (valid until the next one), null after an error
+    // when the object is left out for its name; false for a malformed key.
+    bool BeginName(od::raw_json_string key, PendingName& pending, const char*& text);
+    // Settles the pending name: false when it names a second object, which is then left out with
+    // whatever its body added to the module; else name is the interned name.
+    bool EndName(PendingName& pending, const char*& name);
+    void Settle(PendingName& pending);
+    bool SettleBeforeMessage();
+    PendingName* pending_ = nullptr;
+    std::string pending_text_;  // the pending name, which messages about the body show
     bool FirstConnection(const Module& m, const Cell& cell, const char* name);
     void Finish(Module& m);
 

@@ -438,16 +438,17 @@ TEST(YosysReader, LargeFileReadPastItsDroppedPages) {
 
 // Names no object can carry (empty, cut short by a NUL, or taken twice in a module) each get an
 // error naming the file, the module and the name; the whole file is read so that every one is
-// listed, and the netlist is refused.
+// listed, and the netlist is refused. The body of a second object of a name is not looked into.
 TEST(YosysReader, BadNamesAreEachReportedAndTheNetlistRefused) {
     TempDir dir;
     const std::string path = dir.Write("names.json", R"({"modules": {
       "top": {
         "ports": {"a": {"direction": "input", "bits": [2]}, "a": {"direction": "input", "bits": [3]},
                   "": {"direction": "input", "bits": [4]}},
-        "cells": {"c": {"type": "X", "connections": {"A": [2], "A": [3]}}, "c": {"type": "X"},
+        "cells": {"c": {"type": "X", "connections": {"A": [2], "A": [3]}},
+                  "c": {"type": "X\u0000Z", "connections": {"B": [2], "B": [3], "C": "bad"}},
                   "n\u0000ul": {"type": "X"}, "t": {"type": "X\u0000Y"}},
-        "netnames": {"w": {"bits": [2]}, "\\w": {"bits": [3]}, "": {"bits": [4]}}},
+        "netnames": {"w": {"bits": [2]}, "\\w": {"bits": [3], "offset": "bad"}, "": {"bits": [4]}}},
       "m\u0000": {}}})");
     const std::vector<std::string> expected = {
         "Module 'top' in '@' has two ports named 'a'",
