@@ -151,8 +151,24 @@ const char* Ndm_NamePool::Intern(std::string_view text) {
     return stored;
 }
 
-const char* Ndm_NamePool::Lookup(std::string_view text, bool* added) {
-    const uint64_t h = Hash(text), tag = TagOf(h);
+void Ndm_NamePool::InternAll(std::span<const std::string_view> texts, const char** out) {
+    constexpr size_t kAhead = 16;
+    uint64_t hashes[kAhead];
+    const size_t n = texts.size();
+    auto fetch = [&](size_t i) {
+        hashes[i % kAhead] = Hash(texts[i]);
+        if (!slots_.empty()) __builtin_prefetch(&slots_[hashes[i % kAhead] & (slots_.size() - 1)]);
+    };
+    for (size_t i = 0; i < n && i < kAhead; ++i) fetch(i);
+    for (size_t i = 0; i < n; ++i) {
+        const uint64_t h = hashes[i % kAhead];
+        if (i + kAhead < n) fetch(i + kAhead);
+        out[i] = Lookup(texts[i], h, nullptr);
+    }
+}
+
+const char* Ndm_NamePool::Lookup(std::string_view text, uint64_t h, bool* added) {
+    const uint64_t tag = TagOf(h);
     const size_t mask = slots_.size() - 1;
     size_t i = h & mask;
     for (;; i = (i + 1) & mask) {

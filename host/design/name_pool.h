@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <cstring>
 #include <memory>
+#include <span>
 #include <string_view>
 #include <vector>
 
@@ -74,6 +75,9 @@ public:
     const char* InternRare(std::string_view text) { return Lookup(text); }
     // The same, telling whether the text is new to the pool.
     const char* InternRare(std::string_view text, bool& added) { return Lookup(text, &added); }
+    // Interns every text of a list (out[i] for texts[i]), fetching slots a few texts ahead: the
+    // bit names of a wide vector, which go to places far apart.
+    void InternAll(std::span<const std::string_view> texts, const char** out);
     // Stored copy when the text was interned before, else null.
     const char* Find(std::string_view text) const;
     size_t bytes() const { return bytes_; }
@@ -119,7 +123,9 @@ private:
         const char* stored = nullptr;
     };
     Short short_[256];
-    const char* Lookup(std::string_view text, bool* added = nullptr);  // Intern, without the short texts
+    // Intern, without the short texts.
+    const char* Lookup(std::string_view text, bool* added = nullptr) { return Lookup(text, Hash(text), added); }
+    const char* Lookup(std::string_view text, uint64_t hash, bool* added);
     std::vector<uint64_t, Ndm_TableAllocator<uint64_t>> slots_;
     size_t used_ = 0;
     struct Chunk {

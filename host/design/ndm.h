@@ -442,6 +442,8 @@ public:
     const char* InternRare(std::string_view name);
     // The same, telling whether the name is new to the design.
     const char* InternRare(std::string_view name, bool& added);
+    // Interns every name of a list (out[i] for names[i]): the bit names of a wide vector.
+    void InternAll(std::span<const std::string_view> names, const char** out);
     // Starts bringing what interning name will read into the cache (a reader that knows a
     // name before it needs it).
     void PrefetchName(std::string_view name) const;

@@ -196,30 +196,58 @@ const Port* Reader::FindPort(Module& m, const char* name) {
     return v ? &m.ports[FromValue(v)] : nullptr;
 }
 
-// Name of bit i of a vector: the plain name for a single bit at index 0, else name[index]
-// where bit 0 is the least significant and index counts from offset (downwards when upto).
+namespace {
+
+// Appends the name of bit i of a vector: name[index] where bit 0 is the least significant and
+// index counts from offset (downwards when upto).
+void AppendBitName(std::string& out, const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i) {
+    const int64_t index = upto ? int64_t{offset} + width - 1 - i : int64_t{offset} + i;
+    out += name;
+    out += '[';
+    out += std::to_string(index);
+    out += ']';
+}
+
+}  // namespace
+
+// Name of bit i of a vector: the plain name for a single bit at index 0, else AppendBitName's.
 const char* Reader::BitName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i) {
     if (width == 1 && offset == 0) return name;
-    int64_t index = upto ? int64_t{offset} + width - 1 - i : int64_t{offset} + i;
-    name_buf_.assign(name);
-    name_buf_ += '[';
-    name_buf_ += std::to_string(index);
-    name_buf_ += ']';
+    name_buf_.clear();
+    AppendBitName(name_buf_, name, width, offset, upto, i);
     return design_.Intern(name_buf_);
+}
+
+// Names of all bits of a vector, in bit order (BitName for each), interned together.
+std::span<const char* const> Reader::BitNames(const char* name, uint32_t width, int32_t offset, bool upto) {
+    bit_names_.resize(width);
+    if (width == 1 && offset == 0) {
+        bit_names_[0] = name;
+        return bit_names_;
+    }
+    bit_text_.clear();
+    bit_ends_.clear();
+    for (uint32_t i = 0; i < width; ++i) {
+        AppendBitName(bit_text_, name, width, offset, upto, i);
+        bit_ends_.push_back(bit_text_.size());
+    }
+    bit_views_.resize(width);
+    for (size_t i = 0, begin = 0; i < width; begin = bit_ends_[i++])
+        bit_views_[i] = std::string_view(bit_text_).substr(begin, bit_ends_[i] - begin);
+    design_.InternAll(bit_views_, bit_names_.data());
+    return bit_names_;
 }
 
 const char* Reader::PinName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i) {
     if (width == 1 && offset == 0) return name;
     const size_t first = reinterpret_cast<uintptr_t>(pin_names_of_.Find(name));
     if (first) {
-        const BitNames& known = pin_names_[first - 1];
+        const PinNames& known = pin_names_[first - 1];
         if (known.width == width && known.offset == offset && known.upto == upto) return known.names[i];
         return BitName(name, width, offset, upto, i);  // the same port name with another range: rare
     }
-    BitNames made{width, offset, upto, {}};
-    made.names.reserve(width);
-    for (uint32_t k = 0; k < width; ++k) made.names.push_back(BitName(name, width, offset, upto, k));
-    pin_names_.push_back(std::move(made));
+    const std::span<const char* const> names = BitNames(name, width, offset, upto);
+    pin_names_.push_back(PinNames{width, offset, upto, {names.begin(), names.end()}});
     pin_names_of_.InsertIfAbsent(name, reinterpret_cast<void*>(static_cast<uintptr_t>(pin_names_.size())));
     return pin_names_.back().names[i];
 }
@@ -267,8 +295,8 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
         instances_.push_back({b, mod, base});
         b->Reserve(m.cells.size(), m.num_signals, 0);
         for (const Net& net : m.nets)
-            for (uint32_t i = 0; i < net.bits.count; ++i)
-                b->CreateSignal(Ndm_Interned{BitName(net.name, net.bits.count, net.offset, net.upto, i)});
+            for (const char* name : BitNames(net.name, net.bits.count, net.offset, net.upto))
+                b->CreateSignal(Ndm_Interned{name});
         stack.push_back({b, mod, base});
     };
     enter(block, module, Alloc(modules_[module].num_bits));
@@ -359,9 +387,9 @@ void Reader::TopPins(Ndm_Block* block, uint32_t module) {
         void* v = net_index.Find(port.name);
         const Net* net = v ? &m.nets[FromValue(v)] : nullptr;
         bool same = net && net->bits.count == port.bits.count;
+        const std::span<const char* const> names = BitNames(port.name, port.bits.count, port.offset, port.upto);
         for (uint32_t i = 0; i < port.bits.count; ++i) {
-            Ndm_Pin* pin =
-                block->CreatePin(Ndm_Interned{BitName(port.name, port.bits.count, port.offset, port.upto, i)}, port.dir);
+            Ndm_Pin* pin = block->CreatePin(Ndm_Interned{names[i]}, port.dir);
             int32_t bit = m.bits[port.bits.first + i];
             if (same)
                 pin->SetSignal(signals[m.net_first_signal[FromValue(v)] + i]);

@@ -5,6 +5,7 @@
 #include <simdjson.h>
 
 #include <cstdint>
+#include <span>
 #include <string>
 #include <string_view>
 #include <type_traits>
@@ -347,13 +348,18 @@ private:
     od::document doc_;
     std::string scratch_;
     std::string name_buf_;
-    struct BitNames {
+    std::span<const char* const> BitNames(const char* name, uint32_t width, int32_t offset, bool upto);
+    std::vector<const char*> bit_names_;  // what BitNames gave last, and its texts before interning
+    std::string bit_text_;
+    std::vector<size_t> bit_ends_;
+    std::vector<std::string_view> bit_views_;
+    struct PinNames {
         uint32_t width;
         int32_t offset;
         bool upto;
         std::vector<const char*> names;
     };
-    std::vector<BitNames> pin_names_;
+    std::vector<PinNames> pin_names_;
     Ndm_PtrMap pin_names_of_;  // port name -> its first entry in pin_names_, plus one
     const char* module_name_ = "";
     enum { kSeenPorts, kSeenCells, kSeenNets };
