@@ -151,6 +151,12 @@ const char* Ndm_NamePool::Intern(std::string_view text) {
     return stored;
 }
 
+uint64_t Ndm_NamePool::Prefetch(std::string_view text) const {
+    const uint64_t hash = Hash(text);
+    if (!slots_.empty()) __builtin_prefetch(&slots_[hash & (slots_.size() - 1)]);
+    return hash;
+}
+
 void Ndm_NamePool::InternAll(std::span<const std::string_view> texts, const char** out) {
     constexpr size_t kAhead = 16;
     uint64_t hashes[kAhead];

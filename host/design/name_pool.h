@@ -73,8 +73,8 @@ public:
     // The same for a text that seldom comes back soon (an instance or a net name): it skips the
     // short texts' table, which it would only churn.
     const char* InternRare(std::string_view text) { return Lookup(text); }
-    // The same, telling whether the text is new to the pool.
-    const char* InternRare(std::string_view text, bool& added) { return Lookup(text, &added); }
+    // The same for a text of a known hash, telling whether the text is new to the pool.
+    const char* InternRare(std::string_view text, uint64_t hash, bool& added) { return Lookup(text, hash, &added); }
     // Interns every text of a list (out[i] for texts[i]), fetching slots a few texts ahead: the
     // bit names of a wide vector, which go to places far apart.
     void InternAll(std::span<const std::string_view> texts, const char** out);
@@ -88,10 +88,9 @@ public:
     char* Keep(size_t size);
 
     static uint64_t Hash(std::string_view text);
-    // Starts loading the slot of text into the cache, for a caller that interns it soon.
-    void Prefetch(std::string_view text) const {
-        if (!slots_.empty()) __builtin_prefetch(&slots_[Hash(text) & (slots_.size() - 1)]);
-    }
+    // Starts loading the slot of text into the cache, for a caller that interns it soon; gives
+    // the text's hash, which InternRare takes.
+    uint64_t Prefetch(std::string_view text) const;
 
     // A 32-bit id of a text this pool interned (the same id for the same text), for values that
     // keep their text in four bytes; Text(id) gives it back, and 0 stands for the empty text.

@@ -645,11 +645,13 @@ Ndm_Design::~Ndm_Design() { DeleteAllProperties(); }
 
 const char* Ndm_Design::Intern(std::string_view name) { return names_->Intern(name); }
 const char* Ndm_Design::InternRare(std::string_view name) { return names_->InternRare(name); }
-const char* Ndm_Design::InternRare(std::string_view name, bool& added) { return names_->InternRare(name, added); }
+const char* Ndm_Design::InternRare(std::string_view name, uint64_t hash, bool& added) {
+    return names_->InternRare(name, hash, added);
+}
 void Ndm_Design::InternAll(std::span<const std::string_view> names, const char** out) {
     names_->InternAll(names, out);
 }
-void Ndm_Design::PrefetchName(std::string_view name) const { names_->Prefetch(name); }
+uint64_t Ndm_Design::PrefetchName(std::string_view name) const { return names_->Prefetch(name); }
 uint32_t Ndm_Design::TextId(const char* interned) { return names_->IdOf(interned); }
 
 Ndm_PropertyHolder* Ndm_Design::OwnerOfLast(const Ndm_Property* last) {

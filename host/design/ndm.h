@@ -440,13 +440,13 @@ public:
     // The same for a name that seldom comes back soon, as instance and net names do not: readers
     // intern millions of those.
     const char* InternRare(std::string_view name);
-    // The same, telling whether the name is new to the design.
-    const char* InternRare(std::string_view name, bool& added);
+    // The same for a name whose PrefetchName came first, telling whether it is new to the design.
+    const char* InternRare(std::string_view name, uint64_t hash, bool& added);
     // Interns every name of a list (out[i] for names[i]): the bit names of a wide vector.
     void InternAll(std::span<const std::string_view> names, const char** out);
     // Starts bringing what interning name will read into the cache (a reader that knows a
-    // name before it needs it).
-    void PrefetchName(std::string_view name) const;
+    // name before it needs it); gives the name's hash, which InternRare takes.
+    uint64_t PrefetchName(std::string_view name) const;
     // A 32-bit id of an interned name (Ndm_NamePool::IdOf).
     uint32_t TextId(const char* interned);
     // Makes room for that many more names, for readers that know how many are coming.

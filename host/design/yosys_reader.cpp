@@ -35,8 +35,18 @@ bool Reader::Int(od::value value, int64_t& out, const What& what) {
 }
 
 bool Reader::Direction(od::value value, Ndm_Dir& dir, const What& what) {
+    od::raw_json_string raw;
+    if (error_code e = value.get_raw_json_string().get(raw)) return JsonError(e, what() + " must be a string");
+    // Millions of cells give their directions: the usual texts are taken as they stand in the
+    // file, and only others decoded.
+    for (Ndm_Dir usual : {Ndm_Dir::Input, Ndm_Dir::Output, Ndm_Dir::Inout}) {
+        if (raw.unsafe_is_equal(std::string_view(Ndm_DirName(usual)))) {
+            dir = usual;
+            return true;
+        }
+    }
     std::string_view text;
-    if (!String(value, text, what)) return false;
+    if (!Ndm_JsonInput::Text(raw, scratch_, text)) return SyntaxError(simdjson::STRING_ERROR, Where());
     if (!Ndm_DirFromName(text, dir)) return ShapeError(what() + " must be \"input\", \"output\" or \"inout\"");
     return true;
 }
@@ -352,18 +362,17 @@ void Reader::ExpectMembers(int seen, size_t members) {
     seen_[seen].Reserve(members);
 }
 
-// The interned name of a port, cell or net of m from its key (seen: which of seen_). False for a
-// malformed key; name null, after an error, when the object is left out for its name.
-bool Reader::MemberName(Module& m, od::raw_json_string key, const char* kind, int seen, const char*& name) {
+// The interned name of a port of m from its key. False for a malformed key; name null, after an
+// error, when the port is left out for its name.
+bool Reader::PortName(Module& m, od::raw_json_string key, const char*& name) {
     name = nullptr;
     std::string_view text;
     if (!KeyText(key, text)) return false;
-    if (!NameOk(StripEscape(text), &m, kind)) return true;
-    // Port names come back on every cell of the module's type; cell and net names seldom do.
     const std::string_view bare = StripEscape(text);
-    bool added = false;
-    const char* interned = seen == kSeenPorts ? design_.Intern(bare) : design_.InternRare(bare, added);
-    if (FirstOfName(seen_[seen], interned, added, m, kind, Where())) name = interned;
+    if (!NameOk(bare, &m, "port")) return true;
+    // Port names come back on every cell of the module's type, through the short texts' table.
+    const char* interned = design_.Intern(bare);
+    if (FirstOfName(seen_[kSeenPorts], interned, false, m, "port", Where())) name = interned;
     return true;
 }
 
@@ -373,7 +382,7 @@ bool Reader::BeginName(od::raw_json_string key, PendingName& pending, const char
     if (!KeyText(key, raw)) return false;
     const std::string_view bare = StripEscape(raw);
     if (!NameOk(bare, pending.module, pending.kind)) return true;
-    design_.PrefetchName(bare);
+    pending.hash = design_.PrefetchName(bare);
     pending_text_.assign(bare);
     Module& m = *pending.module;
     pending.where = Where();
@@ -388,7 +397,7 @@ bool Reader::BeginName(od::raw_json_string key, PendingName& pending, const char
 
 void Reader::Settle(PendingName& pending) {
     bool added = false;
-    const char* interned = design_.InternRare(pending_text_, added);
+    const char* interned = design_.InternRare(pending_text_, pending.hash, added);
     if (FirstOfName(seen_[pending.seen], interned, added, *pending.module, pending.kind, pending.where))
         pending.interned = interned;
     else
@@ -421,7 +430,7 @@ bool Reader::EndName(PendingName& pending, const char*& name) {
 
 bool Reader::PortMember(Module& m, od::raw_json_string name_key, od::value value) {
     Port port;
-    if (!MemberName(m, name_key, "port", kSeenPorts, port.name)) return false;
+    if (!PortName(m, name_key, port.name)) return false;
     if (!port.name) return true;  // left out
     auto what = [&] { return Port_Format("port '%s' in module '%s'", port.name, m.name); };
     od::object body;

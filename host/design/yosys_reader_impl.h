@@ -278,7 +278,7 @@ private:
     bool ParseAttributes(od::value value, Module& m);
     bool ParsePorts(od::value value, Module& m);
     void ExpectMembers(int seen, size_t members);
-    bool MemberName(Module& m, od::raw_json_string key, const char* kind, int seen, const char*& name);
+    bool PortName(Module& m, od::raw_json_string key, const char*& name);
     bool NetBody(od::value value, Module& m, Net& net);
     bool PortMember(Module& m, od::raw_json_string name_key, od::value value);
     bool ParseCells(od::value value, Module& m);
@@ -298,6 +298,7 @@ private:
         int seen;  // which of seen_
         const char* kind;
         size_t where = 0;                // byte of the key, for the message about a second object
+        uint64_t hash = 0;               // of the name
         size_t bad_names = 0;            // bad_names_ before the body
         size_t bits = 0, conns = 0;      // the module's bits and connections before the body
         int64_t max_bit = 0;
