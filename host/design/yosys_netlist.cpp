@@ -378,21 +378,29 @@ bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
 void Reader::TopPins(Ndm_Block* block, uint32_t module) {
     Module& m = modules_[module];
     const Ndm_SignalRange signals = block->GetSignalItr();
-    Ndm_PtrMap net_index;
-    for (size_t n = 0; n < m.nets.size(); ++n) net_index.InsertIfAbsent(m.nets[n].name, AsValue(n));
+    // The netname of each port's own name, if any: the ports are looked up by the nets' names
+    // (a netlist has a few ports and may have millions of nets).
+    constexpr size_t kNone = SIZE_MAX;
+    std::vector<size_t> port_net(m.ports.size(), kNone);
+    if (!m.ports.empty())
+        for (size_t n = 0; n < m.nets.size(); ++n)
+            if (const Port* port = FindPort(m, m.nets[n].name)) {
+                size_t& net = port_net[static_cast<size_t>(port - m.ports.data())];
+                if (net == kNone) net = n;
+            }
     size_t num_pins = 0;
     for (const Port& port : m.ports) num_pins += port.bits.count;
     block->Reserve(0, 0, num_pins);
-    for (const Port& port : m.ports) {
-        void* v = net_index.Find(port.name);
-        const Net* net = v ? &m.nets[FromValue(v)] : nullptr;
-        bool same = net && net->bits.count == port.bits.count;
+    for (size_t p = 0; p < m.ports.size(); ++p) {
+        const Port& port = m.ports[p];
+        const size_t n = port_net[p];
+        const bool same = n != kNone && m.nets[n].bits.count == port.bits.count;
         const std::span<const char* const> names = BitNames(port.name, port.bits.count, port.offset, port.upto);
         for (uint32_t i = 0; i < port.bits.count; ++i) {
             Ndm_Pin* pin = block->CreatePin(Ndm_Interned{names[i]}, port.dir);
             int32_t bit = m.bits[port.bits.first + i];
             if (same)
-                pin->SetSignal(signals[m.net_first_signal[FromValue(v)] + i]);
+                pin->SetSignal(signals[m.net_first_signal[n] + i]);
             else if (bit >= 0 && m.bit_signal[bit] >= 0)
                 pin->SetSignal(signals[m.bit_signal[bit]]);
         }
