@@ -253,6 +253,7 @@ bool Reader::BeginModule(od::raw_json_string key, bool& skip) {
 }
 
 void Reader::EndModule() {
+    SettleAll();
     buf_.DropBefore(Where());
     Finish(module_);
     module_index_.InsertIfAbsent(module_.name, AsValue(modules_.size()));
@@ -358,7 +359,10 @@ void Reader::ExpectMembers(int seen, size_t members) {
     // A netlist has about as many nets as cells, and the cells come first: room for both at once
     // spares the name set a second growth.
     if (seen == kSeenCells) design_.ReserveNames(2 * members);
-    if (seen == kSeenNets) design_.ReserveNames(members);
+    if (seen == kSeenNets) {
+        design_.ReserveNames(members);
+        module_.nets.reserve(module_.nets.size() + members);
+    }
     seen_[seen].Reserve(members);
 }
 
@@ -376,56 +380,58 @@ bool Reader::PortName(Module& m, od::raw_json_string key, const char*& name) {
     return true;
 }
 
-bool Reader::BeginName(od::raw_json_string key, PendingName& pending, const char*& text) {
+bool Reader::BeginName(od::raw_json_string key, int seen, const char*& text) {
     text = nullptr;
     std::string_view raw;
     if (!KeyText(key, raw)) return false;
     const std::string_view bare = StripEscape(raw);
-    if (!NameOk(bare, pending.module, pending.kind)) return true;
-    pending.hash = design_.PrefetchName(bare);
-    pending_text_.assign(bare);
-    Module& m = *pending.module;
-    pending.where = Where();
-    pending.bad_names = bad_names_;
-    pending.bits = m.bits.size();
-    pending.conns = m.conns.size();
-    pending.max_bit = m.max_bit;
-    pending_ = &pending;
-    text = pending_text_.c_str();
+    if (!NameOk(bare, &module_, seen == kSeenCells ? "cell" : "net")) return true;
+    if (waiting_count_ == kWaiting) SettleOldest();
+    const size_t k = (waiting_first_ + waiting_count_++) % kWaiting;
+    waiting_[k] = Waiting{seen, Where(), design_.PrefetchName(bare), kNoObject};
+    waiting_text_[k].assign(bare);
+    in_body_ = true;
+    body_slot_ = k;
+    body_second_ = false;
+    body_name_ = nullptr;
+    text = waiting_text_[k].c_str();
     return true;
 }
 
-void Reader::Settle(PendingName& pending) {
+bool Reader::EndBody(const char*& name) {
+    in_body_ = false;
+    if (body_second_) return false;
+    if (body_name_) name = body_name_;
+    return true;
+}
+
+void Reader::Keep(size_t object) {
+    if (!body_name_) waiting_[body_slot_].object = object;
+}
+
+void Reader::SettleOldest() {
+    const size_t k = waiting_first_;
+    waiting_first_ = (waiting_first_ + 1) % kWaiting;
+    --waiting_count_;
+    const Waiting& w = waiting_[k];
     bool added = false;
-    const char* interned = design_.InternRare(pending_text_, pending.hash, added);
-    if (FirstOfName(seen_[pending.seen], interned, added, *pending.module, pending.kind, pending.where))
-        pending.interned = interned;
-    else
-        pending.second = true;
-}
-
-bool Reader::SettleBeforeMessage() {
-    PendingName* pending = std::exchange(pending_, nullptr);
-    if (!pending->interned && !pending->second) Settle(*pending);
-    pending_ = pending;
-    return !pending->second;
-}
-
-bool Reader::EndName(PendingName& pending, const char*& name) {
-    pending_ = nullptr;
-    if (!pending.interned && !pending.second) Settle(pending);
-    if (!pending.second) {
-        name = pending.interned;
-        return true;
+    const char* interned = design_.InternRare(waiting_text_[k], w.hash, added);
+    const bool second = !FirstOfName(seen_[w.seen], interned, added, module_, w.seen == kSeenCells ? "cell" : "net",
+                                     w.where);
+    if (w.object != kNoObject) (w.seen == kSeenCells ? module_.cells[w.object].name : module_.nets[w.object].name) = interned;
+    if (in_body_ && k == body_slot_) {  // the object being read
+        body_second_ = second;
+        body_name_ = interned;
     }
-    // Left out as if its body was never read (the netlist is refused for the name anyway).
-    Module& m = *pending.module;
-    m.bits.resize(pending.bits);
-    m.max_bit = pending.max_bit;
-    m.conns.Truncate(pending.conns);
-    m.conn_dirs.Truncate(pending.conns);
-    bad_names_ = pending.bad_names + 1;
-    return false;
+}
+
+void Reader::SettleAll() {
+    // FirstOfName's own message must not come back here.
+    const size_t count = std::exchange(waiting_count_, 0);
+    for (size_t i = 0; i < count; ++i) {
+        ++waiting_count_;
+        SettleOldest();
+    }
 }
 
 bool Reader::PortMember(Module& m, od::raw_json_string name_key, od::value value) {
@@ -474,16 +480,19 @@ bool Reader::ParseCells(od::value value, Module& m) {
 
 bool Reader::CellMember(Module& m, od::raw_json_string name_key, od::value value) {
     Cell cell;
-    PendingName pending{&m, kSeenCells, "cell"};
-    if (!BeginName(name_key, pending, cell.name)) return false;
+    if (!BeginName(name_key, kSeenCells, cell.name)) return false;
     if (!cell.name) return true;  // left out
+    const size_t bad = bad_names_;
     od::object body;
     const error_code e = value.get_object().get(body);
     const bool ok = e ? JsonError(e, Port_Format("cell '%s' in module '%s' must be an object", cell.name, m.name))
                       : ParseCell(body, m, cell);
-    if (!EndName(pending, cell.name)) return true;  // left out
+    if (!EndBody(cell.name)) return true;  // left out
     if (!ok) return false;
-    if (bad_names_ == pending.bad_names) m.cells.push_back(cell);
+    if (bad_names_ == bad) {
+        m.cells.push_back(cell);
+        Keep(m.cells.size() - 1);
+    }
     if ((m.cells.size() & 1023) == 0) buf_.DropBefore(Where());
     return true;
 }
@@ -572,13 +581,14 @@ bool Reader::ParseNets(od::value value, Module& m) {
 
 bool Reader::NetMember(Module& m, od::raw_json_string name_key, od::value value) {
     Net net;
-    PendingName pending{&m, kSeenNets, "net"};
-    if (!BeginName(name_key, pending, net.name)) return false;
+    if (!BeginName(name_key, kSeenNets, net.name)) return false;
     if (!net.name) return true;  // left out
     const bool ok = NetBody(value, m, net);
-    if (!EndName(pending, net.name)) return true;  // left out
-    if (ok) m.nets.push_back(net);
-    return ok;
+    if (!EndBody(net.name)) return true;  // left out
+    if (!ok) return false;
+    m.nets.push_back(net);
+    Keep(m.nets.size() - 1);
+    return true;
 }
 
 bool Reader::NetBody(od::value value, Module& m, Net& net) {

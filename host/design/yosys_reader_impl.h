@@ -238,7 +238,8 @@ public:
 private:
     // ---- messages ----
     bool Error(const std::string& text) {
-        if (pending_ && !SettleBeforeMessage()) return false;  // about a second object's body: left out
+        if (waiting_count_) SettleAll();
+        if (in_body_ && body_second_) return false;  // about a second object's body: left out
         Msg().issueError("%s", text.c_str());
         return false;
     }
@@ -289,32 +290,35 @@ private:
     bool NameOk(std::string_view name, const Module* m, const char* kind, bool may_be_empty = false);
     bool FirstOfName(SeenNames& seen, const char* name, bool new_to_design, const Module& m, const char* kind,
                      size_t where);
-    // A cell's or net's name from its key to the end of its body, interned only then: its slot
-    // in the name set has come into the cache meanwhile. A message about the body settles the
-    // name first, so that a second object of a name is reported, and its body left out, before
-    // anything in the body is.
-    struct PendingName {
-        Module* module;
-        int seen;  // which of seen_
-        const char* kind;
-        size_t where = 0;                // byte of the key, for the message about a second object
-        uint64_t hash = 0;               // of the name
-        size_t bad_names = 0;            // bad_names_ before the body
-        size_t bits = 0, conns = 0;      // the module's bits and connections before the body
-        int64_t max_bit = 0;
-        const char* interned = nullptr;  // once settled
-        bool second = false;             // settled: the module has an object of this name already
+    // Cell and net names wait from their keys until a few objects later to be interned, so that
+    // the slot each takes in the name set has come into the cache meanwhile. A message first
+    // settles every waiting name, so that a second object of a name is reported before anything
+    // after its key; the body of one found while it is read is left out with its messages. (The
+    // netlist is refused for a second object anyway.)
+    struct Waiting {
+        int seen;        // which of seen_
+        size_t where;    // byte of the key, for the message about a second object
+        uint64_t hash;   // of the name
+        size_t object;   // the cell's or net's index in the module being read, or kNoObject
     };
-    // Starts a pending name: text is the name (valid until the next one), null after an error
-    // when the object is left out for its name; false for a malformed key.
-    bool BeginName(od::raw_json_string key, PendingName& pending, const char*& text);
-    // Settles the pending name: false when it names a second object, which is then left out with
-    // whatever its body added to the module; else name is the interned name.
-    bool EndName(PendingName& pending, const char*& name);
-    void Settle(PendingName& pending);
-    bool SettleBeforeMessage();
-    PendingName* pending_ = nullptr;
-    std::string pending_text_;  // the pending name, which messages about the body show
+    static constexpr size_t kWaiting = 8, kNoObject = SIZE_MAX;
+    // Starts reading an object of the module being read: text is its name (valid while the
+    // object waits), null after an error when it is left out for its name; false for a
+    // malformed key.
+    bool BeginName(od::raw_json_string key, int seen, const char*& text);
+    // After its body: false when the object is a second one of its name (left out). Else name is
+    // the interned name, or the waiting text: then the object's index, once kept, goes to Keep.
+    bool EndBody(const char*& name);
+    void Keep(size_t object);
+    void SettleOldest();
+    void SettleAll();
+    Waiting waiting_[kWaiting];
+    std::string waiting_text_[kWaiting];
+    size_t waiting_first_ = 0, waiting_count_ = 0;  // a ring of waiting_
+    bool in_body_ = false;             // an object's body is read; its name waits in body_slot_
+    size_t body_slot_ = 0;             // until settled
+    bool body_second_ = false;         // its name has been settled as a second one
+    const char* body_name_ = nullptr;  // its interned name, once settled
     bool FirstConnection(const Module& m, const Cell& cell, const char* name);
     void Finish(Module& m);
 

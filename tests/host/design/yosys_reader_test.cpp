@@ -453,6 +453,7 @@ TEST(YosysReader, BadNamesAreEachReportedAndTheNetlistRefused) {
                   "": {"direction": "input", "bits": [4]}},
         "cells": {"c": {"type": "X", "connections": {"A": [2], "A": [3]}},
                   "c": {"type": "X\u0000Z", "connections": {"B": [2], "B": [3], "C": "bad"}},
+                  "e": {"type": "X"}, "e": {"type": "X"}, "f": {"type": "X"},
                   "n\u0000ul": {"type": "X"}, "t": {"type": "X\u0000Y"}},
         "netnames": {"w": {"bits": [2]}, "\\w": {"bits": [3], "offset": "bad"}, "": {"bits": [4]}}},
       "m\u0000": {}}})");
@@ -461,6 +462,7 @@ TEST(YosysReader, BadNamesAreEachReportedAndTheNetlistRefused) {
         "Module 'top' in '@' has a port with an empty name",
         "Cell 'c' in module 'top' of '@' connects port 'A' twice",
         "Module 'top' in '@' has two cells named 'c'",
+        "Module 'top' in '@' has two cells named 'e'",
         "Module 'top' in '@' has a cell named 'n\\u0000ul', which holds a NUL character",
         "Module 'top' in '@' has a cell type named 'X\\u0000Y', which holds a NUL character",
         "Module 'top' in '@' has two nets named 'w'",
