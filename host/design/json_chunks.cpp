@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <bit>
+#include <cstdint>
 #include <cstring>
 
 #if defined(__SSE2__)
@@ -131,23 +132,74 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
         }
         return t.record;
     };
-    bool closed = false;  // the outermost container has closed
+    // A container that closes less than piece bytes after it opens leaves nothing in the
+    // outline: in one, brackets are only matched and commas are not looked at. Each container
+    // below the outermost is first taken for such a small one; when piece bytes pass before it
+    // closes, or it holds containers more than kSkipDepth deep, the pass goes back to its
+    // bracket and reads it as a large one. (A small cap keeps going back from costing more than
+    // a few passes over any text.)
+    constexpr int kSkipDepth = 4;
+    struct Skip {
+        size_t open = 0;                   // its bracket
+        size_t base = 0;                   // the block of its bracket, and the string state
+        uint64_t carry = 0, in_string = 0;  // before that block
+        uint64_t kinds = 0;                // which brackets open in it are objects, innermost lowest
+        int depth = 0;                     // 0: no container is being skipped
+    } skip;
+    size_t large = SIZE_MAX;  // the bracket of the container gone back to: not skipped again
+    bool closed = false;      // the outermost container has closed
     uint64_t carry = 0, in_string = 0;
+    uint64_t resume = ~uint64_t{0};  // the bits of the block to look at
     unsigned char tail[64];
-    for (size_t base = first; base < size; base += 64) {
-        if (input && (base & ((size_t{1} << 20) - 1)) < 64) input->DropBefore(base);
+    for (size_t base = first; base < size;) {
+        if (input && (base & ((size_t{1} << 20) - 1)) < 64)
+            input->DropBefore(base > piece + 128 ? base - piece - 128 : 0);  // going back stays mapped
         const unsigned char* block = reinterpret_cast<const unsigned char*>(data) + base;
         if (size - base < 64) {
             std::memset(tail, ' ', sizeof tail);
             std::memcpy(tail, block, size - base);
             block = tail;
         }
+        const uint64_t block_carry = carry, block_in_string = in_string;
         const Masks m = Classify(block);
         const uint64_t quote = m.quote & ~Escaped(m.backslash, carry);
         const uint64_t inside = PrefixXor(quote) ^ in_string;
         in_string = static_cast<uint64_t>(static_cast<int64_t>(inside) >> 63);
-        for (uint64_t s = (m.open | m.close | m.comma) & ~inside; s; s &= s - 1) {
+        const uint64_t brackets = (m.open | m.close) & ~inside & resume;
+        const uint64_t all = brackets | (m.comma & ~inside & resume);
+        resume = ~uint64_t{0};
+        bool back = skip.depth && base - skip.open >= piece;  // the skipped container is large
+        for (uint64_t s = all; s && !back;) {
+            if (skip.depth) {
+                uint64_t b = s & brackets;
+                s = 0;
+                for (; b; b &= b - 1) {
+                    const int i = std::countr_zero(b);
+                    const uint64_t object = (block[i] >> 5) & 1;  // '{' and '}', not '[' and ']'
+                    if ((block[i] >> 1) & 1) {                    // '[' and '{'
+                        if (skip.depth == kSkipDepth) {
+                            back = true;
+                            break;
+                        }
+                        skip.kinds = skip.kinds << 1 | object;
+                        ++skip.depth;
+                        continue;
+                    }
+                    if ((skip.kinds & 1) != object) return false;
+                    skip.kinds >>= 1;
+                    if (--skip.depth) continue;
+                    if (base + static_cast<size_t>(i) - skip.open >= piece) {
+                        back = true;
+                        skip.depth = 1;
+                    } else {
+                        s = all & ~((uint64_t{2} << i) - 1);  // what follows it in the block
+                    }
+                    break;
+                }
+                continue;
+            }
             const int i = std::countr_zero(s);
+            s &= s - 1;
             const size_t pos = base + static_cast<size_t>(i);
             const unsigned char c = block[i];
             if (c == ',') {
@@ -161,6 +213,10 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
                 ++t.commas;
             } else if (c == '{' || c == '[') {
                 if (closed) return false;
+                if (!stack.empty() && pos != large) {
+                    skip = Skip{pos, base, block_carry, block_in_string, uint64_t{c == '{'}, 1};
+                    continue;
+                }
                 const size_t element = stack.empty() ? pos : stack.back().separator + 1;
                 stack.push_back({pos, pos, pos, element, UINT32_MAX, c == '{'});
             } else {
@@ -179,8 +235,18 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
                     out.containers[record(stack.back())].children.push_back(r);
             }
         }
+        if (back) {
+            large = skip.open;
+            base = skip.base;
+            carry = skip.carry;
+            in_string = skip.in_string;
+            resume = ~uint64_t{0} << (skip.open - skip.base);
+            skip.depth = 0;
+            continue;
+        }
+        base += 64;
     }
-    if (in_string || !stack.empty() || !closed) return false;
+    if (skip.depth || in_string || !stack.empty() || !closed) return false;
     // Nothing but white space may follow the outermost container.
     if (out.root != UINT32_MAX) return out.containers[out.root].close == last - 1;
     return true;

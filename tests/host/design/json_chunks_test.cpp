@@ -153,7 +153,7 @@ TEST(JsonOutline, MatchesAByteAtATimeOutline) {
         }
         text += object ? '}' : ']';
         Space(rng, text);
-        for (size_t piece : {size_t{1}, size_t{2}, size_t{9}, size_t{64}, size_t{700}}) {
+        for (size_t piece : {size_t{1}, size_t{2}, size_t{9}, size_t{64}, size_t{150}, size_t{700}, size_t{4000}}) {
             SCOPED_TRACE(piece);
             ExpectSame(text, piece);
             // Cut short, or with text after the value: outlined alike (mostly refused).
@@ -163,6 +163,22 @@ TEST(JsonOutline, MatchesAByteAtATimeOutline) {
     }
 }
 
+// Containers nested deeper than a small one is followed, and small ones beside a large one that
+// opens and closes in the same block.
+TEST(JsonOutline, DeepAndCrowdedNestingMatches) {
+    std::string deep;
+    for (int i = 0; i < 300; ++i) deep += i % 3 ? "[1, " : "{\"k\": ";
+    for (int i = 299; i >= 0; --i) deep += i % 3 ? "]" : "}";
+    std::string crowded = "[";
+    for (int i = 0; i < 200; ++i) crowded += (i ? "," : "") + std::string(i % 7 ? "[[],{}]" : "[\"]\\\\\",[1,[2,[3,[4,[5]]]]]]");
+    crowded += "]";
+    for (const std::string& text : {deep, crowded, "[" + deep + "," + crowded + "]"})
+        for (size_t piece : {size_t{1}, size_t{5}, size_t{40}, size_t{64}, size_t{65}, size_t{200}, size_t{1000}}) {
+            SCOPED_TRACE(piece);
+            ExpectSame(text, piece);
+        }
+}
+
 TEST(JsonOutline, RefusesWhatIsNotOneArrayOrObject) {
     const char* const kTexts[] = {"",         "  \n", "1",       "\"[x]\"",  "[1] x",   "[1]]",
                                   "[1][2]",   "x[1]", "[\"abc]", "[{]",      "{\"a\\\"}", "[1,",
@@ -170,6 +186,11 @@ TEST(JsonOutline, RefusesWhatIsNotOneArrayOrObject) {
     for (const char* text : kTexts) {
         Outline out;
         EXPECT_FALSE(Ndm_JsonChunks::MakeOutline(text, std::char_traits<char>::length(text), 1, out)) << text;
+    }
+    // Brackets that do not match inside containers too small to be outlined.
+    for (const char* text : {"[[{]}]", "{\"a\": [{\"b\": [1}], 2]}", "[[[[[[]]]]]}"}) {
+        Outline out;
+        EXPECT_FALSE(Ndm_JsonChunks::MakeOutline(text, std::char_traits<char>::length(text), 1000, out)) << text;
     }
     Outline out;
     const std::string text = " [ [1, 2], {\"k\": [3]} ] \n";
