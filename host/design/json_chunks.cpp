@@ -8,6 +8,9 @@
 #if defined(__SSE2__)
 #include <emmintrin.h>
 #endif
+#if defined(__x86_64__) && (defined(__GNUC__) || defined(__clang__))
+#include <immintrin.h>
+#endif
 
 namespace Ndm_JsonChunks {
 
@@ -16,6 +19,11 @@ namespace od = simdjson::ondemand;
 Sizes& GetSizes() {
     static Sizes sizes;
     return sizes;
+}
+
+bool& UseWideBlocks() {
+    static bool wide = true;
+    return wide;
 }
 
 namespace {
@@ -79,6 +87,70 @@ uint64_t PrefixXor(uint64_t x) {
     x ^= x << 16;
     x ^= x << 32;
     return x;
+}
+
+// What a pass looks at in a block of 64 bytes, strings taken out: its brackets and commas, and
+// the string state it starts in (Escaped's carry, and whether it starts inside a string).
+struct Block {
+    uint64_t brackets, commas;
+    uint64_t carry, in_string;
+};
+
+// Classifies count blocks from p, carrying the string state from block to block.
+void ClassifyBlocks(const unsigned char* p, size_t count, uint64_t& carry, uint64_t& in_string, Block* out) {
+    for (size_t k = 0; k < count; ++k, p += 64) {
+        const Masks m = Classify(p);
+        out[k].carry = carry;
+        out[k].in_string = in_string;
+        const uint64_t inside = PrefixXor(m.quote & ~Escaped(m.backslash, carry)) ^ in_string;
+        in_string = static_cast<uint64_t>(static_cast<int64_t>(inside) >> 63);
+        out[k].brackets = (m.open | m.close) & ~inside;
+        out[k].commas = m.comma & ~inside;
+    }
+}
+
+#if defined(__x86_64__) && (defined(__GNUC__) || defined(__clang__))
+#define LUN_WIDE_BLOCKS 1
+// The same with 32-byte registers, and the string bits by a carry-less multiplication.
+__attribute__((target("avx2,pclmul"))) void ClassifyBlocksWide(const unsigned char* p, size_t count, uint64_t& carry,
+                                                                uint64_t& in_string, Block* out) {
+    const __m256i quote = _mm256_set1_epi8('"'), backslash = _mm256_set1_epi8('\\'), comma = _mm256_set1_epi8(','),
+                  open = _mm256_set1_epi8('{'), close = _mm256_set1_epi8('}'), fold = _mm256_set1_epi8(0x20);
+    const __m128i ones = _mm_set1_epi8(-1);
+    for (size_t k = 0; k < count; ++k, p += 64) {
+        const __m256i lo = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p));
+        const __m256i hi = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(p + 32));
+        const __m256i lo_folded = _mm256_or_si256(lo, fold), hi_folded = _mm256_or_si256(hi, fold);
+#define LUN_BITS(lo_eq, hi_eq)                                                   \
+    (static_cast<uint64_t>(static_cast<uint32_t>(_mm256_movemask_epi8(lo_eq))) | \
+     static_cast<uint64_t>(static_cast<uint32_t>(_mm256_movemask_epi8(hi_eq))) << 32)
+        const uint64_t quotes = LUN_BITS(_mm256_cmpeq_epi8(lo, quote), _mm256_cmpeq_epi8(hi, quote));
+        const uint64_t backslashes = LUN_BITS(_mm256_cmpeq_epi8(lo, backslash), _mm256_cmpeq_epi8(hi, backslash));
+        const uint64_t commas = LUN_BITS(_mm256_cmpeq_epi8(lo, comma), _mm256_cmpeq_epi8(hi, comma));
+        const uint64_t opens = LUN_BITS(_mm256_cmpeq_epi8(lo_folded, open), _mm256_cmpeq_epi8(hi_folded, open));
+        const uint64_t closes = LUN_BITS(_mm256_cmpeq_epi8(lo_folded, close), _mm256_cmpeq_epi8(hi_folded, close));
+#undef LUN_BITS
+        out[k].carry = carry;
+        out[k].in_string = in_string;
+        const uint64_t real = quotes & ~Escaped(backslashes, carry);
+        const uint64_t inside = static_cast<uint64_t>(_mm_cvtsi128_si64(
+                                    _mm_clmulepi64_si128(_mm_cvtsi64_si128(static_cast<int64_t>(real)), ones, 0))) ^
+                                in_string;
+        in_string = static_cast<uint64_t>(static_cast<int64_t>(inside) >> 63);
+        out[k].brackets = (opens | closes) & ~inside;
+        out[k].commas = commas & ~inside;
+    }
+}
+#endif
+
+using ClassifyFn = void (*)(const unsigned char*, size_t, uint64_t&, uint64_t&, Block*);
+
+ClassifyFn ChooseClassify() {
+#if defined(LUN_WIDE_BLOCKS)
+    if (UseWideBlocks() && __builtin_cpu_supports("avx2") && __builtin_cpu_supports("pclmul"))
+        return ClassifyBlocksWide;
+#endif
+    return ClassifyBlocks;
 }
 
 bool IsSpace(char c) { return c == ' ' || c == '\n' || c == '\r' || c == '\t'; }
@@ -148,6 +220,12 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
     } skip;
     size_t large = SIZE_MAX;  // the bracket of the container gone back to: not skipped again
     bool closed = false;      // the outermost container has closed
+    // Blocks are classified a batch at a time, ahead of the walk through their brackets and
+    // commas; carry and in_string are the string state after the batch.
+    const ClassifyFn classify = ChooseClassify();
+    constexpr size_t kBatch = 64;
+    Block batch[kBatch];
+    size_t batch_base = 0, batch_count = 0;
     uint64_t carry = 0, in_string = 0;
     uint64_t resume = ~uint64_t{0};  // the bits of the block to look at
     unsigned char tail[64];
@@ -160,13 +238,17 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
             std::memcpy(tail, block, size - base);
             block = tail;
         }
-        const uint64_t block_carry = carry, block_in_string = in_string;
-        const Masks m = Classify(block);
-        const uint64_t quote = m.quote & ~Escaped(m.backslash, carry);
-        const uint64_t inside = PrefixXor(quote) ^ in_string;
-        in_string = static_cast<uint64_t>(static_cast<int64_t>(inside) >> 63);
-        const uint64_t brackets = (m.open | m.close) & ~inside & resume;
-        const uint64_t all = brackets | (m.comma & ~inside & resume);
+        if (base - batch_base >= batch_count * 64) {
+            batch_base = base;
+            batch_count = std::min((size - base) / 64, kBatch);
+            if (batch_count)
+                classify(block, batch_count, carry, in_string, batch);
+            else
+                classify(tail, batch_count = 1, carry, in_string, batch);
+        }
+        const Block& b = batch[(base - batch_base) / 64];
+        const uint64_t brackets = b.brackets & resume;
+        const uint64_t all = brackets | (b.commas & resume);
         resume = ~uint64_t{0};
         bool back = skip.depth && base - skip.open >= piece;  // the skipped container is large
         for (uint64_t s = all; s && !back;) {
@@ -214,7 +296,7 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
             } else if (c == '{' || c == '[') {
                 if (closed) return false;
                 if (!stack.empty() && pos != large) {
-                    skip = Skip{pos, base, block_carry, block_in_string, uint64_t{c == '{'}, 1};
+                    skip = Skip{pos, base, b.carry, b.in_string, uint64_t{c == '{'}, 1};
                     continue;
                 }
                 const size_t element = stack.empty() ? pos : stack.back().separator + 1;
@@ -240,6 +322,7 @@ bool Outline1(const char* data, size_t size, size_t piece, Outline& out, Ndm_Jso
             base = skip.base;
             carry = skip.carry;
             in_string = skip.in_string;
+            batch_count = 0;
             resume = ~uint64_t{0} << (skip.open - skip.base);
             skip.depth = 0;
             continue;

@@ -25,6 +25,9 @@ struct Sizes {
     size_t piece = size_t{1} << 20;
 };
 Sizes& GetSizes();
+// Whether the outline classifies text with the processor's widest registers when it has them
+// (true); tests turn it off to check that both ways give the same outline.
+bool& UseWideBlocks();
 
 // A large array or object of the outline: the offsets of its brackets, where its element starts
 // in its parent (after the comma or bracket before it: before the key of an object member), the
