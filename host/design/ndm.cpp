@@ -176,6 +176,13 @@ public:
 struct Ndm_Objects {
     Ndm_Arena arena;
     std::unordered_map<const void*, void*> chunk_links;  // a full chunk -> the one after it
+    // The list of chunks grown last (by its first chunk): its last chunk and the members before
+    // it, so that growing it again does not walk it. (Members never leave a chunk.)
+    struct Tail {
+        const void* first = nullptr;
+        void* last = nullptr;
+        size_t before = 0;
+    } tail;
     Ndm_Pool<Ndm_Block> blocks;
     Ndm_Pool<Ndm_Network> networks;
     std::unordered_map<const Ndm_Block*, std::unique_ptr<Ndm_MemberIndex>> indexes;
@@ -348,16 +355,22 @@ Ndm_Pin* Ndm_Block::CreatePin(Ndm_Interned name, Ndm_Dir dir) {
 // one member at a time has few chunks.
 template <class T>
 Ndm_Chunk<T>* Ndm_Block::ChunkWithRoom(Ndm_Chunk<T>*& first, size_t more) {
+    Ndm_Objects& objects = *view_->GetDesign()->objects_;
+    Ndm_Objects::Tail& tail = objects.tail;
     Ndm_Chunk<T>* last = first;
-    size_t count = 0;
-    for (; last; last = last->Next()) {
-        count += last->size;
-        if (!(last->room & Ndm_Chunk<T>::kFollowed)) break;
+    size_t before = 0;  // members in the chunks before last
+    if (first && tail.first == first) {
+        last = static_cast<Ndm_Chunk<T>*>(tail.last);
+        before = tail.before;
     }
-    if (last && last->Room() - last->size >= more) return last;
+    for (; last && (last->room & Ndm_Chunk<T>::kFollowed); last = last->Next()) before += last->size;
+    if (last && last->Room() - last->size >= more) {
+        tail = {first, last, before};
+        return last;
+    }
+    const size_t count = before + (last ? last->size : 0);
     const size_t room = std::max<size_t>({more, count, 4});
     if (count + room > INT32_MAX) throw std::length_error("too many members in one block");
-    Ndm_Objects& objects = *view_->GetDesign()->objects_;
     void* at = objects.arena.Allocate(sizeof(Ndm_Chunk<T>) + room * sizeof(T));
     auto* chunk = new (at) Ndm_Chunk<T>{this, 0, static_cast<uint32_t>(room)};
     if (last) {
@@ -366,6 +379,7 @@ Ndm_Chunk<T>* Ndm_Block::ChunkWithRoom(Ndm_Chunk<T>*& first, size_t more) {
     } else {
         first = chunk;
     }
+    tail = {first, chunk, count};
     return chunk;
 }
 

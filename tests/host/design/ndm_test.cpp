@@ -366,21 +366,30 @@ TEST(DesignDatabase, PropertyEditsKeepOrderAndOwnerAnywhereInTheList) {
 
 // Signals and pins live in chunks of their block: members made one at a time past a
 // reservation, and a reservation made when the block already has some, keep stored order, their
-// block and their lookups.
+// block and their lookups, also when blocks grow in turn.
 TEST(DesignDatabase, MembersMadePastTheirReservationKeepOrderAndBlock) {
     Tree t;
-    for (int reserve : {0, 1, 3, 40}) {
-        Ndm_Block* b = t.top->CreateBlock(("b" + std::to_string(reserve)).c_str());
-        b->Reserve(0, reserve, reserve);
-        std::vector<Ndm_Signal*> signals;
-        std::vector<Ndm_Pin*> pins;
-        for (int i = 0; i < 30; ++i) {
-            if (i == 7) b->Reserve(0, 5, 5);
+    const std::vector<int> reserves = {0, 1, 3, 40};
+    std::vector<Ndm_Block*> blocks;
+    std::vector<std::vector<Ndm_Signal*>> all_signals(reserves.size());
+    std::vector<std::vector<Ndm_Pin*>> all_pins(reserves.size());
+    for (int reserve : reserves) {
+        blocks.push_back(t.top->CreateBlock(("b" + std::to_string(reserve)).c_str()));
+        blocks.back()->Reserve(0, reserve, reserve);
+    }
+    for (int i = 0; i < 30; ++i)
+        for (size_t k = 0; k < blocks.size(); ++k) {
+            if (i == 7) blocks[k]->Reserve(0, 5, 5);
             const std::string name = "m" + std::to_string(i);
-            signals.push_back(b->CreateSignal(name.c_str()));
-            pins.push_back(b->CreatePin(name.c_str()));
+            all_signals[k].push_back(blocks[k]->CreateSignal(name.c_str()));
+            if (k % 2 == 0) all_signals[k].push_back(blocks[k]->CreateSignal((name + "x").c_str()));
+            all_pins[k].push_back(blocks[k]->CreatePin(name.c_str()));
         }
-        ASSERT_EQ(b->GetNumSignals(), 30);
+    for (size_t k = 0; k < blocks.size(); ++k) {
+        Ndm_Block* b = blocks[k];
+        const std::vector<Ndm_Signal*>& signals = all_signals[k];
+        const std::vector<Ndm_Pin*>& pins = all_pins[k];
+        ASSERT_EQ(b->GetNumSignals(), k % 2 ? 30 : 60);
         ASSERT_EQ(b->GetNumPins(), 30);
         int i = 0;
         for (Ndm_Signal* s : b->GetSignalItr()) {
@@ -401,9 +410,9 @@ TEST(DesignDatabase, MembersMadePastTheirReservationKeepOrderAndBlock) {
         }
         std::vector<Ndm_Signal*> prefixed;
         b->GetSignalsByPrefix("m2", false, prefixed);
-        ASSERT_EQ(prefixed.size(), 11u);  // m2, m20..m29 in stored order
-        EXPECT_EQ(prefixed.front(), signals[2]);
-        EXPECT_EQ(prefixed.back(), signals[29]);
+        ASSERT_EQ(prefixed.size(), k % 2 ? 11u : 22u);  // m2, m20..m29 (and m2x...) in stored order
+        EXPECT_EQ(prefixed.front(), signals[k % 2 ? 2 : 4]);
+        EXPECT_EQ(prefixed.back(), signals.back());
     }
 }
 
