@@ -416,9 +416,9 @@ void Reader::SettleOldest() {
     const Waiting& w = waiting_[k];
     bool added = false;
     const char* interned = design_.InternRare(waiting_text_[k], w.hash, added);
-    const bool second = !FirstOfName(seen_[w.seen], interned, added, module_, w.seen == kSeenCells ? "cell" : "net",
-                                     w.where);
-    if (w.object != kNoObject) (w.seen == kSeenCells ? module_.cells[w.object].name : module_.nets[w.object].name) = interned;
+    const bool cell = w.seen == kSeenCells;
+    const bool second = !FirstOfName(seen_[w.seen], interned, added, module_, cell ? "cell" : "net", w.where);
+    if (w.object != kNoObject) (cell ? module_.cells[w.object].name : module_.nets[w.object].name) = interned;
     if (in_body_ && k == body_slot_) {  // the object being read
         body_second_ = second;
         body_name_ = interned;

@@ -109,13 +109,6 @@ public:
     size_t size() const { return size_; }
     T& operator[](size_t i) { return blocks_[i >> kShift][i & (kBlock - 1)]; }
     const T& operator[](size_t i) const { return blocks_[i >> kShift][i & (kBlock - 1)]; }
-    // Drops the entries from i on (entries of the block being filled).
-    void Truncate(size_t i) {
-        for (; size_ > i; --size_) {
-            blocks_.back().pop_back();
-            if (blocks_.back().empty()) blocks_.pop_back();
-        }
-    }
     void push_back(const T& value) {
         if (blocks_.empty() || blocks_.back().size() == kBlock) {
             blocks_.emplace_back();

@@ -444,7 +444,7 @@ TEST(YosysReader, LargeFileReadPastItsDroppedPages) {
 
 // Names no object can carry (empty, cut short by a NUL, or taken twice in a module) each get an
 // error naming the file, the module and the name; the whole file is read so that every one is
-// listed, and the netlist is refused. The body of a second object of a name is not looked into.
+// listed, and the netlist is refused. Nothing in the body of a second object of a name is reported.
 TEST(YosysReader, BadNamesAreEachReportedAndTheNetlistRefused) {
     TempDir dir;
     const std::string path = dir.Write("names.json", R"({"modules": {
