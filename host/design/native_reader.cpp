@@ -26,6 +26,7 @@ constexpr int kVersion = 2;  // reads 1 as well: version 2 adds the short signal
 class Reader {
 public:
     Reader(const char* path, Ndm_Design& design) : path_(path), design_(design) {}
+    ~Reader() { NameAll(); }  // no block keeps a stand-in name
 
     bool Read() {
         std::string why;
@@ -58,9 +59,11 @@ public:
 private:
     // The checks made once the whole file is read.
     bool Finish() {
+        NameAll();
         if (!marked_)
             return Error(Port_Format("'%s' is not a design file: it has no \"format\": \"lun-design\" marker.",
                                      path_));
+        ConnectAhead();
         // Pins that named signals further down the file.
         for (const auto& [pin, n] : pending_) {
             if (n >= signals_.size())
@@ -259,10 +262,16 @@ private:
     bool BlockMember(Ndm_Block*& block, Ndm_View* view, Ndm_Block* parent, od::raw_json_string key,
                      od::value value) {
         if (key == "name") {
-            const char* name;
-            if (!Name(value, name, "block \"name\"", true)) return false;
             if (block) return Shape("a block has two names");
-            block = parent ? parent->CreateBlock(Ndm_Interned{name}) : view->CreateTopBlock(name);
+            if (!parent) {
+                const char* name;
+                if (!Name(value, name, "block \"name\"", true)) return false;
+                block = view->CreateTopBlock(name);
+                return true;
+            }
+            std::string_view text;
+            if (!String(value, text, "block \"name\"")) return false;
+            block = CreateWaiting(*parent, text);
             return true;
         }
         if (!block) return Shape("a block must start with its \"name\"");
@@ -543,11 +552,47 @@ private:
     }
 
     // Connects a pin to signal number n, now or, for a signal further down the file, at the end.
+    // A child block is made under a stand-in name and gets its interned one eight blocks later:
+    // the slot the name takes in the name set has come into the cache meanwhile. (Nothing looks
+    // a block up by its name while the file is read.)
+    Ndm_Block* CreateWaiting(Ndm_Block& parent, std::string_view name) {
+        if (waiting_count_ == kWaiting) NameOldest();
+        WaitingName& w = waiting_[(waiting_first_ + waiting_count_++) % kWaiting];
+        w.hash = design_.PrefetchName(name);
+        w.text.assign(name);
+        w.block = parent.CreateBlock(Ndm_Interned{w.text.c_str()});
+        return w.block;
+    }
+    void NameOldest() {
+        WaitingName& w = waiting_[waiting_first_];
+        waiting_first_ = (waiting_first_ + 1) % kWaiting;
+        --waiting_count_;
+        bool added = false;
+        w.block->SetInternedName(Ndm_Interned{design_.InternRare(w.text, w.hash, added)});
+    }
+    void NameAll() {
+        while (waiting_count_) NameOldest();
+    }
+
+    // Pins reach their signals in no order, far apart in signals_: a pin is connected a few pins
+    // after it is read, its signal's entry fetched meanwhile.
     void Connect(Ndm_Pin* pin, uint64_t n) {
-        if (n < signals_.size())
-            pin->SetSignal(signals_[n]);
-        else
+        if (n >= signals_.size()) {
             pending_.emplace_back(pin, n);
+            return;
+        }
+        __builtin_prefetch(&signals_[n]);
+        Connection& slot = ahead_[ahead_next_];
+        if (ahead_count_ == kAhead)
+            slot.pin->SetSignal(signals_[slot.signal]);
+        else
+            ++ahead_count_;
+        slot = Connection{pin, n};
+        ahead_next_ = (ahead_next_ + 1) % kAhead;
+    }
+    void ConnectAhead() {
+        for (size_t i = 0; i < ahead_count_; ++i) ahead_[i].pin->SetSignal(signals_[ahead_[i].signal]);
+        ahead_count_ = ahead_next_ = 0;
     }
 
     bool Network(od::value value, Ndm_View& view) {
@@ -698,6 +743,21 @@ private:
     std::vector<ListFrame> lists_;
     std::string prop_name_, prop_type_;
     std::vector<std::pair<Ndm_Pin*, uint64_t>> pending_;
+    struct WaitingName {
+        std::string text;
+        uint64_t hash = 0;
+        Ndm_Block* block = nullptr;
+    };
+    static constexpr size_t kWaiting = 8;
+    WaitingName waiting_[kWaiting];  // blocks under stand-in names, a ring
+    size_t waiting_first_ = 0, waiting_count_ = 0;
+    struct Connection {
+        Ndm_Pin* pin;
+        uint64_t signal;
+    };
+    static constexpr size_t kAhead = 16;
+    Connection ahead_[kAhead];  // pins waiting to be connected, a ring
+    size_t ahead_count_ = 0, ahead_next_ = 0;
     bool marked_ = false;                      // the file starts with the marker
     size_t networks_ = 0, opened_ = 0;          // networks and blocks read, for giving pages back
     Ndm_JsonChunks::Reader* pieces_ = nullptr;  // while a large file is read in pieces

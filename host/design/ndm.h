@@ -267,6 +267,9 @@ public:
     const char* GetTypeName() const { return type_; }
     void SetTypeName(const char* type);
     void SetTypeName(Ndm_Interned type) { type_ = type.name; }
+    // Gives a block made under a stand-in name the interned name, for a reader that interns its
+    // names a few blocks late. Only before any lookup among the parent's children.
+    void SetInternedName(Ndm_Interned name) { name_ = name.name; }
 
     int GetNumBlocks() const { return static_cast<int>(blocks_.size()); }
     std::span<Ndm_Block* const> GetBlockItr() const { return blocks_; }

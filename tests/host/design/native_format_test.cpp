@@ -74,6 +74,13 @@ std::unique_ptr<Ndm_Design> Sample() {
     latin->CreateSignal(AllBytes().c_str());
     latin->CreatePropertyString(("LOC\xe9" + AllBytes()).c_str(), AllBytes().c_str());
     latin->CreatePropertyStringList("TNM")->AddString(AllBytes().c_str());
+    // More blocks and pins than a reader keeps waiting for their names and signals.
+    Ndm_Block* bus = top->CreateBlock("bus");
+    for (int i = 0; i < 20; ++i) {
+        Ndm_Block* bit = bus->CreateBlock(("bit" + std::to_string(i)).c_str());
+        bit->CreatePin("D", Ndm_Dir::Input)->SetSignal(i % 2 ? s0 : s1);
+        bit->CreatePin("Q", Ndm_Dir::Output)->SetSignal(s2);
+    }
     return d;
 }
 
