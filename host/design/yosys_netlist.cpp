@@ -323,6 +323,7 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
             m.cells.DropBefore(frame.next_cell);
         }
         const Cell& cell = m.cells[frame.next_cell++];
+        if (frame.next_cell < m.cells.size()) FetchSignalsOf(m, m.cells[frame.next_cell]);
         Ndm_Block* child = frame.block->CreateBlock(Ndm_Interned{cell.name});
         if (!ExpandCell(child, m, cell)) return false;
         if (cell.sub < 0) continue;
@@ -345,6 +346,16 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
 }
 
 // The block of one cell of m: its type and its pins on the signals of the parent block.
+// Starts bringing into the cache where the signals of a cell's bits are found: the next cell's,
+// while this one is made (a cell's bits are anywhere in the module).
+void Reader::FetchSignalsOf(const Module& m, const Cell& cell) {
+    for (uint32_t k = 0; k < cell.num_conns; ++k) {
+        const Conn& conn = m.conns[cell.first_conn + k];
+        for (uint32_t i = 0; i < conn.bits.count; ++i)
+            if (const int32_t bit = m.bits[conn.bits.first + i]; bit >= 0) __builtin_prefetch(&m.bit_signal[bit]);
+    }
+}
+
 bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
     if (cell.type)
         child->SetTypeName(Ndm_Interned{cell.type});

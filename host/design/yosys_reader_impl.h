@@ -332,6 +332,7 @@ private:
     uint32_t Find(uint32_t id);
     void Union(uint32_t a, uint32_t b);
     bool Expand(Ndm_Block* block, uint32_t module);
+    void FetchSignalsOf(const Module& m, const Cell& cell);
     bool ExpandCell(Ndm_Block* child, Module& m, const Cell& cell);
     void TopPins(Ndm_Block* block, uint32_t module);
     void Networks(Ndm_View* view);
