@@ -11,6 +11,7 @@
 #include "host/design/json_chunks.h"
 #include "host/design/json_input.h"
 #include "host/design/native_format.h"
+#include "host/design/waiting_names.h"
 #include "host/port/msgman.h"
 
 namespace {
@@ -556,22 +557,18 @@ private:
     // the slot the name takes in the name set has come into the cache meanwhile. (Nothing looks
     // a block up by its name while the file is read.)
     Ndm_Block* CreateWaiting(Ndm_Block& parent, std::string_view name) {
-        if (waiting_count_ == kWaiting) NameOldest();
-        WaitingName& w = waiting_[(waiting_first_ + waiting_count_++) % kWaiting];
-        w.hash = design_.PrefetchName(name);
-        w.text.assign(name);
-        w.block = parent.CreateBlock(Ndm_Interned{w.text.c_str()});
-        return w.block;
+        if (waiting_.full()) NameOldest();
+        auto& w = waiting_.Add(name, design_.PrefetchName(name));
+        w.payload = parent.CreateBlock(Ndm_Interned{w.text.c_str()});
+        return w.payload;
     }
     void NameOldest() {
-        WaitingName& w = waiting_[waiting_first_];
-        waiting_first_ = (waiting_first_ + 1) % kWaiting;
-        --waiting_count_;
+        auto& w = waiting_.TakeOldest();
         bool added = false;
-        w.block->SetInternedName(Ndm_Interned{design_.InternRare(w.text, w.hash, added)});
+        w.payload->SetInternedName(Ndm_Interned{design_.InternRare(w.text, w.hash, added)});
     }
     void NameAll() {
-        while (waiting_count_) NameOldest();
+        while (!waiting_.empty()) NameOldest();
     }
 
     // Pins reach their signals in no order, far apart in signals_: a pin is connected a few pins
@@ -743,14 +740,7 @@ private:
     std::vector<ListFrame> lists_;
     std::string prop_name_, prop_type_;
     std::vector<std::pair<Ndm_Pin*, uint64_t>> pending_;
-    struct WaitingName {
-        std::string text;
-        uint64_t hash = 0;
-        Ndm_Block* block = nullptr;
-    };
-    static constexpr size_t kWaiting = 8;
-    WaitingName waiting_[kWaiting];  // blocks under stand-in names, a ring
-    size_t waiting_first_ = 0, waiting_count_ = 0;
+    Ndm_WaitingNames<Ndm_Block*> waiting_;  // blocks under stand-in names
     struct Connection {
         Ndm_Pin* pin;
         uint64_t signal;

@@ -386,15 +386,13 @@ bool Reader::BeginName(od::raw_json_string key, int seen, const char*& text) {
     if (!KeyText(key, raw)) return false;
     const std::string_view bare = StripEscape(raw);
     if (!NameOk(bare, &module_, seen == kSeenCells ? "cell" : "net")) return true;
-    if (waiting_count_ == kWaiting) SettleOldest();
-    const size_t k = (waiting_first_ + waiting_count_++) % kWaiting;
-    waiting_[k] = Waiting{seen, Where(), design_.PrefetchName(bare), kNoObject};
-    waiting_text_[k].assign(bare);
+    if (waiting_.full()) SettleOldest();
+    body_ = &waiting_.Add(bare, design_.PrefetchName(bare));
+    body_->payload = Waiting{seen, Where(), kNoObject};
     in_body_ = true;
-    body_slot_ = k;
     body_second_ = false;
     body_name_ = nullptr;
-    text = waiting_text_[k].c_str();
+    text = body_->text.c_str();
     return true;
 }
 
@@ -406,32 +404,27 @@ bool Reader::EndBody(const char*& name) {
 }
 
 void Reader::Keep(size_t object) {
-    if (!body_name_) waiting_[body_slot_].object = object;
+    if (!body_name_) body_->payload.object = object;
 }
 
 void Reader::SettleOldest() {
-    const size_t k = waiting_first_;
-    waiting_first_ = (waiting_first_ + 1) % kWaiting;
-    --waiting_count_;
-    const Waiting& w = waiting_[k];
+    WaitingName& name = waiting_.TakeOldest();
+    const Waiting& w = name.payload;
     bool added = false;
-    const char* interned = design_.InternRare(waiting_text_[k], w.hash, added);
+    const char* interned = design_.InternRare(name.text, name.hash, added);
     const bool cell = w.seen == kSeenCells;
+    settling_ = true;
     const bool second = !FirstOfName(seen_[w.seen], interned, added, module_, cell ? "cell" : "net", w.where);
+    settling_ = false;
     if (w.object != kNoObject) (cell ? module_.cells[w.object].name : module_.nets[w.object].name) = interned;
-    if (in_body_ && k == body_slot_) {  // the object being read
+    if (&name == body_) {  // the object read last
         body_second_ = second;
         body_name_ = interned;
     }
 }
 
 void Reader::SettleAll() {
-    // FirstOfName's own message must not come back here.
-    const size_t count = std::exchange(waiting_count_, 0);
-    for (size_t i = 0; i < count; ++i) {
-        ++waiting_count_;
-        SettleOldest();
-    }
+    while (!waiting_.empty()) SettleOldest();
 }
 
 bool Reader::PortMember(Module& m, od::raw_json_string name_key, od::value value) {

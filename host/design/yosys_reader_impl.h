@@ -17,6 +17,7 @@
 #include "host/design/json_input.h"
 #include "host/design/name_pool.h"
 #include "host/design/ndm.h"
+#include "host/design/waiting_names.h"
 
 namespace ndm_yosys {
 
@@ -231,7 +232,7 @@ public:
 private:
     // ---- messages ----
     bool Error(const std::string& text) {
-        if (waiting_count_) SettleAll();
+        if (!settling_ && !waiting_.empty()) SettleAll();
         if (in_body_ && body_second_) return false;  // about a second object's body: left out
         Msg().issueError("%s", text.c_str());
         return false;
@@ -289,12 +290,12 @@ private:
     // after its key; the body of one found while it is read is left out with its messages. (The
     // netlist is refused for a second object anyway.)
     struct Waiting {
-        int seen;        // which of seen_
-        size_t where;    // byte of the key, for the message about a second object
-        uint64_t hash;   // of the name
-        size_t object;   // the cell's or net's index in the module being read, or kNoObject
+        int seen = 0;       // which of seen_
+        size_t where = 0;   // byte of the key, for the message about a second object
+        size_t object = 0;  // the cell's or net's index in the module being read, or kNoObject
     };
-    static constexpr size_t kWaiting = 8, kNoObject = SIZE_MAX;
+    static constexpr size_t kNoObject = SIZE_MAX;
+    using WaitingName = Ndm_WaitingNames<Waiting>::Name;
     // Starts reading an object of the module being read: text is its name (valid while the
     // object waits), null after an error when it is left out for its name; false for a
     // malformed key.
@@ -305,11 +306,10 @@ private:
     void Keep(size_t object);
     void SettleOldest();
     void SettleAll();
-    Waiting waiting_[kWaiting];
-    std::string waiting_text_[kWaiting];
-    size_t waiting_first_ = 0, waiting_count_ = 0;  // a ring of waiting_
-    bool in_body_ = false;             // an object's body is read; its name waits in body_slot_
-    size_t body_slot_ = 0;             // until settled
+    Ndm_WaitingNames<Waiting> waiting_;
+    bool settling_ = false;            // a message about a waiting name is being given
+    bool in_body_ = false;             // an object's body is read
+    WaitingName* body_ = nullptr;      // the name of the object read last, until settled
     bool body_second_ = false;         // its name has been settled as a second one
     const char* body_name_ = nullptr;  // its interned name, once settled
     bool FirstConnection(const Module& m, const Cell& cell, const char* name);
