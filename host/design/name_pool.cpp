@@ -161,10 +161,7 @@ void Ndm_NamePool::InternAll(std::span<const std::string_view> texts, const char
     constexpr size_t kAhead = 16;
     uint64_t hashes[kAhead];
     const size_t n = texts.size();
-    auto fetch = [&](size_t i) {
-        hashes[i % kAhead] = Hash(texts[i]);
-        if (!slots_.empty()) __builtin_prefetch(&slots_[hashes[i % kAhead] & (slots_.size() - 1)]);
-    };
+    auto fetch = [&](size_t i) { hashes[i % kAhead] = Prefetch(texts[i]); };
     for (size_t i = 0; i < n && i < kAhead; ++i) fetch(i);
     for (size_t i = 0; i < n; ++i) {
         const uint64_t h = hashes[i % kAhead];

@@ -552,7 +552,6 @@ private:
         return true;
     }
 
-    // Connects a pin to signal number n, now or, for a signal further down the file, at the end.
     // A child block is made under a stand-in name and gets its interned one eight blocks later:
     // the slot the name takes in the name set has come into the cache meanwhile. (Nothing looks
     // a block up by its name while the file is read.)
@@ -571,8 +570,9 @@ private:
         while (!waiting_.empty()) NameOldest();
     }
 
-    // Pins reach their signals in no order, far apart in signals_: a pin is connected a few pins
-    // after it is read, its signal's entry fetched meanwhile.
+    // Connects a pin to signal number n, a few pins later or, for a signal further down the
+    // file, at the end. Pins reach their signals in no order, far apart in signals_: the
+    // signal's entry is fetched meanwhile.
     void Connect(Ndm_Pin* pin, uint64_t n) {
         if (n >= signals_.size()) {
             pending_.emplace_back(pin, n);

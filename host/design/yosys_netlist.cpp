@@ -213,9 +213,9 @@ void AppendBitName(std::string& out, const char* name, uint32_t width, int32_t o
 // Name of bit i of a vector: the plain name for a single bit at index 0, else AppendBitName's.
 const char* Reader::BitName(const char* name, uint32_t width, int32_t offset, bool upto, uint32_t i) {
     if (width == 1 && offset == 0) return name;
-    name_buf_.clear();
-    AppendBitName(name_buf_, name, width, offset, upto, i);
-    return design_.Intern(name_buf_);
+    bit_text_.clear();
+    AppendBitName(bit_text_, name, width, offset, upto, i);
+    return design_.Intern(bit_text_);
 }
 
 // Names of all bits of a vector, in bit order (BitName for each), interned together.
@@ -345,7 +345,6 @@ bool Reader::Expand(Ndm_Block* block, uint32_t module) {
     return true;
 }
 
-// The block of one cell of m: its type and its pins on the signals of the parent block.
 // Starts bringing into the cache where the signals of a cell's bits are found: the next cell's,
 // while this one is made (a cell's bits are anywhere in the module).
 void Reader::FetchSignalsOf(const Module& m, const Cell& cell) {
@@ -356,6 +355,7 @@ void Reader::FetchSignalsOf(const Module& m, const Cell& cell) {
     }
 }
 
+// The block of one cell of m: its type and its pins on the signals of the parent block.
 bool Reader::ExpandCell(Ndm_Block* child, Module& m, const Cell& cell) {
     if (cell.type)
         child->SetTypeName(Ndm_Interned{cell.type});

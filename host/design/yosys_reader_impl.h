@@ -346,10 +346,9 @@ private:
     od::parser parser_;
     od::document doc_;
     std::string scratch_;
-    std::string name_buf_;
     std::span<const char* const> BitNames(const char* name, uint32_t width, int32_t offset, bool upto);
     std::vector<const char*> bit_names_;  // what BitNames gave last, and its texts before interning
-    std::string bit_text_;
+    std::string bit_text_;                // (BitName's text too)
     std::vector<size_t> bit_ends_;
     std::vector<std::string_view> bit_views_;
     struct PinNames {
